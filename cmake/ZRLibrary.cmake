@@ -1,0 +1,37 @@
+# The objects, compiled once; the shared library shows exports only, tests and benchmarks link the objects
+# and so reach what is hidden in the product.
+find_package(spdlog REQUIRED)
+find_package(PkgConfig REQUIRED)
+find_package(Threads REQUIRED)
+
+get_property(zr_sources GLOBAL PROPERTY ZR_LIBRARY_SOURCES)
+add_library(zr_objects OBJECT ${zr_sources})
+target_include_directories(zr_objects
+  PUBLIC $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include>
+  PRIVATE ${PROJECT_SOURCE_DIR}/platform ${PROJECT_SOURCE_DIR}/pkg/ZR/indep)
+target_link_libraries(zr_objects PUBLIC zr_rules PRIVATE spdlog::spdlog)
+set_target_properties(zr_objects PROPERTIES
+  POSITION_INDEPENDENT_CODE ON
+  C_VISIBILITY_PRESET hidden
+  CXX_VISIBILITY_PRESET hidden
+  VISIBILITY_INLINES_HIDDEN ON)
+
+# Private headers and objects, for tests and benchmarks.
+add_library(zr_internal INTERFACE)
+target_include_directories(zr_internal INTERFACE
+  ${PROJECT_SOURCE_DIR}/include ${PROJECT_SOURCE_DIR}/platform ${PROJECT_SOURCE_DIR}/pkg/ZR/indep)
+target_link_libraries(zr_internal INTERFACE zr_objects $<TARGET_OBJECTS:zr_objects> zr_rules
+  spdlog::spdlog Threads::Threads ${CMAKE_DL_LIBS})
+
+add_library(zr SHARED)
+add_library(zr_static STATIC)
+set_target_properties(zr PROPERTIES VERSION ${PROJECT_VERSION} SOVERSION ${PROJECT_VERSION_MAJOR})
+set_target_properties(zr_static PROPERTIES OUTPUT_NAME zr EXPORT_NAME zr_static)
+foreach(library zr zr_static)
+  target_link_libraries(${library} PRIVATE $<BUILD_INTERFACE:zr_objects> $<BUILD_INTERFACE:zr_rules>)
+  target_sources(${library} PRIVATE $<TARGET_OBJECTS:zr_objects>)
+  target_link_libraries(${library} PRIVATE spdlog::spdlog Threads::Threads ${CMAKE_DL_LIBS})
+  target_include_directories(${library} INTERFACE
+    $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include> $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
+  add_library(ZR::${library} ALIAS ${library})
+endforeach()

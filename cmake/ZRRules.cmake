@@ -1,0 +1,19 @@
+# What every file of the project is compiled with. Contraction is off for everything, tests and product
+# alike: a stated rounding is part of the result.
+add_library(zr_rules INTERFACE)
+target_compile_features(zr_rules INTERFACE cxx_std_20 c_std_11)
+target_compile_options(zr_rules INTERFACE
+  -ffp-contract=off -Wall -Wextra -Wshadow
+  $<$<COMPILE_LANGUAGE:CXX>:-Wconversion>
+  $<$<BOOL:${ZR_WARNINGS_ARE_ERRORS}>:-Werror>)
+if(ZR_SANITIZE)
+  target_compile_options(zr_rules INTERFACE -fsanitize=${ZR_SANITIZE} -fno-omit-frame-pointer -g)
+  target_link_options(zr_rules INTERFACE -fsanitize=${ZR_SANITIZE})
+  if(ZR_SANITIZE MATCHES "undefined")
+    target_compile_options(zr_rules INTERFACE -fno-sanitize-recover=undefined)
+  endif()
+endif()
+set(CMAKE_CXX_EXTENSIONS OFF)
+set(CMAKE_C_EXTENSIONS OFF)
+# -O3 for the row loops; assertions of the standard library stay out of release builds.
+set(CMAKE_CXX_FLAGS_RELEASE "-O3 -DNDEBUG")

@@ -1,0 +1,208 @@
+// Channel arithmetic of the three depths: the one home of 255, 32768 and 1.0f.
+//
+// Every rule that moves a value between depths, multiplies, divides or inverts it stands here under a
+// name; no other file rounds by a rule of its own. Where two depths round differently the difference
+// is part of the result, and the reason stands next to it.
+//
+// Threads: all functions are pure, except that 8-bit division reads ZRp_G_fcd_table (set by ZR_Birth).
+#pragma once
+
+#include <ZR/zr.h>
+
+#include <bit>
+#include <limits>
+#include <type_traits>
+
+extern "C" {
+// 256 x 256 byte tables, index row * 256 + column; null before ZR_Birth.
+// Multiply: row * column / 255, rounded. Divide: column * 255 / row, rounded, 255 from column >= row on.
+ZR_API extern const u8* ZRp_G_fcm_table;
+ZR_API extern const u8* ZRp_G_fcd_table;
+// Entry i holds the float i, for i in 0..255.
+ZR_API extern f32 ZR_G_FloatRamp[256];
+}
+
+namespace zr {
+
+// ------------------------------------------------------------------------------ number helpers
+
+// Truncation toward zero; what does not fit, and NaN, gives INT32_MIN on every processor.
+constexpr i32 truncate_i32(f32 v) {
+  const bool fits = v >= -2147483648.0f && v < 2147483648.0f;
+  const i32 truncated = static_cast<i32>(fits ? v : 0.0f);
+  return fits ? truncated : std::numeric_limits<i32>::min();
+}
+constexpr i32 truncate_i32(f64 v) {
+  const bool fits = v > -2147483649.0 && v < 2147483648.0;
+  const i32 truncated = static_cast<i32>(fits ? v : 0.0);
+  return fits ? truncated : std::numeric_limits<i32>::min();
+}
+
+// Products and sums that wrap at 32 bits: legal channels never reach the wrap, illegal ones stay defined.
+constexpr i32 wrap_mul(i32 a, i32 b) { return static_cast<i32>(static_cast<u32>(a) * static_cast<u32>(b)); }
+constexpr i32 wrap_add(i32 a, i32 b) { return static_cast<i32>(static_cast<u32>(a) + static_cast<u32>(b)); }
+constexpr i32 wrap_sub(i32 a, i32 b) { return static_cast<i32>(static_cast<u32>(a) - static_cast<u32>(b)); }
+
+// Exponent bits all zero: +-0 and the denormals, which no float path divides by.
+constexpr bool is_zero_or_denormal(f32 v) { return (std::bit_cast<u32>(v) & 0x7f800000u) == 0; }
+
+// The weights of red, green and blue in luma, in 1/32768; they sum to 32768.
+inline constexpr i32 luma_red = 9798, luma_green = 19235, luma_blue = 3735;
+
+// ------------------------------------------------------------------------------ one depth each
+
+template <class Pixel>
+struct Depth;
+
+template <>
+struct Depth<ZR_Pixel8> {
+  using Channel = u8;
+  using Wide = i32;
+  static constexpr i32 bits = 8;
+  static constexpr u32 layer_flags = 0;
+  static constexpr Wide white = 255, half = 128;
+
+  // a * b / 255 rounded to nearest, exact for all pairs of bytes.
+  static constexpr Wide mul(Wide a, Wide b) { return fold(wrap_mul(a, b)); }
+  static constexpr Wide inv(Wide a) { return white - a; }
+  // The same fold with a signed second operand; shifts are arithmetic.
+  static constexpr Wide smul(Wide k, Wide x) { return fold(wrap_mul(k, x)); }
+  // n * 255 / r by table, clamped to 255; row 0 is 255 throughout. n and r are 0..255.
+  static Wide div(Wide n, Wide r) { return ZRp_G_fcd_table[r * 256 + n]; }
+  static constexpr Wide luma(Wide r, Wide g, Wide b) {
+    return (luma_red * r + luma_green * g + luma_blue * b + 16384) >> 15;
+  }
+  // t / 255 for a product of two channels.
+  static constexpr Wide fold(Wide t) { return (t + ((t + 128) >> 8) + 128) >> 8; }
+};
+
+template <>
+struct Depth<ZR_Pixel16> {
+  using Channel = u16;
+  using Wide = i32;
+  static constexpr i32 bits = 16;
+  static constexpr u32 layer_flags = 0x1000001;
+  static constexpr Wide white = 32768, half = 16384;
+
+  // One less than half as rounding term: exactly one half goes down, and white * white is white.
+  static constexpr Wide mul(Wide a, Wide b) { return wrap_add(wrap_mul(a, b), 16383) >> 15; }
+  static constexpr Wide inv(Wide a) { return white - a; }
+  // No rounding term: a signed product goes toward minus infinity.
+  static constexpr Wide smul(Wide k, Wide x) { return wrap_mul(k, x) >> 15; }
+  // n * 32768 / r rounded, white from n >= r on (so also for r = 0).
+  static constexpr Wide div(Wide n, Wide r) { return n >= r ? white : wrap_add(wrap_mul(n, white), r >> 1) / r; }
+  static constexpr Wide luma(Wide r, Wide g, Wide b) {
+    return static_cast<Wide>((static_cast<u32>(luma_red) * static_cast<u32>(r) +
+                              static_cast<u32>(luma_green) * static_cast<u32>(g) +
+                              static_cast<u32>(luma_blue) * static_cast<u32>(b) + 16384u) >>
+                             15);
+  }
+};
+
+template <>
+struct Depth<ZR_PixelFloat> {
+  using Channel = f32;
+  using Wide = f32;
+  static constexpr i32 bits = 32;
+  static constexpr u32 layer_flags = 0x2000000;
+  static constexpr Wide white = 1.0f, half = 0.5f;
+
+  static constexpr Wide mul(Wide a, Wide b) { return a * b; }
+  static constexpr Wide inv(Wide a) { return 1.0f - a; }
+  static constexpr Wide smul(Wide k, Wide x) { return k * x; }
+  // n / r; white where r is zero or denormal.
+  static constexpr Wide div(Wide n, Wide r) { return is_zero_or_denormal(r) ? 1.0f : n / r; }
+  static constexpr Wide luma(Wide r, Wide g, Wide b) { return 0.299f * r + 0.587f * g + 0.114f * b; }
+};
+
+template <class Pixel>
+using Channel = typename Depth<Pixel>::Channel;
+template <class Pixel>
+using Wide = typename Depth<Pixel>::Wide;
+
+static_assert(Depth<ZR_Pixel8>::mul(255, 255) == 255 && Depth<ZR_Pixel8>::mul(1, 127) == 0 &&
+              Depth<ZR_Pixel8>::mul(1, 128) == 1);
+static_assert(Depth<ZR_Pixel16>::mul(32768, 32768) == 32768);
+static_assert(Depth<ZR_Pixel16>::mul(16384, 1) == 0, "exactly one half goes down");
+
+// ------------------------------------------------------------------------------ between depths
+
+constexpr u16 widen_8_to_16(u8 v) { return static_cast<u16>((v * 0x808080u + 33200u) >> 16); }
+// Undoes widen_8_to_16 for every byte.
+constexpr u8 narrow_16_to_8(u16 v) { return static_cast<u8>((v * 255u + 16384u) >> 15); }
+// `word` is the next word of the dither table; its low 15 bits replace the rounding term.
+constexpr u8 narrow_16_to_8_dither(u16 v, u32 word) { return static_cast<u8>((v * 255u + (word & 0x7fffu)) >> 15); }
+// Of worlds copied to worlds.
+constexpr f32 widen_8_to_float(u8 v) { return static_cast<f32>(v) * 0.003921569f; }
+// Of fill colours: the product is formed in double precision.
+constexpr f32 widen_8_to_float_d(u8 v) { return static_cast<f32>(static_cast<f64>(v) * 0.00392156862745098); }
+constexpr f32 widen_16_to_float(u16 v) { return static_cast<f32>(v) * 3.0517578e-5f; }  // exactly v / 32768
+
+// Float narrowed to an integer depth, the scalar rule. NaN passes both tests and truncates to 0.
+template <class Pixel>
+constexpr Channel<Pixel> narrow_float_colour(f32 c) {
+  constexpr f32 white = static_cast<f32>(Depth<Pixel>::white);
+  const f32 scaled = c * white;
+  if (0.0f > scaled) return 0;
+  if (scaled > white) return static_cast<Channel<Pixel>>(Depth<Pixel>::white);
+  return static_cast<Channel<Pixel>>(static_cast<u32>(truncate_i32(scaled + 0.5f)));
+}
+// Alpha on that path is not clamped: out of range it wraps in the low 8 or 16 bits. Kept on purpose.
+template <class Pixel>
+constexpr Channel<Pixel> narrow_float_alpha(f32 a) {
+  constexpr f32 white = static_cast<f32>(Depth<Pixel>::white);
+  return static_cast<Channel<Pixel>>(static_cast<u32>(truncate_i32(a * white + 0.5f)));
+}
+// The vector rule, for aligned rows to 8 bits: nearest even, then clamped to 0..255, alpha alike.
+// A product outside 32 bits, and NaN, count as the lowest integer and so give 0.
+constexpr u8 narrow_float_to_8_nearest(f32 c) {
+  f32 scaled = c * 255.0f;
+  scaled = scaled < 2147483648.0f ? scaled : -1.0f;
+  scaled = scaled > 0.0f ? scaled : 0.0f;
+  scaled = scaled < 255.0f ? scaled : 255.0f;
+  const f32 snapped = scaled + 8388608.0f;  // 2^23: the sum has no fraction bits, so adding it rounds
+  return static_cast<u8>(std::bit_cast<u32>(snapped) & 0xffu);
+}
+// What a dither word adds to a float before it is narrowed: [-1/512, +1/512).
+constexpr f32 dither_offset(u32 word) {
+  return static_cast<f32>(word) * (std::bit_cast<f32>(0x2f800000u) * 0.00390625f) - 0.001953125f;
+}
+
+// A colour argument at another depth. Float to integer leaves alpha unclamped.
+template <class To, class From>
+constexpr To convert_colour(const From& c) {
+  if constexpr (std::is_same_v<To, From>) {
+    return c;
+  } else if constexpr (std::is_same_v<From, ZR_PixelFloat>) {
+    return {narrow_float_alpha<To>(c.alpha), narrow_float_colour<To>(c.red), narrow_float_colour<To>(c.green),
+            narrow_float_colour<To>(c.blue)};
+  } else {
+    const auto one = [](auto v) {
+      if constexpr (std::is_same_v<From, ZR_Pixel8> && std::is_same_v<To, ZR_Pixel16>)
+        return widen_8_to_16(v);
+      else if constexpr (std::is_same_v<From, ZR_Pixel8>)
+        return widen_8_to_float_d(v);
+      else if constexpr (std::is_same_v<To, ZR_Pixel8>)
+        return narrow_16_to_8(v);
+      else
+        return widen_16_to_float(v);
+    };
+    return {one(c.alpha), one(c.red), one(c.green), one(c.blue)};
+  }
+}
+
+// ------------------------------------------------------------------------------ against black
+
+// Colour times alpha.
+template <class Pixel>
+constexpr Channel<Pixel> premultiply(Channel<Pixel> c, Channel<Pixel> a) {
+  return static_cast<Channel<Pixel>>(Depth<Pixel>::mul(c, a));
+}
+// Colour over alpha: white where c >= a at the integer depths (so everywhere under alpha 0), white
+// under a zero or denormal float alpha.
+template <class Pixel>
+inline Channel<Pixel> unmultiply(Channel<Pixel> c, Channel<Pixel> a) {
+  return static_cast<Channel<Pixel>>(Depth<Pixel>::div(c, a));
+}
+
+}  // namespace zr
