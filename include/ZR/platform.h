@@ -60,9 +60,9 @@ ZR_API extern const i32* HB_G_CPU_DataP;
 
 /* ---------------------------------------------------------------------------- raster frames */
 
-/* A raster world of 32, 64 or 128 bits a pixel, zeroed, base address set, alpha first; rows are padded to
- * 64 bytes, as is the base. Only the size of `bounds` counts, 1..32767 each way. `format` is not read.
- * 0; 516 for another size or depth; 4 with a message when memory is short. *out is null on failure. */
+/* A raster world of 32, 64 or 128 bits a pixel, zeroed, base address set, alpha first; the base is
+ * aligned and the rows are padded to 64 bytes. Only the size of `bounds` counts, 1..32767 each way. `format` is not
+ * read. 0; 516 for another size or depth; 4 with a message when memory is short. *out is null on failure. */
 ZR_API i32 RS_NewWorld(const GX_Rect* bounds, i32 format, i32 bits_per_pixel, RS_World*** out);
 ZR_API void RS_DisposeWorld(RS_World** raster); /* null is nothing; locks do not matter */
 /* Counted. 0; 4 for a frame without memory, 516 for null. Any thread. */
