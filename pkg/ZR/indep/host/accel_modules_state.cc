@@ -159,7 +159,7 @@ i32 install_module_scan() {
 i32 run_module_scan() {
   const i32 result = ADDIN_RunScans();
   for (const ADDIN_ScanEntry& entry : ADDIN_GetScanReport())
-    if (!entry.accepted) report_string(ZR_Str_ModuleProblem, ZR_Site_Module);
+    if (entry.faulty) report_string(ZR_Str_ModuleProblem, ZR_Site_Module);
   return result;
 }
 
