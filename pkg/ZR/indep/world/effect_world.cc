@@ -39,8 +39,7 @@ i32 get_pixel_data(const char* null_text, ZR_LayerDef* world, void* pixels, void
 
 i32 new_world_from_flags(void* /*ref*/, i32 width, i32 height, i32 flags, ZR_LayerDef* out) {
   const i32 depth = 8 + (flags & ZR_WorldFlag_Deep) * 4;
-  ZR_G_LastWorldStatus =
-      new_effect_world(width, height, depth, flags & (ZR_WorldFlag_Clear | ZR_WorldFlag_Deep), out);
+  ZR_G_LastWorldStatus = new_effect_world(width, height, depth, flags & (ZR_WorldFlag_Clear | ZR_WorldFlag_Deep), out);
   return ZR_G_LastWorldStatus;
 }
 

@@ -79,8 +79,8 @@ ZR_World* ZR_World::NewReference(ZR_LayerDef* layer) {
 }
 
 ZR_World* ZR_World::NewReference(void* data, i32 width, i32 height, i16 depth, i32 row_bytes) {
-  return world_of_depth(
-      depth, [&]<class T>() -> ZR_World* { return new ZR_WorldX<T>(data, width, height, row_bytes); });
+  return world_of_depth(depth,
+                        [&]<class T>() -> ZR_World* { return new ZR_WorldX<T>(data, width, height, row_bytes); });
 }
 
 RS_World** ZR_World::GetRSWorld() const {

@@ -37,7 +37,8 @@ T* dst_row(const ZR_LayerDef& dst, const CopyArea& area, i32 row) {
 }
 template <class T>
 const T* src_row(const ZR_LayerDef& src, const CopyArea& area, i32 row) {
-  return reinterpret_cast<const T*>(static_cast<const char*>(src.data) + (area.top - area.y_off + row) * src.row_bytes) +
+  return reinterpret_cast<const T*>(static_cast<const char*>(src.data) +
+                                    (area.top - area.y_off + row) * src.row_bytes) +
          (area.left - area.x_off);
 }
 

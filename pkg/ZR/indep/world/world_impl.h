@@ -21,9 +21,10 @@ inline void take_part(const ZR_LayerDef& parent, const GX_LRect& rect, i32 pixel
   out->row_bytes = parent.row_bytes;
   out->flags = parent.flags;
   out->host_word = parent.host_word;
-  out->extent = {
-      wrap_sub(std::max(extent.left, rect.left), rect.left), wrap_sub(std::max(extent.top, rect.top), rect.top),
-      wrap_sub(std::min(extent.right, rect.right), rect.left), wrap_sub(std::min(extent.bottom, rect.bottom), rect.top)};
+  out->extent = {wrap_sub(std::max(extent.left, rect.left), rect.left),
+                 wrap_sub(std::max(extent.top, rect.top), rect.top),
+                 wrap_sub(std::min(extent.right, rect.right), rect.left),
+                 wrap_sub(std::min(extent.bottom, rect.bottom), rect.top)};
   out->width = wrap_sub(rect.right, rect.left);
   out->height = wrap_sub(rect.bottom, rect.top);
 }

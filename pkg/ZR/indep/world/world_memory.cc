@@ -65,7 +65,9 @@ void free_frame(u64 allocation, const FrameShape& shape) {
   RS_FreeFrame(reinterpret_cast<void*>(allocation), shape.bytes());
 }
 
-void* frame_pixels(u64 allocation) { return reinterpret_cast<void*>((allocation & 8) != 0 ? allocation + 8 : allocation); }
+void* frame_pixels(u64 allocation) {
+  return reinterpret_cast<void*>((allocation & 8) != 0 ? allocation + 8 : allocation);
+}
 
 bool gutter_overwritten(u64 allocation, const FrameShape& shape) {
   const u8* const start = gutter_start(allocation, shape);
