@@ -89,8 +89,12 @@ struct Depth<ZR_Pixel16> {
   static constexpr Wide inv(Wide a) { return white - a; }
   // No rounding term: a signed product goes toward minus infinity.
   static constexpr Wide smul(Wide k, Wide x) { return wrap_mul(k, x) >> 15; }
-  // n * 32768 / r rounded, white from n >= r on (so also for r = 0).
-  static constexpr Wide div(Wide n, Wide r) { return n >= r ? white : wrap_add(wrap_mul(n, white), r >> 1) / r; }
+  // n * 32768 / r rounded, white from n >= r on (so also for r = 0). Unsigned, so that operands made of
+  // illegal channels, negative ones too, divide by nothing that is zero and overflow nothing.
+  static constexpr Wide div(Wide n, Wide r) {
+    const u32 top = static_cast<u32>(n), below = static_cast<u32>(r);
+    return top >= below ? white : static_cast<Wide>((top * 32768u + (below >> 1)) / below);
+  }
   static constexpr Wide luma(Wide r, Wide g, Wide b) {
     return static_cast<Wide>((static_cast<u32>(luma_red) * static_cast<u32>(r) +
                               static_cast<u32>(luma_green) * static_cast<u32>(g) +
