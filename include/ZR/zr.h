@@ -270,6 +270,10 @@ ZR_API i32 ZR_GetPixelData8(ZR_LayerDef* world, void* pixels, void** out);
 ZR_API i32 ZR_GetPixelData16(ZR_LayerDef* world, void* pixels, void** out);
 ZR_API i32 ZR_GetPixelDataFloat(ZR_LayerDef* world, void* pixels, void** out);
 
+/* Clears a record of 32 bytes; Open also stores `first` at its start. Null record: nothing. Returns 0. */
+ZR_API i32 ZR_OpenDestination(void* first, void* record);
+ZR_API i32 ZR_CloseDestination(void* first, void* record);
+
 /* Bytes of one element of a chunk type; 1 for a type that is not known. */
 ZR_API i32 ZR_ChunkDataSize(i32 type, u16* size);
 /* width * channels elements a row, height rows, zeroed; born locked. */
