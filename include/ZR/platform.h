@@ -60,13 +60,17 @@ ZR_API extern const i32* HB_G_CPU_DataP;
 
 /* ---------------------------------------------------------------------------- raster frames */
 
-/* A raster world of 32, 64 or 128 bits a pixel, zeroed, base address set; null when memory is short. */
+/* A raster world of 32, 64 or 128 bits a pixel, zeroed, base address set, alpha first; the base is
+ * aligned and the rows are padded to 64 bytes. Only the size of `bounds` counts, 1..32767 each way. `format` is not
+ * read. 0; 516 for another size or depth; 4 with a message when memory is short. *out is null on failure. */
 ZR_API i32 RS_NewWorld(const GX_Rect* bounds, i32 format, i32 bits_per_pixel, RS_World*** out);
-ZR_API void RS_DisposeWorld(RS_World** raster);
+ZR_API void RS_DisposeWorld(RS_World** raster); /* null is nothing; locks do not matter */
+/* Counted. 0; 4 for a frame without memory, 516 for null. Any thread. */
 ZR_API i32 RS_LoadLockPixels(RS_World** raster);
 ZR_API void RS_UnlockPixels(RS_World** raster);
 
-/* Frames that are freed wait in a pool for the next of their size. The limit is in bytes. */
+/* Frames that are freed wait in a pool for the next of their size. The limit is in bytes, 256 MiB at
+ * first; beyond it the frames that wait longest go back to the system. Any thread. */
 ZR_API void RS_SetFramePoolLimit(u64 bytes);
 ZR_API u64 RS_GetFramePoolSize(void);
 /* Gives all waiting frames back to the system. */
