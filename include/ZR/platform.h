@@ -76,6 +76,12 @@ ZR_API u64 RS_GetFramePoolSize(void);
 /* Gives all waiting frames back to the system. */
 ZR_API void RS_PurgeFramePool(void);
 
+/* ---------------------------------------------------------------------------------- modules */
+
+/* Folders that the next ZR_Birth scans for acceleration modules, in this order; the texts are copied.
+ * None (count below 1) puts the preference "modules.folders" back. Null entries are passed over. */
+ZR_API void ADDIN_SetModuleFolders(const char* const* folders, i32 count);
+
 #ifdef __cplusplus
 }
 

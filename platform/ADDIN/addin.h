@@ -63,6 +63,7 @@ void ADDIN_SetFolders(std::vector<std::string> folders);  // none: the preferenc
 struct ADDIN_ScanEntry {
   std::string path;
   bool accepted;
+  bool faulty;         // refused for a fault, and not because nothing in it was wanted
   std::string reason;  // why it was refused
 };
 // Of the last ADDIN_RunScans; valid until the next.

@@ -53,20 +53,24 @@ std::vector<fs::path> files_in(const std::string& folder, u32 file_type) {
   return files;
 }
 
-// Why the file was refused; empty when a routine of it stays registered.
-std::string visit(const Scan& scan, const fs::path& path) {
-  std::string reason;
-  ADDIN_File* const file = ADDINp_OpenFile(path.c_str(), &reason);
-  if (file == nullptr) return reason;
+// Accepted when a routine of the file stays registered.
+ADDIN_ScanEntry visit(const Scan& scan, const fs::path& path) {
+  ADDIN_ScanEntry entry{path.string(), false, true, {}};
+  ADDIN_File* const file = ADDINp_OpenFile(path.c_str(), &entry.reason);
+  if (file == nullptr) return entry;
+  entry.faulty = false;
   if (!ADDINp_HasRoutineOfKind(file, scan.kind)) {
-    reason = "it has no routine of the wanted kind";
+    entry.reason = "it has no routine of the wanted kind";
   } else if (const i32 code = scan.scan(file); code != 0) {
-    reason = "loading it gave error " + std::to_string(code);
+    entry.reason = "loading it gave error " + std::to_string(code);
+    entry.faulty = true;
   } else if (file->users == 1) {
-    reason = "none of its routines was taken";
+    entry.reason = "none of its routines was taken";
+  } else {
+    entry.accepted = true;
   }
   ADDINp_LeaveFile(file);
-  return reason;
+  return entry;
 }
 
 void walk(const Scan& scan) {
@@ -76,9 +80,8 @@ void walk(const Scan& scan) {
       std::error_code error;
       const fs::path place = fs::canonical(path, error);
       if (!seen.insert(error ? path : place).second) continue;
-      const std::string reason = visit(scan, path);
-      report.push_back({path.string(), reason.empty(), reason});
-      JRN_Log(reason.empty() ? 10 : 30, "ADDIN", path.c_str(), reason.empty() ? "loaded" : reason.c_str());
+      const ADDIN_ScanEntry& entry = report.emplace_back(visit(scan, path));
+      JRN_Log(entry.accepted ? 10 : 30, "ADDIN", path.c_str(), entry.accepted ? "loaded" : entry.reason.c_str());
     }
 }
 
