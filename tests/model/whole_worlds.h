@@ -113,11 +113,8 @@ template <class D>
 Px<D> premultiplied_by(const Px<D>& m, Px<D> p, bool forward) {
   const auto a = p.a;
   if (a == D::white) return p;
-  if (!forward && a == 0) {
-    if (m.c[0] == 0 && m.c[1] == 0 && m.c[2] == 0)
-      for (auto& c : p.c) c = D::white;
-    return p;
-  }
+  if (!forward && m.c[0] == 0 && m.c[1] == 0 && m.c[2] == 0) return premultiplied(p, false);
+  if (!forward && a == 0) return p;
   for (int i = 0; i < 3; ++i) {
     auto& c = p.c[i];
     if (forward) {
