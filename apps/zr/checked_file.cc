@@ -1,14 +1,19 @@
 // A file under the image library that remembers a write that failed.
 #include "checked_file.h"
 
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
 #include <cerrno>
 #include <system_error>
 
 namespace zr::tool {
 
-CheckedFile::CheckedFile(const std::string& name) : IOProxy(name, Write), file_(std::fopen(name.c_str(), "wb")) {
-  note(file_ != nullptr);
-  if (file_ == nullptr) m_mode = Closed;
+CheckedFile::CheckedFile(const std::string& name)
+    : IOProxy(name, Write), file_(::open(name.c_str(), O_RDWR | O_CREAT | O_TRUNC | O_CLOEXEC, 0666)) {
+  note(file_ >= 0);
+  if (file_ < 0) m_mode = Closed;
 }
 
 void CheckedFile::note(bool good) {
@@ -16,24 +21,41 @@ void CheckedFile::note(bool good) {
 }
 
 void CheckedFile::close() {
-  if (file_ == nullptr) return;
-  note(std::fclose(file_) == 0);
-  file_ = nullptr;
+  if (file_ < 0) return;
+  note(::close(file_) == 0);
+  file_ = -1;
   m_mode = Closed;
 }
 
-bool CheckedFile::seek(int64_t offset) {
-  const bool good = file_ != nullptr && fseeko(file_, offset, SEEK_SET) == 0;
-  note(good);
-  if (good) m_pos = offset;
-  return good;
+size_t CheckedFile::read(void* bytes, size_t count) {
+  size_t done = 0;
+  while (done < count) {
+    const ssize_t got = ::pread(file_, static_cast<char*>(bytes) + done, count - done, m_pos);
+    if (got < 0 && errno == EINTR) continue;
+    note(got >= 0);
+    if (got <= 0) break;
+    done += static_cast<size_t>(got);
+    m_pos += got;
+  }
+  return done;
 }
 
 size_t CheckedFile::write(const void* bytes, size_t count) {
-  const size_t written = file_ == nullptr ? 0 : std::fwrite(bytes, 1, count, file_);
-  note(written == count);
-  m_pos += static_cast<int64_t>(written);
-  return written;
+  size_t done = 0;
+  while (done < count) {
+    const ssize_t put = ::pwrite(file_, static_cast<const char*>(bytes) + done, count - done, m_pos);
+    if (put < 0 && errno == EINTR) continue;
+    note(put > 0);
+    if (put <= 0) break;
+    done += static_cast<size_t>(put);
+    m_pos += put;
+  }
+  return done;
+}
+
+size_t CheckedFile::size() const {
+  struct stat status = {};
+  return fstat(file_, &status) == 0 ? static_cast<size_t>(status.st_size) : 0;
 }
 
 }  // namespace zr::tool

@@ -3,13 +3,12 @@
 
 #include <OpenImageIO/filesystem.h>
 
-#include <cstdio>
 #include <string>
 
 namespace zr::tool {
 
-// The library's PNG writer takes no notice of a full disk and would leave half a picture under a whole
-// name; so its bytes go through here.
+// The library's PNG writer takes no notice of a full disk, and its TIFF and OpenEXR writers none of the
+// last few bytes: half a picture would get a whole name. So all bytes go through here.
 class CheckedFile : public OIIO::Filesystem::IOProxy {
  public:
   explicit CheckedFile(const std::string& name);
@@ -22,12 +21,13 @@ class CheckedFile : public OIIO::Filesystem::IOProxy {
 
   const char* proxytype() const override { return "checked"; }
   void close() override;
-  bool seek(int64_t offset) override;
+  size_t read(void* bytes, size_t count) override;
   size_t write(const void* bytes, size_t count) override;
+  size_t size() const override;
 
  private:
   void note(bool good);
-  std::FILE* file_;
+  int file_;
   std::string failure_;
 };
 

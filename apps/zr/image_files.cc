@@ -5,7 +5,6 @@
 
 #include <algorithm>
 #include <filesystem>
-#include <optional>
 
 #include "checked_file.h"
 #include "depths.h"
@@ -220,6 +219,7 @@ OwnedWorld load_image(const std::string& file, i32 depth, const std::string& whe
 
 void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, const std::string& file) {
   const QuietStderr quiet;
+  CheckedFile checked(file);  // outlives the writer, which may still write when it goes
   const std::unique_ptr<OIIO::ImageOutput> output = OIIO::ImageOutput::create(format.name);
   if (!output) throw file_error("the image library here cannot write " + std::string(format.name));
   OIIO::ImageSpec spec(world.width(), world.height(), 4, half ? OIIO::TypeHalf : file_type(world.depth()));
@@ -228,13 +228,12 @@ void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, 
   spec.attribute("compression", "zip");
   spec.attribute("png:compressionLevel", 4);  // half the time of the usual 6, a twentieth larger
   spec.attribute("Software", "zr");
-  std::optional<CheckedFile> checked;
   const auto fail = [&] {
-    const std::string reason = checked && !checked->failure().empty() ? checked->failure() : output->geterror();
-    throw file_error(file + " cannot be written: " + first_line(reason));
+    const std::string reason = output->geterror();
+    throw file_error(file +
+                     " cannot be written: " + (checked.failure().empty() ? first_line(reason) : checked.failure()));
   };
-  if (std::string_view(format.name) == "png") output->set_ioproxy(&checked.emplace(file));
-  if ((checked && !checked->failure().empty()) || !output->open(file, spec)) fail();
+  if (!checked.failure().empty() || !output->set_ioproxy(&checked) || !output->open(file, spec)) fail();
   static constexpr i32 kStrip = 256;  // rows between two looks at the interrupt flag
   with_pixel_of(world.depth(), [&]<class Pixel>() {
     const size_t row_values = static_cast<size_t>(world.width()) * 4;
@@ -249,12 +248,9 @@ void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, 
       if (!output->write_scanlines(top, top + rows, 0, file_type(world.depth()), strip.data())) fail();
     }
   });
-  bool written = output->close();
-  if (checked) {
-    checked->close();
-    written = written && checked->failure().empty();
-  }
-  if (!written) fail();
+  const bool written = output->close();
+  checked.close();
+  if (!written || !checked.failure().empty()) fail();
 }
 
 void set_image_threads(int threads) {
