@@ -21,7 +21,7 @@ class ZR_API ZR_PixelContainerBase : public HB_MemTrackedObject {
 };
 
 template <class T>
-class ZR_WorldX;
+class ZR_API ZR_WorldX;
 
 template <class World8, class World16, class WorldFloat>
 class ZR_API ZR_PixelContainer : public ZR_PixelContainerBase {};
