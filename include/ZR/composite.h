@@ -18,7 +18,7 @@ struct ZR_BlendingMode {
 
   ZR_BlendingMode() = default;
   // trunc(255 * opacity + 0.5), trunc(32768 * opacity + 0.5), or the opacity itself.
-  explicit ZR_BlendingMode(const ZR_CompositeModePlus& mode);
+  ZR_API explicit ZR_BlendingMode(const ZR_CompositeModePlus& mode);
 };
 
 // n pixels of src over dst, mask null or n pixels of which the alpha counts. Returns 0 or an error.

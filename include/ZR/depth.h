@@ -141,24 +141,34 @@ constexpr f32 widen_8_to_float(u8 v) { return static_cast<f32>(v) * 0.003921569f
 // Of fill colours: the product is formed in double precision.
 constexpr f32 widen_8_to_float_d(u8 v) { return static_cast<f32>(static_cast<f64>(v) * 0.00392156862745098); }
 constexpr f32 widen_16_to_float(u16 v) { return static_cast<f32>(v) * 3.0517578e-5f; }  // exactly v / 32768
+static_assert(0.003921569f == 1.0f / 255.0f && 3.0517578e-5f == 1.0f / 32768.0f);
 
-// Float narrowed to an integer depth, the scalar rule. NaN passes both tests and truncates to 0.
+// Float narrowed to an integer depth, the scalar rule: the channel times white and a half, both in single
+// precision, truncated; below `floor` it is 0, above `ceiling` white. NaN passes both tests and
+// truncates to 0. Branch-free, so that rows of it vectorise.
+template <class Pixel>
+constexpr Channel<Pixel> narrow_float(f32 c, f32 floor, f32 ceiling) {
+  const f32 scaled = c * static_cast<f32>(Depth<Pixel>::white);
+  f32 rounded = scaled + 0.5f;
+  rounded = scaled > ceiling ? ceiling : rounded;
+  rounded = floor > scaled ? 0.0f : rounded;
+  return static_cast<Channel<Pixel>>(static_cast<u32>(truncate_i32(rounded)));
+}
+// Colours are clamped. Alpha is not: out of range it wraps in the low 8 or 16 bits. Kept on purpose.
+template <class Pixel>
+inline constexpr f32 narrow_colour_limit[2] = {0.0f, static_cast<f32>(Depth<Pixel>::white)};
+inline constexpr f32 narrow_alpha_limit[2] = {-std::numeric_limits<f32>::infinity(),
+                                              std::numeric_limits<f32>::infinity()};
 template <class Pixel>
 constexpr Channel<Pixel> narrow_float_colour(f32 c) {
-  constexpr f32 white = static_cast<f32>(Depth<Pixel>::white);
-  const f32 scaled = c * white;
-  if (0.0f > scaled) return 0;
-  if (scaled > white) return static_cast<Channel<Pixel>>(Depth<Pixel>::white);
-  return static_cast<Channel<Pixel>>(static_cast<u32>(truncate_i32(scaled + 0.5f)));
+  return narrow_float<Pixel>(c, narrow_colour_limit<Pixel>[0], narrow_colour_limit<Pixel>[1]);
 }
-// Alpha on that path is not clamped: out of range it wraps in the low 8 or 16 bits. Kept on purpose.
 template <class Pixel>
 constexpr Channel<Pixel> narrow_float_alpha(f32 a) {
-  constexpr f32 white = static_cast<f32>(Depth<Pixel>::white);
-  return static_cast<Channel<Pixel>>(static_cast<u32>(truncate_i32(a * white + 0.5f)));
+  return narrow_float<Pixel>(a, narrow_alpha_limit[0], narrow_alpha_limit[1]);
 }
-// The vector rule, for aligned rows to 8 bits: nearest even, then clamped to 0..255, alpha alike.
-// A product outside 32 bits, and NaN, count as the lowest integer and so give 0.
+// The vector rule, for aligned rows to 8 bits: nearest even, then clamped to 0..255, alpha alike. A
+// product above 32 bits counts as the lowest integer, as the processor's conversion gives it: 0, like NaN.
 constexpr u8 narrow_float_to_8_nearest(f32 c) {
   f32 scaled = c * 255.0f;
   scaled = scaled < 2147483648.0f ? scaled : -1.0f;
@@ -167,7 +177,7 @@ constexpr u8 narrow_float_to_8_nearest(f32 c) {
   const f32 snapped = scaled + 8388608.0f;  // 2^23: the sum has no fraction bits, so adding it rounds
   return static_cast<u8>(std::bit_cast<u32>(snapped) & 0xffu);
 }
-// What a dither word adds to a float before it is narrowed: [-1/512, +1/512).
+// What a dither word adds to a float before it is narrowed: [-1/512, +1/512]; the factor is 2^-40.
 constexpr f32 dither_offset(u32 word) {
   return static_cast<f32>(word) * (std::bit_cast<f32>(0x2f800000u) * 0.00390625f) - 0.001953125f;
 }

@@ -43,6 +43,7 @@ enum ZR_CallSite : u32 {
   ZR_Site_Module = 0x80,
   ZR_Site_ModuleLoad = 0x81,
   ZR_Site_EmptySlot = 0x82,
+  ZR_Site_CallbackBlock = 0x83,
   ZR_Site_UnknownDepth = 0x3e7,
 };
 

@@ -60,17 +60,27 @@ ZR_API extern const i32* HB_G_CPU_DataP;
 
 /* ---------------------------------------------------------------------------- raster frames */
 
-/* A raster world of 32, 64 or 128 bits a pixel, zeroed, base address set; null when memory is short. */
+/* A raster world of 32, 64 or 128 bits a pixel, zeroed, base address set, alpha first; the base is
+ * aligned and the rows are padded to 64 bytes. Only the size of `bounds` counts, 1..32767 each way. `format` is not
+ * read. 0; 516 for another size or depth; 4 with a message when memory is short. *out is null on failure. */
 ZR_API i32 RS_NewWorld(const GX_Rect* bounds, i32 format, i32 bits_per_pixel, RS_World*** out);
-ZR_API void RS_DisposeWorld(RS_World** raster);
+ZR_API void RS_DisposeWorld(RS_World** raster); /* null is nothing; locks do not matter */
+/* Counted. 0; 4 for a frame without memory, 516 for null. Any thread. */
 ZR_API i32 RS_LoadLockPixels(RS_World** raster);
 ZR_API void RS_UnlockPixels(RS_World** raster);
 
-/* Frames that are freed wait in a pool for the next of their size. The limit is in bytes. */
+/* Frames that are freed wait in a pool for the next of their size. The limit is in bytes, 256 MiB at
+ * first; beyond it the frames that wait longest go back to the system. Any thread. */
 ZR_API void RS_SetFramePoolLimit(u64 bytes);
 ZR_API u64 RS_GetFramePoolSize(void);
 /* Gives all waiting frames back to the system. */
 ZR_API void RS_PurgeFramePool(void);
+
+/* ---------------------------------------------------------------------------------- modules */
+
+/* Folders that the next ZR_Birth scans for acceleration modules, in this order; the texts are copied.
+ * None (count below 1) puts the preference "modules.folders" back. Null entries are passed over. */
+ZR_API void ADDIN_SetModuleFolders(const char* const* folders, i32 count);
 
 #ifdef __cplusplus
 }

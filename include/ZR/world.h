@@ -24,7 +24,7 @@ template <class T>
 class ZR_WorldX;
 
 template <class World8, class World16, class WorldFloat>
-class ZR_PixelContainer : public ZR_PixelContainerBase {};
+class ZR_API ZR_PixelContainer : public ZR_PixelContainerBase {};
 
 using ZR_AnyPixelContainer = ZR_PixelContainer<ZR_WorldX<ZR_Pixel8>, ZR_WorldX<ZR_Pixel16>, ZR_WorldX<ZR_PixelFloat>>;
 
@@ -138,3 +138,5 @@ ZR_API i32 ZRp_WorldDepth(const ZR_LayerDef* layer);
 
 // Worlds and chunks alive now; informative, not atomic.
 ZR_API extern i32 ZR_G_LiveWorlds, ZR_G_LiveChunks;
+// Result of the latest new world that a plug-in asked for through the callback block; for hosts.
+ZR_API extern i32 ZR_G_LastWorldStatus;

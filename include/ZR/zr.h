@@ -270,6 +270,10 @@ ZR_API i32 ZR_GetPixelData8(ZR_LayerDef* world, void* pixels, void** out);
 ZR_API i32 ZR_GetPixelData16(ZR_LayerDef* world, void* pixels, void** out);
 ZR_API i32 ZR_GetPixelDataFloat(ZR_LayerDef* world, void* pixels, void** out);
 
+/* Clears a record of 32 bytes; Open also stores `first` at its start. Null record: nothing. Returns 0. */
+ZR_API i32 ZR_OpenDestination(void* first, void* record);
+ZR_API i32 ZR_CloseDestination(void* first, void* record);
+
 /* Bytes of one element of a chunk type; 1 for a type that is not known. */
 ZR_API i32 ZR_ChunkDataSize(i32 type, u16* size);
 /* width * channels elements a row, height rows, zeroed; born locked. */
@@ -349,9 +353,12 @@ ZR_API extern const ZR_Xfer1Opacity2FuncF ZRp_G_Xfer1_Opacity2_tableF[44];
 ZR_API i32 ZR_GetTransferFlags(i32 mode);
 
 /* Composites `rect` of src (source coordinates) onto dst with its corner at (dest_x, dest_y), clipped
- * to both worlds. Worlds and mask have one depth. field: 0 all rows, 1 even, 2 odd destination rows.
- * quality and flags are not read. `tables`, not mode->tables, selects linear light. Uses the shared
- * scratch: one call at a time; the Plus form takes the caller's ten scratch pointers instead. */
+ * to both worlds; any coordinates do. Worlds and mask have one depth: else ZR_Err_Internal and nothing
+ * is drawn, nor by an unknown mode, which gives ZR_Err_UnimplementedMode. field: 0 all rows, 1 even,
+ * 2 odd destination rows. quality and flags are not read. `tables`, not mode->tables, selects linear
+ * light. Polls on every 128th destination row with (rows done before it, rows). src and dst may be one
+ * world: rows go top to bottom. Uses the shared scratch, grown to the rectangle's width or the source's,
+ * whichever is less: one call at a time; the Plus form takes the caller's ten scratch pointers. */
 ZR_API i32 ZR_TransferRect(const ZR_ProgressInfo* progress, i32 quality, u32 flags, i32 field, const GX_LRect* rect,
                            ZR_LayerDef* src, const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables,
                            const ZR_MaskWorld* mask, i32 dest_x, i32 dest_y, ZR_LayerDef* dst);
@@ -364,10 +371,12 @@ ZR_API i32 ZR_TransferRectPlus(const ZR_ProgressInfo* progress, i32 quality, u32
                                ZR_LayerDef* src, const ZR_CompositeModePlus* mode,
                                const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask, void* scratch[10],
                                i32 dest_x, i32 dest_y, ZR_LayerDef* dst);
-/* Zeroes the alpha of every pixel outside `rect`; colours stay. */
+/* Zeroes the alpha of every pixel outside `rect`, of all when it misses the world; colours stay.
+ * progress is not read. */
 ZR_API i32 ZR_ClearAlphaExceptRect(const ZR_ProgressInfo* progress, const GX_LRect* rect, ZR_LayerDef* world);
 /* 8-bit only: composites a source rectangle (null: all of src) behind the destination. No clipping:
- * the rectangle lies inside both worlds. Draft and Best are one operation. */
+ * the rectangle lies inside both worlds. field as for ZR_TransferRect. Polls before every 32nd row.
+ * Draft and Best are one operation. */
 ZR_API i32 ZR_CompositeRectDraft_Straight(const ZR_ProgressInfo* progress, const GX_LRect* rect, u8 opacity,
                                           ZR_LayerDef* src, i32 dest_x, i32 dest_y, i32 field, u32 flags,
                                           ZR_LayerDef* dst);
@@ -387,18 +396,21 @@ ZR_API i32 ZR_AllocateMotionBlurScratch(void* out[7]);
 ZR_API void ZR_DisposeMotionBlurScratch(void* scratch[7]);
 
 /* dst = src1 * (1 - ratio) + src2 * ratio; ratio is 16.16, clamped to 0..0x10000. Three worlds of
- * one depth and one size. _Straight is ZR_Blend; _Premul mixes premultiplied worlds. */
+ * one depth and one size; dst may be one of the others. _Straight is ZR_Blend; _Premul mixes
+ * premultiplied worlds. progress is not read. */
 ZR_API i32 ZR_Blend(const ZR_ProgressInfo* progress, ZR_LayerDef* src1, ZR_LayerDef* src2, i32 ratio, ZR_LayerDef* dst);
 ZR_API i32 ZR_Blend_Straight(const ZR_ProgressInfo* progress, ZR_LayerDef* src1, ZR_LayerDef* src2, i32 ratio,
                              ZR_LayerDef* dst);
 ZR_API i32 ZR_Blend_Premul(const ZR_ProgressInfo* progress, ZR_LayerDef* src1, ZR_LayerDef* src2, i32 ratio,
                            ZR_LayerDef* dst);
-/* Premultiplies (forward non-zero) or unmultiplies a world, or a rectangle of it, in place. Rows go
- * through ZR_IterateGeneric. */
+/* Premultiplies (forward non-zero) or unmultiplies a world, or a rectangle clipped to it, in place;
+ * colours under alpha 0 become white when unmultiplied. Bands of rows go through ZR_IterateGeneric;
+ * progress->abort alone is asked, once, before the first row. */
 ZR_API i32 ZR_Premul(const ZR_ProgressInfo* progress, i32 forward, ZR_LayerDef* dst);
 ZR_API i32 ZR_PremulRect(const ZR_ProgressInfo* progress, i32 forward, const GX_LRect* rect, ZR_LayerDef* dst);
 ZR_API i32 ZR_PremulRect_S(const ZR_ProgressInfo* progress, i32 forward, const GX_LRect* rect, ZR_LayerDef* dst);
-/* The same against a matte colour, from src into dst (which may be src). */
+/* The same against a matte colour, from src into dst (which may be src); only rows and columns that
+ * both have are touched. Except against black, colours under alpha 0 are not changed by unmultiplying. */
 ZR_API i32 ZR_PremulColor(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const ZR_Pixel8* colour, i32 forward,
                           ZR_LayerDef* dst);
 ZR_API i32 ZR_PremulColor16(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const ZR_Pixel16* colour, i32 forward,

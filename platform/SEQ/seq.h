@@ -1,4 +1,4 @@
-// SEQ: a growable list of records of one fixed size.
+// SEQ: a growable list of records of one fixed size. One list belongs to one thread at a time.
 #pragma once
 
 #include <ZR/zr.h>
@@ -6,10 +6,12 @@
 struct SEQ_List;
 
 // The two middle arguments after `record_bytes` are the first and the growing capacity, in records.
-i32 SEQ_New(i32 kind, i32 record_bytes, i32 first_capacity, i32 growth, SEQ_List** out);  // 0 or 4
-i32 SEQ_Insert(SEQ_List* list, i32 index, const void* record);  // -1 appends; 0, 4, or 516 for a bad index
+i32 SEQ_New(i32 kind, i32 record_bytes, i32 first_capacity, i32 growth, SEQ_List** out);  // 0, 4 or 516
+// Copies a record (not one of this list) in before `index`; -1 appends. 0, 4, 516 for a bad index, or 3 while
+// the list is locked; the list is unchanged on failure.
+i32 SEQ_Insert(SEQ_List* list, i32 index, const void* record);
 i32 SEQ_GetCount(const SEQ_List* list);
-// Address of a record, and a lock on the list: nothing may be inserted until SEQ_Unlock. Null outside.
+// Address of a record, and a lock on the list: nothing can be inserted until SEQ_Unlock. Null outside.
 void* SEQ_GetAddress(SEQ_List* list, i32 index);
 void SEQ_Unlock(SEQ_List* list);
 void SEQ_Dispose(SEQ_List* list);

@@ -39,12 +39,12 @@ inline void report_string(ZR_StringIndex index, u32 site) {
 
 // Calls body.template operator()<Pixel>() for the depth; the only switch on 8, 16, 32 for exports.
 template <class Body>
-i32 on_depth(i32 depth, const char* unknown_text, Body&& body) {
+i32 on_depth(i32 depth, const char* unknown_text, Body&& body, ZR_CallSite unknown_site = ZR_Site_UnknownDepth) {
   switch (depth) {
     case 8: return body.template operator()<ZR_Pixel8>();
     case 16: return body.template operator()<ZR_Pixel16>();
     case 32: return body.template operator()<ZR_PixelFloat>();
-    default: return failed_verification(ZR_Site_UnknownDepth, unknown_text);
+    default: return failed_verification(unknown_site, unknown_text);
   }
 }
 

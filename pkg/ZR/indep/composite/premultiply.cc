@@ -1,0 +1,203 @@
+// Premultiplying and unmultiplying: the arithmetic against a matte colour, and rows handed to the generic
+// iterator.
+#include "composite/premultiply.h"
+
+#include <ZR/errors.h>
+
+#include <algorithm>
+#include <cstring>
+#include <type_traits>
+
+#include "world/guard.h"
+#include "world/slot_table.h"
+
+namespace zr {
+namespace {
+
+// ------------------------------------------------------------------------------ a matte colour
+
+// At 16 bits the product has no rounding term, unlike the plain form's.
+template <class T>
+Channel<T> onto_matte(Wide<T> c, Wide<T> a, Wide<T> m) {
+  using D = Depth<T>;
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+    return m + D::smul(a, c - m);
+  else
+    return static_cast<Channel<T>>(wrap_add(m, D::smul(a, wrap_sub(c, m))));
+}
+
+// a is neither 0 nor white. Floats have no floor, and divide by a denormal alpha too.
+template <class T>
+Channel<T> off_matte(Wide<T> c, Wide<T> a, Wide<T> m) {
+  using D = Depth<T>;
+  const Wide<T> ground = D::mul(D::inv(a), m);
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+    return (c - ground) / a;
+  else
+    return static_cast<Channel<T>>(D::div(std::max(wrap_sub(c, ground), 0), a));
+}
+
+template <class T, bool forward>
+void matte_row(i32 n, const T& matte, const T* src, T* dst) {
+  for (i32 i = 0; i < n; ++i) {
+    const T p = src[i];
+    const auto channel = [a = p.alpha](Channel<T> c, Channel<T> m) {
+      if (a == Depth<T>::white) return c;
+      if constexpr (forward)
+        return onto_matte<T>(c, a, m);
+      else
+        return a == 0 ? c : off_matte<T>(c, a, m);
+    };
+    dst[i] = {p.alpha, channel(p.red, matte.red), channel(p.green, matte.green), channel(p.blue, matte.blue)};
+  }
+}
+
+// ------------------------------------------------------------------------------ rows in bands
+
+// Pixels that one call of the generic iterator works on: enough to make the call itself cheap.
+constexpr i32 band_bytes = 1 << 16;
+
+// Runs body(y) for y in 0..rows-1 through the generic iterator, whole bands of rows to a call. The band with
+// row 0 asks for abort before it starts; a non-zero answer is returned, and rows not yet begun stay undone.
+template <class Body>
+i32 for_rows(const ZR_ProgressInfo* progress, i32 rows, i64 row_bytes, const Body& body) {
+  struct Job {
+    const ZR_ProgressInfo* progress;
+    const Body* body;
+    i32 rows, band_rows;
+  };
+  const i32 band_rows = static_cast<i32>(std::clamp<i64>(band_bytes / std::max<i64>(row_bytes, 1), 1, rows));
+  Job job = {progress, &body, rows, band_rows};
+  const i32 bands = (rows - 1) / band_rows + 1;
+  return ZR_IterateGeneric(bands, &job, [](void* refcon, i32, i32 band, i32) -> i32 {
+    const Job& work = *static_cast<const Job*>(refcon);
+    const i32 top = band * work.band_rows, bottom = top + std::min(work.band_rows, work.rows - top);
+    if (top == 0 && work.progress != nullptr && work.progress->abort != nullptr) {
+      const i32 stop = work.progress->abort(work.progress->refcon);
+      if (stop != 0) return stop;
+    }
+    for (i32 y = top; y < bottom; ++y) (*work.body)(y);
+    return ZR_Err_None;
+  });
+}
+
+// `rect` (null: everything) cut to width x height; false when nothing is left.
+bool clip(const GX_LRect* rect, i32 width, i32 height, GX_LRect* out) {
+  *out = {0, 0, width, height};
+  if (rect != nullptr)
+    *out = {std::max(rect->left, 0), std::max(rect->top, 0), std::min(rect->right, width),
+            std::min(rect->bottom, height)};
+  return out->right > out->left && out->bottom > out->top;
+}
+
+template <class T>
+RowFunc<T>* plain_row(bool forward) {
+  return forward ? slot<DepthSlots<T>::premul>() : slot<DepthSlots<T>::unmul>();
+}
+
+i32 empty_row_slot() { return failed_verification(ZR_Site_EmptySlot, "no routine for the rows of ZR_Premul"); }
+
+// ------------------------------------------------------------------------------ worlds
+
+template <class T>
+bool is_black(const T& colour) {
+  return colour.red == 0 && colour.green == 0 && colour.blue == 0;
+}
+
+// One world under one or two records.
+bool same_world(const ZR_LayerDef* a, const ZR_LayerDef* b) {
+  return a == b || (a->data == b->data && a->row_bytes == b->row_bytes);
+}
+
+template <class T>
+i32 premul_colour_rows(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const T& matte, bool forward,
+                       const GX_LRect* rect, ZR_LayerDef* dst) {
+  GX_LRect area;
+  if (!clip(rect, std::min(src->width, dst->width), std::min(src->height, dst->height), &area)) return ZR_Err_None;
+  if (src->data == nullptr || dst->data == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_Premul);
+  const ZR_WorldX<T> from(src, false), to(dst, false);
+  const i32 width = area.right - area.left, rows = area.bottom - area.top;
+  const i64 row_bytes = static_cast<i64>(width) * static_cast<i64>(sizeof(T));
+  const auto source = [&](i32 y) { return from.At(area.left, area.top + y); };
+  const auto target = [&](i32 y) { return to.At(area.left, area.top + y); };
+  if (forward)
+    return for_rows(progress, rows, row_bytes, [&](i32 y) { matte_row<T, true>(width, matte, source(y), target(y)); });
+  // Taking black away is the plain division, which makes colours under alpha 0 white.
+  if (is_black(matte)) {
+    RowFunc<T>* const row = plain_row<T>(false);
+    if (row == nullptr) return empty_row_slot();
+    return for_rows(progress, rows, row_bytes, [&](i32 y) { row(width, source(y), target(y)); });
+  }
+  return for_rows(progress, rows, row_bytes, [&](i32 y) { matte_row<T, false>(width, matte, source(y), target(y)); });
+}
+
+template <class Colour>
+i32 premul_colour(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const Colour* colour, i32 forward,
+                  const GX_LRect* rect, ZR_LayerDef* dst) {
+  return guarded([&]() -> i32 {
+    if (src == nullptr || colour == nullptr || dst == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_Premul);
+    const i32 depth = ZRp_WorldDepth(dst);
+    if (ZRp_WorldDepth(src) != depth)
+      return failed_verification(ZR_Site_Premul, "ZR_PremulColor requires src and dst worlds to be same depth");
+    return on_depth(depth, unknown_depth_text, [&]<class T>() -> i32 {
+      const T matte = convert_colour<T>(*colour);
+      if (same_world(src, dst) && is_black(matte)) return ZR_PremulRect(progress, forward, rect, dst);
+      return premul_colour_rows<T>(progress, src, matte, forward != 0, rect, dst);
+    });
+  });
+}
+
+}  // namespace
+
+i32 premul_color_rect16(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const ZR_Pixel16* colour, i32 forward,
+                        const GX_LRect* rect, ZR_LayerDef* dst) {
+  return premul_colour(progress, src, colour, forward, rect, dst);
+}
+
+}  // namespace zr
+
+i32 ZR_PremulRect_S(const ZR_ProgressInfo* progress, i32 forward, const GX_LRect* rect, ZR_LayerDef* dst) {
+  return zr::guarded([&]() -> i32 {
+    if (dst == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_Premul);
+    return zr::on_depth(ZRp_WorldDepth(dst), zr::unknown_depth_text, [&]<class T>() -> i32 {
+      GX_LRect area;
+      if (!zr::clip(rect, dst->width, dst->height, &area)) return ZR_Err_None;
+      if (dst->data == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_Premul);
+      zr::RowFunc<T>* const row = zr::plain_row<T>(forward != 0);
+      if (row == nullptr) return zr::empty_row_slot();
+      const ZR_WorldX<T> world(dst, false);
+      const i32 width = area.right - area.left;
+      return zr::for_rows(progress, area.bottom - area.top, static_cast<i64>(width) * static_cast<i64>(sizeof(T)),
+                          [&](i32 y) { row(width, nullptr, world.At(area.left, area.top + y)); });
+    });
+  });
+}
+
+i32 ZR_Premul(const ZR_ProgressInfo* progress, i32 forward, ZR_LayerDef* dst) {
+  return ZR_PremulRect(progress, forward, nullptr, dst);
+}
+
+i32 ZR_PremulColor(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const ZR_Pixel8* colour, i32 forward,
+                   ZR_LayerDef* dst) {
+  return zr::premul_colour(progress, src, colour, forward, nullptr, dst);
+}
+
+i32 ZR_PremulColor16(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const ZR_Pixel16* colour, i32 forward,
+                     ZR_LayerDef* dst) {
+  return zr::premul_colour(progress, src, colour, forward, nullptr, dst);
+}
+
+i32 ZR_PremulColorFloat(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const ZR_PixelFloat* colour, i32 forward,
+                        ZR_LayerDef* dst) {
+  return zr::premul_colour(progress, src, colour, forward, nullptr, dst);
+}
+
+i32 ZR_PremulColorRect(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const ZR_Pixel8* colour, i32 forward,
+                       const GX_LRect* rect, ZR_LayerDef* dst) {
+  return zr::premul_colour(progress, src, colour, forward, rect, dst);
+}
+
+i32 ZR_PremulColorRectFloat(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const ZR_PixelFloat* colour, i32 forward,
+                            const GX_LRect* rect, ZR_LayerDef* dst) {
+  return zr::premul_colour(progress, src, colour, forward, rect, dst);
+}

@@ -1,0 +1,14 @@
+// Whole rows between the three depths, as worlds copied to worlds convert them.
+#pragma once
+
+#include <ZR/zr.h>
+
+namespace zr {
+
+// n pixels of src to another depth; the rows do not overlap. `dither` counts for rows to 8 bits only and
+// draws four words a pixel. A float row narrows to 8 bits by the vector rule where the processor record
+// says SSE2 and src is a multiple of 16, by the scalar rule elsewhere; one rule holds for the whole row.
+template <class To, class From>
+void convert_row(i32 n, const From* src, To* dst, bool dither);
+
+}  // namespace zr

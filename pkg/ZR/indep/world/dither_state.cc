@@ -1,0 +1,51 @@
+// The random words behind dithered conversions.
+#include "world/dither_state.h"
+
+#include <DIE/die.h>
+
+#include <algorithm>
+#include <atomic>
+#include <cstring>
+
+namespace zr {
+namespace {
+
+struct DitherTable {
+  const u32* start;
+  const u32* end;
+};
+
+constinit DitherTable ZR_DitherTable = {};
+// The word last used. Relaxed: a torn address is the one race that would not be harmless.
+constinit std::atomic<const u32*> ZR_DitherCursor = nullptr;
+
+}  // namespace
+
+void prepare_dither() {
+  const u32* start = nullptr;
+  i32 count = 0;
+  DIE_GetPrimeSizedTable(&start, &count);
+  ZR_DitherTable = {start, start + count};
+  ZR_ResetDitherRandomIndex();
+}
+
+DitherRow::DitherRow() : cursor_(ZR_DitherCursor.load(std::memory_order_relaxed)) {}
+DitherRow::~DitherRow() { ZR_DitherCursor.store(cursor_, std::memory_order_relaxed); }
+
+void DitherRow::draw(std::size_t count, u32* words) {
+  while (count > 0) {
+    const u32* next = cursor_ + 1;
+    if (next >= ZR_DitherTable.end) next = ZR_DitherTable.start;
+    const std::size_t run = std::min(count, static_cast<std::size_t>(ZR_DitherTable.end - next));
+    std::memcpy(words, next, run * sizeof(u32));
+    cursor_ = next + (run - 1);
+    words += run;
+    count -= run;
+  }
+}
+
+}  // namespace zr
+
+extern "C" void ZR_ResetDitherRandomIndex() {
+  zr::ZR_DitherCursor.store(zr::ZR_DitherTable.start, std::memory_order_relaxed);
+}

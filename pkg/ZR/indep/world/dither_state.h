@@ -1,0 +1,32 @@
+// The random words behind dithered conversions: one table and one cursor for the whole process.
+//
+// The table is set by birth. The cursor is shared and unlocked: dithering on several threads at once races
+// on it, which changes the pattern of the noise and nothing else.
+#pragma once
+
+#include <ZR/zr.h>
+
+#include <cstddef>
+
+namespace zr {
+
+// Takes the table from its library and puts the cursor to its start.
+void prepare_dither();
+
+// The words of one row: takes the cursor when it is made and puts it back when it goes.
+class DitherRow {
+ public:
+  DitherRow();
+  ~DitherRow();
+  DitherRow(const DitherRow&) = delete;
+  DitherRow& operator=(const DitherRow&) = delete;
+
+  // The next `count` words. The cursor steps before it reads, so that the first word after a reset is
+  // entry 1, and entry 0 is reached by wrapping only.
+  void draw(std::size_t count, u32* words);
+
+ private:
+  const u32* cursor_;
+};
+
+}  // namespace zr
