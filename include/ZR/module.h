@@ -1,9 +1,15 @@
 /* The interface of acceleration modules: shared objects with the extension .ZNX that replace slots.
  *
- * A module exports one record, `ZR_ModuleDescriptor ZR_Module`, which lists its routines. At birth
- * each routine is called with command ZR_ModuleCommand_Load and may rewrite slots of the table; if it
- * returns non-zero every slot goes back to what it was, the module is refused and the others are
- * kept. At death it is called once more with ZR_ModuleCommand_Unload. Usable from C. */
+ * A module exports one record, `ZR_ModuleDescriptor ZR_Module`, which lists its routines. At birth, after
+ * the slots got their default routines, each routine that has the kind, the flag and the version below is
+ * called with ZR_ModuleCommand_Load, the last of a file first, and may rewrite slots. If it returns
+ * non-zero, or throws an i32, every slot goes back to what it was before the call, the user is told, and
+ * the module is refused; birth goes on and the other modules are kept. At death each is called once more
+ * with ZR_ModuleCommand_Unload, in the order of loading. Whoever births again is asked again.
+ *
+ * What it puts into a slot must do what the default does, bit for bit, be callable from any thread, and
+ * stay callable until Unload. The routine that it replaces may be kept and called from the new one.
+ * A module needs no library to link with: all it may use stands in the block. Usable from C. */
 #ifndef ZR_MODULE_H
 #define ZR_MODULE_H
 
@@ -16,9 +22,10 @@
 
 enum { ZR_ModuleCommand_Load = 0, ZR_ModuleCommand_Unload = 1 };
 
-/* What a routine receives when it is loaded. The pointers stay valid until it is unloaded. */
+/* What a routine receives when it is loaded. The block and what it points to stay valid until Unload, the two
+ * tables until death begins: they are gone when Unload is called. */
 typedef struct ZR_ModuleBlock {
-  void (*report)(u16 call_site, const char* text); /* shows a message, severity 8 */
+  void (*report)(u16 call_site, const char* text); /* shows a message; call_site is a number of the module's own */
   void* ansi[19]; /* atan, atan2, ceil, cos, exp, fabs, floor, fmod, hypot, log, log10, pow,
                      sin, sqrt, tan, sprintf, strcpy, asin, acos */
   void* (*calloc)(size_t, size_t);
@@ -26,15 +33,22 @@ typedef struct ZR_ModuleBlock {
   void* (*malloc)(size_t);
   void* (*realloc)(void*, size_t);
   void (*exit)(int);
-  const u8* multiply_table; /* 256 x 256, row * 256 + column */
-  const u8* divide_table;
-  u32 version_major;  /* 2 */
-  u32 version_minor;  /* 1 */
-  ZR_SlotFunc* slots; /* ZR_SlotCount entries */
+  const u8* multiply_table; /* 256 x 256, row * 256 + column: row * column / 255, rounded */
+  const u8* divide_table;   /* column * 255 / row, rounded, 255 from column >= row on */
+  u32 version_major;        /* 2 */
+  u32 version_minor;        /* 1 */
+  ZR_SlotFunc* slots;       /* ZR_SlotCount entries */
 } ZR_ModuleBlock;
 
-/* Load: (0, out, block, out2), where *out and *out2 are words for the module's own use, kept for it.
- * Unload: (1, 0, 0, 0). Returns 0, or a code for which the module is refused. */
+/* Rows, as many slots hold them (premultiply and unmultiply, 35 and 36, among them): n pixels from src to
+ * dst, in place where src is null or dst. Returns 0. */
+typedef i32 (*ZR_ModuleRow8)(i32 n, const ZR_Pixel8* src, ZR_Pixel8* dst);
+typedef i32 (*ZR_ModuleRow16)(i32 n, const ZR_Pixel16* src, ZR_Pixel16* dst);
+typedef i32 (*ZR_ModuleRowFloat)(i32 n, const ZR_PixelFloat* src, ZR_PixelFloat* dst);
+
+/* Load: (0, out, block, out2), where *out and *out2 are words for the module's own use, zero at first and
+ * kept for it until Unload. Unload: (1, 0, 0, 0). Returns 0, or a code for which the module is refused, or
+ * which becomes the result of death. */
 typedef i32 (*ZR_ModuleEntry)(i32 command, void** out, const ZR_ModuleBlock* block, void** out2);
 
 typedef struct ZR_ModuleProperty {
