@@ -26,7 +26,7 @@ template <class T, class Mode, class... Opacity>
 void transfer(const T& s, const ZR_LinearBlendingTables* tables, T& d, Opacity... opacity) {
   if constexpr (scales_source<Mode>) {
     // In linear light the opacities work there too.
-    const auto run = [&d]<class Depth>(const Depth& source, Depth& onto, auto... amount) {
+    const auto run = []<class Depth>(const Depth& source, Depth& onto, auto... amount) {
       const Depth whole = scaled(source, [&](auto c) { return under<Depth>(c, amount...); });
       blend_pixel<Depth, Mode>(whole, whole.alpha, onto);
     };
