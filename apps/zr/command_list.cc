@@ -16,9 +16,9 @@ namespace zr::tool {
 namespace {
 
 void list_modes() {
-  std::puts("number  name                     what it does");
+  std::puts("number  name                     how alpha enters");
   for (const ModeName& mode : all_modes())
-    std::printf("%6d  %-24s %s\n", mode.number, mode.name.c_str(), mode.description.c_str());
+    std::printf("%6d  %-24s %s\n", mode.number, mode.name.c_str(), mode.kind.c_str());
 }
 
 void list_formats() {

@@ -15,9 +15,9 @@ namespace zr::tool {
 namespace {
 
 // Pixels.
-constexpr i32 kColumns = 9, kCellWidth = 204, kCellHeight = 150, kGap = 18, kMargin = 36, kLabel = 34, kTitle = 64;
-constexpr i32 kLetterHeight = 11, kTitleHeight = 22, kChecker = 10;
-constexpr i32 kReach = 132;  // of either picture into the cell
+constexpr i32 kColumns = 9, kCellWidth = 216, kCellHeight = 150, kGap = 18, kMargin = 36, kLabel = 34, kTitle = 64;
+constexpr i32 kLetterHeight = 10, kTitleHeight = 22, kChecker = 10;
+constexpr i32 kReach = 140;  // of either picture into the cell
 constexpr i32 kSoft = 36;    // of that, the soft edge
 constexpr ZR_Pixel8 kPage{255, 24, 26, 31}, kInk{255, 232, 232, 228}, kFaintInk{255, 128, 132, 142};
 constexpr ZR_Pixel8 kLightSquare{255, 92, 94, 100}, kDarkSquare{255, 74, 76, 82};

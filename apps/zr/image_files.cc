@@ -219,6 +219,7 @@ void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, 
   spec.alpha_channel = 3;
   if (!format.associated) spec.attribute("oiio:UnassociatedAlpha", 1);
   spec.attribute("compression", "zip");
+  spec.attribute("png:compressionLevel", 4);  // half the time of the usual 6, a twentieth larger
   spec.attribute("Software", "zr");
   const auto fail = [&] { throw file_error(file + " cannot be written: " + first_line(output->geterror())); };
   if (!output->open(file, spec)) fail();
