@@ -20,7 +20,7 @@ i32 GX_UnprepareFCMD();  // 0
 
 // f64[GX_FTrigSteps + 1]: entry i is the sine of i / GX_FTrigSteps of a full turn, first and last alike. The
 // cosine of i stands at (i + GX_FTrigSteps / 4) modulo GX_FTrigSteps. Its symmetries hold exactly.
-enum { GX_FTrigSteps = 4096 };
+inline constexpr i32 GX_FTrigSteps = 4096;
 i32 GX_PrepareFTrig(i32, i32, i32, const void** table);
 i32 GX_UnprepareFTrig();  // 0
 

@@ -1,0 +1,4 @@
+// Row functions of 16-bit pixels.
+#include "composite/inner_blend_impl.h"
+
+ZR_INSTANTIATE_INNER_BLENDS(ZR_Pixel16)

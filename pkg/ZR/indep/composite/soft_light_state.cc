@@ -1,0 +1,32 @@
+// Builds the soft-light tables of the deep depths.
+#include "composite/soft_light_state.h"
+
+#include <cmath>
+
+namespace zr {
+
+constinit u16 soft_light_low_16[4097]{};
+constinit u16 soft_light_high_16[4097]{};
+constinit f32 soft_light_low_float[4098]{};
+constinit f32 soft_light_high_float[4098]{};
+
+namespace {
+
+f64 low(f64 x) { return x * (1.0 - x); }
+f64 high(f64 x) { return (x <= 0.25 ? ((16.0 * x - 12.0) * x + 4.0) * x : std::sqrt(x)) - x; }
+// Both curves lie in 0..0.25, so that nothing needs a clamp.
+u16 rounded_16(f64 v) { return static_cast<u16>(32768.0 * v + 0.5); }
+
+}  // namespace
+
+void build_soft_light_tables() {
+  for (int i = 0; i < 4096; ++i) {
+    const f64 x = i / 4096.0;
+    soft_light_low_16[i] = rounded_16(low(x));
+    soft_light_high_16[i] = rounded_16(high(x));
+    soft_light_low_float[i] = static_cast<f32>(low(x));
+    soft_light_high_float[i] = static_cast<f32>(high(x));
+  }
+}
+
+}  // namespace zr

@@ -1,0 +1,526 @@
+// The transfer modes: each is one entry with its number, its kind and its formulas, told once for all depths.
+//
+// From an entry come its per-pixel functions, its row functions with and without mask, the forms in linear
+// light, its name in text and its class in the row pipeline. To add a mode, add its number to
+// <ZR/transfer_mode.h>, an entry here and a place in AllModes.
+//
+// Formulas are over M = ModeMath<T>: s source, d destination (of ground modes: faded to its ground), A the
+// effective alpha of the source. full(s, d) is the formula under a white A, partial(s, A, d) under a lesser
+// one. Row formulas that round another way than the pixel's have a row_full.
+#pragma once
+
+#include <ZR/transfer_mode.h>
+
+#include <tuple>
+
+#include "composite/mode_arithmetic.h"
+#include "composite/mode_colour_impl.h"
+
+namespace zr {
+
+// How a mode treats alpha: what its entry must bring.
+enum class ModeKind {
+  copy,          // pixel
+  over,          // pixel
+  row_only,      // a row function of its own
+  black_ground,  // full, partial
+  white_ground,  // full, partial
+  grey_ground,   // full, partial
+  weighted,      // full
+  colour,        // wanted (or none), recoloured
+  alpha_only,    // alpha
+  special,       // pixel
+};
+
+// What a row of the mode runs besides the main function, and whether the pipeline guards its alpha.
+enum class RowClass { plain, self_contained, black_ground, white_ground, grey_ground, colour };
+
+constexpr RowClass usual_row_class(ModeKind kind) {
+  switch (kind) {
+    case ModeKind::black_ground: return RowClass::black_ground;
+    case ModeKind::white_ground: return RowClass::white_ground;
+    case ModeKind::grey_ground: return RowClass::grey_ground;
+    case ModeKind::weighted: return RowClass::self_contained;
+    case ModeKind::colour: return RowClass::colour;
+    default: return RowClass::plain;
+  }
+}
+
+template <ZR_TransferMode Number, ModeKind Kind, RowClass Class = usual_row_class(Kind)>
+struct Mode {
+  static constexpr ZR_TransferMode number = Number;
+  static constexpr ModeKind kind = Kind;
+  static constexpr RowClass row_class = Class;
+};
+
+// ------------------------------------------------------------------------------ whole pixels
+
+// Back into a channel; integers modulo its width.
+template <class T>
+constexpr Channel<T> store(Wide<T> v) {
+  return static_cast<Channel<T>>(v);
+}
+
+// d = change(s, d) for the three colour channels.
+template <class T, class Change>
+[[gnu::always_inline]] inline void each_colour(const T& s, T& d, Change&& change) {
+  d.red = store<T>(change(Wide<T>{s.red}, Wide<T>{d.red}));
+  d.green = store<T>(change(Wide<T>{s.green}, Wide<T>{d.green}));
+  d.blue = store<T>(change(Wide<T>{s.blue}, Wide<T>{d.blue}));
+}
+
+// The alpha of two layers.
+template <class M>
+constexpr auto combined_alpha(typename M::Wide A, typename M::Wide D) {
+  return M::white - M::mul(M::inv(A), M::inv(D));
+}
+
+struct Copy : Mode<XferCopy, ModeKind::copy> {
+  template <class T>
+  static void pixel(const T& s, Wide<T> A, T& d) {
+    d = s;
+    d.alpha = store<T>(A);
+  }
+};
+
+struct CopyFast : Mode<XferCopyFast, ModeKind::row_only> {};
+struct MatteMix : Mode<XferMatteMix, ModeKind::row_only> {};
+struct Dissolve : Mode<XferDissolve, ModeKind::row_only> {
+  template <class T>
+  static void pixel(const T&, Wide<T>, T&) {}  // one pixel has no place in a row to draw lots for
+};
+
+struct Behind : Mode<XferBehind, ModeKind::over> {
+  template <class T>
+  static void pixel(const T& s, Wide<T> A, T& d) {
+    using M = ModeMath<T>;
+    const Wide<T> D = d.alpha;
+    if (D == M::white) return;
+    const Wide<T> R = combined_alpha<M>(A, D);
+    each_colour(s, d, [&](Wide<T> sc, Wide<T> dc) { return M::div(M::stored(M::drawn(M::mul(sc, A), dc, D)), R); });
+    d.alpha = store<T>(R);
+  }
+};
+
+struct InFront : Mode<XferInFront, ModeKind::over, RowClass::self_contained> {
+  template <class T>
+  static void pixel(const T& s, Wide<T> A, T& d) {
+    using M = ModeMath<T>;
+    const Wide<T> D = d.alpha;
+    if (A == M::white) {
+      d = s;
+    } else if (D == 0) {  // without a rounding
+      d = s;
+      d.alpha = store<T>(A);
+    } else {
+      const Wide<T> R = combined_alpha<M>(A, D);
+      each_colour(s, d, [&](Wide<T> sc, Wide<T> dc) {
+        const Wide<T> t = M::mul(dc, D);
+        return M::div(M::stored(t + M::smul(A, sc - t)), R);
+      });
+      d.alpha = store<T>(R);
+    }
+  }
+};
+
+// The source as premultiplied: opacities scale all its channels before it comes here, A is its alpha after
+// that, and alpha 0 still adds the colour.
+struct AddPremul : Mode<XferAddPremul, ModeKind::special, RowClass::self_contained> {
+  static constexpr bool scales_source = true;
+  template <class T>
+  static void pixel(const T& s, Wide<T> A, T& d) {
+    using M = ModeMath<T>;
+    const Wide<T> D = d.alpha, K = M::mul(M::inv(A), D);
+    const Wide<T> R = combined_alpha<M>(A, D);
+    each_colour(s, d, [&](Wide<T> sc, Wide<T> dc) { return M::div(M::stored(M::capped(sc + M::mul(dc, K))), R); });
+    d.alpha = store<T>(R);
+  }
+};
+
+// Alphas add, for edges that must sum to full coverage.
+struct AlphaAdd : Mode<XferAlphaAdd, ModeKind::special, RowClass::self_contained> {
+  template <class T>
+  static void pixel(const T& s, Wide<T> A, T& d) {
+    using M = ModeMath<T>;
+    const Wide<T> D = d.alpha, sum = A + D;
+    if (A == M::white) {
+      d = s;
+      d.alpha = store<T>(M::white);
+    } else if (sum >= M::white) {
+      each_colour(s, d, [&](Wide<T> sc, Wide<T> dc) { return M::mul(sc, A) + M::mul(dc, M::inv(A)); });
+      d.alpha = store<T>(M::white);
+    } else {
+      each_colour(s, d, [&](Wide<T> sc, Wide<T> dc) { return M::div(M::stored(M::mul(sc, A) + M::mul(dc, D)), sum); });
+      d.alpha = store<T>(sum);
+    }
+  }
+};
+
+struct BlueThreshold : Mode<XferBlueThreshold, ModeKind::special> {
+  template <class T>
+  static void pixel(const T& s, Wide<T> A, T& d) {
+    if (A < ModeMath<T>::half) return;
+    d.blue = s.blue;
+    d.alpha = store<T>(ModeMath<T>::white);
+  }
+};
+
+// Four marker colours of the destination are kept; all else takes the source as it is stored.
+struct KeyProtect : Mode<XferKeyProtect, ModeKind::special> {
+  template <class T>
+  static void pixel(const T& s, Wide<T>, T& d) {
+    using M = ModeMath<T>;
+    const auto is = [&d](Wide<T> red, Wide<T> green, Wide<T> blue) {
+      return d.red == red && d.green == green && d.blue == blue;
+    };
+    const bool marker = is(M::white, 0, 0) || is(0, M::white, 0) || is(0, 0, M::marker_high) || is(0, 0, M::marker_low);
+    if (!marker) d = s;
+  }
+};
+
+// ------------------------------------------------------------------------------ on a black ground
+
+struct Add : Mode<XferAdd, ModeKind::black_ground> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return M::capped(s + d);
+  }
+  template <class M>
+  static constexpr auto partial(auto s, auto A, auto d) {
+    return full<M>(M::mul(s, A), d);
+  }
+};
+
+struct Screen : Mode<XferScreen, ModeKind::black_ground> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return M::white - M::mul(M::inv(s), M::inv(d));
+  }
+  template <class M>
+  static constexpr auto partial(auto s, auto A, auto d) {
+    return full<M>(M::mul(s, A), d);
+  }
+};
+
+struct Lighten : Mode<XferLighten, ModeKind::black_ground> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return s > d ? s : d;
+  }
+  template <class M>
+  static constexpr auto partial(auto s, auto A, auto d) {
+    return s > d ? d + M::mul(A, s - d) : d;
+  }
+};
+
+struct Difference : Mode<XferDifference, ModeKind::black_ground> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return M::magnitude(s - d);
+  }
+  template <class M>
+  static constexpr auto partial(auto s, auto A, auto d) {
+    return full<M>(M::mul(s, A), d);
+  }
+};
+
+struct ColorDodge : Mode<XferColorDodge, ModeKind::black_ground> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    const auto w = M::inv(s);
+    return d >= w ? M::white : M::div(d, w);
+  }
+  template <class M>
+  static constexpr auto partial(auto s, auto A, auto d) {
+    return full<M>(M::mul(s, A), d);
+  }
+};
+
+struct Exclusion : Mode<XferExclusion, ModeKind::black_ground> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return s + d - 2 * M::mul(s, d);
+  }
+  template <class M>
+  static constexpr auto partial(auto s, auto A, auto d) {
+    const auto product = M::mul(s, d);
+    return d + M::smul(A, s - product - product);
+  }
+};
+
+// ------------------------------------------------------------------------------ on a white ground
+
+struct Multiply : Mode<XferMultiply, ModeKind::white_ground> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return d - M::mul(d, M::inv(s));
+  }
+  template <class M>
+  static constexpr auto row_full(auto s, auto d) {
+    return M::mul(s, d);
+  }
+  template <class M>
+  static constexpr auto partial(auto s, auto A, auto d) {
+    return d - M::mul(M::mul(d, M::inv(s)), A);
+  }
+};
+
+struct Darken : Mode<XferDarken, ModeKind::white_ground> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return s < d ? s : d;
+  }
+  template <class M>
+  static constexpr auto partial(auto s, auto A, auto d) {
+    return s < d ? d - M::mul(A, d - s) : d;
+  }
+};
+
+struct ColorBurn : Mode<XferColorBurn, ModeKind::white_ground> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    const auto w = M::inv(d);
+    return w >= s ? typename M::Wide{0} : M::white - M::div(w, s);
+  }
+  template <class M>
+  static constexpr auto partial(auto s, auto A, auto d) {
+    return full<M>(M::inv(M::mul(M::inv(s), A)), d);
+  }
+};
+
+// ------------------------------------------------------------------------------ on a grey ground
+
+struct Overlay : Mode<XferOverlay, ModeKind::grey_ground> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return d < M::half ? 2 * M::mul(s, d) : M::white - M::mul(M::inv(s), 2 * M::inv(d));
+  }
+  template <class M>
+  static constexpr auto partial(auto s, auto A, auto d) {
+    return d + M::smul(A, full<M>(s, d) - d);
+  }
+};
+
+struct SoftLight : Mode<XferSoftLight, ModeKind::grey_ground> {
+  template <class M>
+  static auto full(auto s, auto d) {
+    return s < M::half ? d - M::mul(M::inv(2 * s), M::soft_low(d)) : d + M::mul(2 * s - M::white, M::soft_high(d));
+  }
+  template <class M>
+  static auto partial(auto s, auto A, auto d) {
+    return s < M::half ? d - M::soft_weight(M::inv(2 * s), M::soft_low(d), A)
+                       : d + M::soft_weight(2 * s - M::white, M::soft_high(d), A);
+  }
+};
+
+struct HardLight : Mode<XferHardLight, ModeKind::grey_ground> {
+  // Twice the half is 256 at 8 bits: a white source counts as 254 there, not 255.
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return s < M::half ? d - M::mul(d, M::inv(2 * s)) : d + M::mul(M::inv(d), 2 * s - 2 * M::half);
+  }
+  template <class M>
+  static constexpr auto partial(auto s, auto A, auto d) {
+    return s < M::half ? d - M::mul(M::mul(d, M::inv(2 * s)), A)
+                       : d + M::mul(M::mul(M::inv(d), 2 * s - 2 * M::half), A);
+  }
+};
+static_assert(HardLight::full<ModeMath<ZR_Pixel8>>(255, 0) == 254, "8-bit doubling drops the low bit");
+
+// ------------------------------------------------------------------------------ weighted by both alphas
+
+struct DifferenceW : Mode<XferDifferenceW, ModeKind::weighted> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return M::magnitude(s - d);
+  }
+};
+
+// Black stays black, also under white.
+struct ColorDodgeW : Mode<XferColorDodgeW, ModeKind::weighted> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return d == 0 ? typename M::Wide{0} : ColorDodge::full<M>(s, d);
+  }
+};
+
+// White stays white, also under black.
+struct ColorBurnW : Mode<XferColorBurnW, ModeKind::weighted> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return s == 0 && d == M::white ? M::white : ColorBurn::full<M>(s, d);
+  }
+};
+
+struct LinearDodge : Mode<XferLinearDodge, ModeKind::weighted> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return M::capped(s + d);
+  }
+};
+
+struct LinearBurn : Mode<XferLinearBurn, ModeKind::weighted> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    const auto sum = s + d - M::white;
+    return sum < 0 ? typename M::Wide{0} : sum;  // float is clamped too
+  }
+};
+
+struct LinearLight : Mode<XferLinearLight, ModeKind::weighted> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return M::capped(M::floored(2 * s - 2 * M::half + d));
+  }
+};
+
+struct VividLight : Mode<XferVividLight, ModeKind::weighted> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return s < M::half ? low<M>(s, d) : s > M::half ? high<M>(s, d) : d;
+  }
+
+ private:
+  template <class M>
+  static constexpr auto low(auto s, auto d) {
+    return s == 0 ? typename M::Wide{0} : ColorBurn::full<M>(M::stretched_low(s), d);
+  }
+  template <class M>
+  static constexpr auto high(auto s, auto d) {
+    return s == M::white ? M::white : ColorDodge::full<M>(M::stretched_high(s), d);
+  }
+};
+
+struct PinLight : Mode<XferPinLight, ModeKind::weighted> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return s < M::half   ? Darken::full<M>(M::stretched_low(s), d)
+           : s > M::half ? Lighten::full<M>(M::stretched_high(s), d)
+                         : d;
+  }
+};
+
+struct HardMix : Mode<XferHardMix, ModeKind::weighted> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return M::hard_mix(s, d);
+  }
+};
+
+struct Subtract : Mode<XferSubtract, ModeKind::weighted> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return M::floored(d - s);
+  }
+};
+
+struct Divide : Mode<XferDivide, ModeKind::weighted> {
+  template <class M>
+  static constexpr auto full(auto s, auto d) {
+    return M::quotient(d, s);
+  }
+};
+
+// ------------------------------------------------------------------------------ whole colours
+
+// recoloured: the new colour from the source's and that of the destination behind which the source has
+// been composited.
+
+struct Hue : Mode<XferHue, ModeKind::colour> {
+  template <class M>
+  static constexpr Rgb<M> recoloured(const Rgb<M>& s, const Rgb<M>& d) {
+    return with_luma(with_saturation(s, saturation_of(d)), luma_of(d));
+  }
+};
+
+struct Saturation : Mode<XferSaturation, ModeKind::colour> {
+  template <class M>
+  static constexpr Rgb<M> recoloured(const Rgb<M>& s, const Rgb<M>& d) {
+    return with_luma(with_saturation(d, saturation_of(s)), luma_of(d));
+  }
+};
+
+struct Color : Mode<XferColor, ModeKind::colour> {
+  template <class M>
+  static constexpr Rgb<M> recoloured(const Rgb<M>& s, const Rgb<M>& d) {
+    return with_luma(s, luma_of(d));
+  }
+};
+
+struct Luminosity : Mode<XferLuminosity, ModeKind::colour> {
+  template <class M>
+  static constexpr Rgb<M> recoloured(const Rgb<M>& s, const Rgb<M>& d) {
+    return with_luma(d, luma_of(s));
+  }
+};
+
+// wanted: whether the pixel is recoloured at all, by the lumas of source and destination.
+
+struct LighterColor : Mode<XferLighterColor, ModeKind::colour> {
+  static constexpr bool wanted(auto source_luma, auto luma) { return source_luma > luma; }
+  template <class M>
+  static constexpr Rgb<M> recoloured(const Rgb<M>& s, const Rgb<M>&) {
+    return s;
+  }
+};
+
+struct DarkerColor : Mode<XferDarkerColor, ModeKind::colour> {
+  static constexpr bool wanted(auto source_luma, auto luma) { return source_luma < luma; }
+  template <class M>
+  static constexpr Rgb<M> recoloured(const Rgb<M>& s, const Rgb<M>&) {
+    return s;
+  }
+};
+
+// ------------------------------------------------------------------------------ alpha only
+
+// alpha: the new alpha of the destination from its own (D), the source's colour and A.
+
+struct MultiplyAlpha : Mode<XferMultiplyAlpha, ModeKind::alpha_only> {
+  template <class M>
+  static constexpr auto alpha(const Rgb<M>&, auto A, auto D) {
+    return M::mul(D, A);
+  }
+};
+
+struct MultiplyAlphaLuma : Mode<XferMultiplyAlphaLuma, ModeKind::alpha_only> {
+  template <class M>
+  static constexpr auto alpha(const Rgb<M>& s, auto A, auto D) {
+    return M::luma_alpha(M::mul(D, M::mul(luma_of(s), A)));
+  }
+};
+
+struct MultiplyNotAlpha : Mode<XferMultiplyNotAlpha, ModeKind::alpha_only> {
+  template <class M>
+  static constexpr auto alpha(const Rgb<M>&, auto A, auto D) {
+    return M::mul(D, M::inv(A));
+  }
+};
+
+struct MultiplyNotAlphaLuma : Mode<XferMultiplyNotAlphaLuma, ModeKind::alpha_only> {
+  template <class M>
+  static constexpr auto alpha(const Rgb<M>& s, auto A, auto D) {
+    return M::luma_alpha(M::mul(D, M::inv(M::mul(luma_of(s), A))));
+  }
+};
+
+// ------------------------------------------------------------------------------ the list
+
+using AllModes =
+    std::tuple<CopyFast, MatteMix, Copy, Behind, InFront, Dissolve, Add, Multiply, Screen, Overlay, SoftLight,
+               HardLight, Darken, Lighten, Difference, Hue, Saturation, Color, Luminosity, MultiplyAlpha,
+               MultiplyAlphaLuma, MultiplyNotAlpha, MultiplyNotAlphaLuma, AddPremul, AlphaAdd, ColorDodge, ColorBurn,
+               Exclusion, DifferenceW, ColorDodgeW, ColorBurnW, LinearDodge, LinearBurn, LinearLight, VividLight,
+               PinLight, HardMix, LighterColor, DarkerColor, Subtract, Divide, BlueThreshold, KeyProtect>;
+
+// Calls visit.template operator()<Mode>() for every mode, in the order of their numbers.
+template <class Visit>
+constexpr void for_each_mode(Visit&& visit) {
+  [&]<class... Modes>(std::tuple<Modes...>*) {
+    (visit.template operator()<Modes>(), ...);
+  }(static_cast<AllModes*>(nullptr));
+}
+
+inline constexpr i32 first_mode = -3, mode_rows = 44, pixel_slots = 44;
+
+}  // namespace zr

@@ -1,0 +1,164 @@
+// The slot table after birth, and what replacing a slot does.
+#include <ZR/composite.h>
+
+#include <bitset>
+
+#include "support/born_library.h"
+#include "support/worlds.h"
+#include "world/premul_rows.h"
+
+namespace {
+
+struct Range {
+  int first, last;
+};
+// Slots with a routine; every other one is null.
+constexpr Range filled[] = {{7, 10}, {17, 22}, {31, 31}, {35, 48}, {51, 53}, {72, 78}, {94, 112}};
+
+using Slots = BornLibrary;
+
+TEST_F(Slots, HoldARoutineWhereTheLibraryHasOneAndNullElsewhere) {
+  std::bitset<ZR_SlotCount> expected;
+  for (const Range& range : filled)
+    for (int slot = range.first; slot <= range.last; ++slot) expected.set(static_cast<size_t>(slot));
+  for (size_t slot = 0; slot < ZR_SlotCount; ++slot)
+    EXPECT_EQ(ZRp_G_OverFuncs[slot] != nullptr, expected[slot]) << "slot " << slot;
+}
+
+// Routines with an exported name or with a name agreed between floors stand in the slot of that number.
+TEST_F(Slots, HoldTheRoutineOfTheirName) {
+  const auto at = [](int slot) { return reinterpret_cast<void*>(ZRp_G_OverFuncs[slot]); };
+  const auto address = [](auto* routine) { return reinterpret_cast<void*>(routine); };
+  const struct {
+    int slot;
+    void* routine;
+  } cases[] = {
+      {31, address(&ZR_TransferRect_S)},
+      {52, address(&ZR_PremulRect_S)},
+      {53, address(&ZR_IterateGeneric_Static)},
+      {35, address(&zr::premul_row<ZR_Pixel8>)},
+      {36, address(&zr::unmul_row<ZR_Pixel8>)},
+      {72, address(&zr::premul_row<ZR_Pixel16>)},
+      {73, address(&zr::unmul_row<ZR_Pixel16>)},
+      {106, address(&zr::premul_row<ZR_PixelFloat>)},
+      {107, address(&zr::unmul_row<ZR_PixelFloat>)},
+      {94, address(&ZR_GetInnerBlendingFunc<ZR_Pixel8, false, false>)},
+      {95, address(&ZR_GetInnerBlendingFunc<ZR_Pixel16, false, false>)},
+      {96, address(&ZR_GetInnerBlendingFunc<ZR_PixelFloat, false, false>)},
+      {97, address(&ZR_GetInnerBlendingFunc<ZR_Pixel8, true, false>)},
+      {98, address(&ZR_GetInnerBlendingFunc<ZR_Pixel16, true, false>)},
+      {99, address(&ZR_GetInnerBlendingFunc<ZR_PixelFloat, true, false>)},
+      {100, address(&ZR_GetInnerBlendingFunc<ZR_Pixel8, false, true>)},
+      {101, address(&ZR_GetInnerBlendingFunc<ZR_Pixel16, false, true>)},
+      {102, address(&ZR_GetInnerBlendingFunc<ZR_PixelFloat, false, true>)},
+      {103, address(&ZR_GetInnerBlendingFunc<ZR_Pixel8, true, true>)},
+      {104, address(&ZR_GetInnerBlendingFunc<ZR_Pixel16, true, true>)},
+      {105, address(&ZR_GetInnerBlendingFunc<ZR_PixelFloat, true, true>)},
+  };
+  for (const auto& one : cases) EXPECT_EQ(at(one.slot), one.routine) << "slot " << one.slot;
+}
+
+TEST_F(Slots, OverrideTakesNumbersFrom1To117) {
+  void* const mark = reinterpret_cast<void*>(&ZR_Hypot);
+  for (const i32 slot : {-1, 0, 118, 119, INT32_MIN, INT32_MAX}) EXPECT_EQ(ZR_SetOverrideFunc(slot, mark), 3) << slot;
+  EXPECT_EQ(ZRp_G_OverFuncs[0], nullptr);
+  for (i32 slot = 1; slot <= 117; ++slot) {
+    const ZR_SlotFunc before = ZRp_G_OverFuncs[slot];
+    EXPECT_EQ(ZR_SetOverrideFunc(slot, mark), 0);
+    EXPECT_EQ(reinterpret_cast<void*>(ZRp_G_OverFuncs[slot]), mark) << slot;
+    ZRp_G_OverFuncs[slot] = before;
+  }
+}
+
+// Each export goes through the slot of its number: that slot's routine alone is called, with the arguments.
+template <i32 result, class... Arguments>
+i32 answer(Arguments...) {
+  return result;
+}
+template <i32 result, class... Arguments>
+void* answering(i32 (*)(Arguments...)) {
+  return reinterpret_cast<void*>(&answer<result, Arguments...>);
+}
+
+TEST_F(Slots, ExportsJumpThroughThem) {
+  const SlotOverride overrides[] = {
+      {ZR_Slot_iterate, answering<1042>(&ZR_Iterate)},
+      {ZR_Slot_iterate_origin, answering<1043>(&ZR_IterateOrigin)},
+      {ZR_Slot_iterate_lut, answering<1044>(&ZR_IterateLUT)},
+      {ZR_Slot_open_destination, answering<1045>(&ZR_OpenDestination)},
+      {ZR_Slot_close_destination, answering<1046>(&ZR_CloseDestination)},
+      {ZR_Slot_iterate_generic, answering<1053>(&ZR_IterateGeneric)},
+      {ZR_Slot_transfer_rect, answering<1031>(&ZR_TransferRect)},
+      {ZR_Slot_transfer_rect_plus, answering<1020>(&ZR_TransferRectPlus)},
+      {ZR_Slot_composite_rect_draft_straight, answering<1007>(&ZR_CompositeRectDraft_Straight)},
+      {ZR_Slot_composite_rect_draft_premul, answering<1008>(&ZR_CompositeRectDraft_Premul)},
+      {ZR_Slot_composite_rect_best_straight, answering<1009>(&ZR_CompositeRectBest_Straight)},
+      {ZR_Slot_composite_rect_best_premul, answering<1010>(&ZR_CompositeRectBest_Premul)},
+      {ZR_Slot_premul_rect, answering<1052>(&ZR_PremulRect)},
+  };
+  EXPECT_EQ(ZR_Iterate(nullptr, 0, 0, nullptr, nullptr, nullptr, nullptr, nullptr), 1042);
+  EXPECT_EQ(ZR_IterateOrigin(nullptr, 0, 0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr), 1043);
+  EXPECT_EQ(ZR_IterateLUT(nullptr, 0, 0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr), 1044);
+  EXPECT_EQ(ZR_OpenDestination(nullptr, nullptr), 1045);
+  EXPECT_EQ(ZR_CloseDestination(nullptr, nullptr), 1046);
+  EXPECT_EQ(ZR_IterateGeneric(1, nullptr, nullptr), 1053);
+  EXPECT_EQ(ZR_TransferRect(nullptr, 0, 0, 0, nullptr, nullptr, nullptr, nullptr, nullptr, 0, 0, nullptr), 1031);
+  EXPECT_EQ(ZR_TransferRectPlus(nullptr, 0, 0, 0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, 0, 0, nullptr),
+            1020);
+  EXPECT_EQ(ZR_CompositeRectDraft_Straight(nullptr, nullptr, 0, nullptr, 0, 0, 0, 0, nullptr), 1007);
+  EXPECT_EQ(ZR_CompositeRectDraft_Premul(nullptr, nullptr, 0, nullptr, 0, 0, 0, 0, nullptr), 1008);
+  EXPECT_EQ(ZR_CompositeRectBest_Straight(nullptr, nullptr, 0, nullptr, 0, 0, 0, 0, nullptr), 1009);
+  EXPECT_EQ(ZR_CompositeRectBest_Premul(nullptr, nullptr, 0, nullptr, 0, 0, 0, 0, nullptr), 1010);
+  EXPECT_EQ(ZR_PremulRect(nullptr, 0, nullptr, nullptr), 1052);
+}
+
+TEST_F(Slots, AnEmptiedSlotFailsItsExport) {
+  const SlotOverride none(ZR_Slot_iterate_generic, nullptr);
+  EXPECT_EQ(ZR_IterateGeneric(1, nullptr, [](void*, i32, i32, i32) { return i32{0}; }), 3);
+}
+
+i32 G_generic_calls;
+i32 counting_generic(i32 iterations, void* refcon, ZR_GenericFunc fn) {
+  ++G_generic_calls;
+  return ZR_IterateGeneric_Static(iterations, refcon, fn);
+}
+i32 G_row_calls;
+i32 counting_premul_row(i32 n, const ZR_Pixel8* src, ZR_Pixel8* dst) {
+  ++G_row_calls;
+  return zr::premul_row<ZR_Pixel8>(n, src, dst);
+}
+
+TEST_F(Slots, AReplacedIterationOrRowIsUsedByTheNextOperation) {
+  TestWorld<ZR_Pixel8> world(5, 4);
+  G_generic_calls = G_row_calls = 0;
+  {
+    const SlotOverride generic(ZR_Slot_iterate_generic, reinterpret_cast<void*>(&counting_generic));
+    const SlotOverride row(ZR_Slot_premul_row8, reinterpret_cast<void*>(&counting_premul_row));
+    EXPECT_EQ(ZR_Premul(nullptr, 1, world), 0);
+    EXPECT_GT(G_generic_calls, 0);
+    EXPECT_EQ(G_row_calls, 4);
+  }
+  const i32 calls = G_generic_calls;
+  EXPECT_EQ(ZR_Premul(nullptr, 1, world), 0);
+  EXPECT_EQ(G_generic_calls, calls) << "the override has ended";
+  EXPECT_EQ(G_row_calls, 4);
+}
+
+TEST_F(Slots, DestinationBodiesClearTheirRecord) {
+  struct {
+    void* words[5];
+  } record;
+  int first = 0;
+  void* const mark = &record;
+  std::fill(std::begin(record.words), std::end(record.words), mark);
+  EXPECT_EQ(ZR_OpenDestination(&first, &record), 0);
+  EXPECT_EQ(record.words[0], &first);
+  for (int i = 1; i < 4; ++i) EXPECT_EQ(record.words[i], nullptr);
+  EXPECT_EQ(record.words[4], mark) << "32 bytes and no more";
+  std::fill(std::begin(record.words), std::end(record.words), mark);
+  EXPECT_EQ(ZR_CloseDestination(&first, &record), 0);
+  for (int i = 0; i < 4; ++i) EXPECT_EQ(record.words[i], nullptr);
+  EXPECT_EQ(record.words[4], mark);
+}
+
+}  // namespace
