@@ -1,0 +1,162 @@
+// Transforms: legs between profiles, and the plan by which a pair of layouts is run.
+#include "TON/lcms_engine.h"
+
+namespace zr::prisma {
+namespace {
+
+Layout layout_of(u32 code) {
+  for (int i = 0; i < layout_count; ++i)
+    if (layouts[i].code == code) return static_cast<Layout>(i);
+  refuse(PRISMA_Err_BadParam);
+}
+
+void check_end(Layout layout, cmsColorSpaceSignature space) {
+  if (space != (info(layout).cmyk ? cmsSigCmykData : cmsSigRgbData)) refuse(PRISMA_Err_ColourSpace);
+}
+
+// The affine map between the linear light of two profiles, asked of lcms itself at black and the primaries.
+void affine_between(const ContextRef& context, const PRISMATransform::Leg& leg, f32 columns[3][3], f32 offset[3]) {
+  const TON_PRISMA_Ref<PRISMAProfile> from(linear_profile(*leg.from.get())), to(linear_profile(*leg.to.get()));
+  const TransformPtr transform(obtained(
+      cmsCreateTransformTHR(context.raw(), from.get()->handle.get(), TYPE_RGB_FLT, to.get()->handle.get(), TYPE_RGB_FLT,
+                            static_cast<u32>(leg.intent), cmsFLAGS_NOOPTIMIZE | cmsFLAGS_NOCACHE)));
+  constexpr f32 corners[4][3] = {{0, 0, 0}, {1, 0, 0}, {0, 1, 0}, {0, 0, 1}};
+  f32 results[4][3];
+  cmsDoTransform(transform.get(), corners, results, 4);
+  for (int i = 0; i < 3; ++i) {
+    offset[i] = results[0][i];
+    for (int c = 0; c < 3; ++c) columns[c][i] = results[c + 1][i] - results[0][i];
+  }
+}
+
+// False: this leg is not made of curves and a matrix that can be run here.
+bool prepare_shaper(const ContextRef& context, const PRISMATransform::Leg& leg, MatrixShaper& shaper) {
+  const bool colorimetric =
+      leg.intent == PRISMA_Intent_RelativeColorimetric || leg.intent == PRISMA_Intent_AbsoluteColorimetric;
+  if (!colorimetric || !leg.from.get()->is_plain_matrix_shaper() || !leg.to.get()->is_plain_matrix_shaper())
+    return false;
+  const cmsToneCurve* forward[3];
+  CurvePtr inverse[3];
+  for (int c = 0; c < 3; ++c) {
+    forward[c] = static_cast<const cmsToneCurve*>(cmsReadTag(leg.from.get()->handle.get(), trc_tags[c]));
+    const auto* const back = static_cast<const cmsToneCurve*>(cmsReadTag(leg.to.get()->handle.get(), trc_tags[c]));
+    if (forward[c] == nullptr || back == nullptr) return false;
+    inverse[c].reset(cmsReverseToneCurve(back));
+    if (inverse[c] == nullptr) return false;
+  }
+  f32 columns[3][3], offset[3];
+  affine_between(context, leg, columns, offset);
+  cmsToneCurve* const taken[3] = {inverse[0].release(), inverse[1].release(), inverse[2].release()};
+  return shaper.prepare(forward, taken, columns, offset);
+}
+
+// Pixels of a band: enough to hide the call, few enough to stay in a cache.
+constexpr size_t band_pixels = 16384;
+
+template <class Run>
+i32 in_bands(size_t count, PRISMA_IterateFunc iterate, const Run& run) {
+  if (iterate == nullptr || count < 2 * band_pixels) {
+    run(0, count);
+    return 0;
+  }
+  struct Work {
+    const Run& run;
+    size_t count, bands;
+  } work{run, count, std::min<size_t>((count + band_pixels - 1) / band_pixels, 1u << 20)};
+  return iterate(static_cast<i32>(work.bands), &work, [](void* self, i32, i32 i, i32) -> i32 {
+    const Work& all = *static_cast<const Work*>(self);
+    const size_t each = (all.count + all.bands - 1) / all.bands;
+    const size_t begin = static_cast<size_t>(i) * each;
+    if (begin < all.count) all.run(begin, std::min(each, all.count - begin));
+    return 0;
+  });
+}
+
+}  // namespace
+}  // namespace zr::prisma
+
+using namespace zr::prisma;
+
+struct PRISMATransform::Plan {
+  bool by_shaper = false;
+  TransformPtr lcms;
+};
+
+PRISMATransform::PRISMATransform(const ContextRef& from, Counted<Leg> parts, u32 precision)
+    : PRISMA_Object(destroy_object<PRISMATransform>), context(from), legs(std::move(parts)), level(precision) {}
+
+PRISMATransform::~PRISMATransform() {
+  for (auto& row : plans_)
+    for (auto& entry : row)
+      if (Plan* const plan = entry.load()) {
+        plan->~Plan();
+        HB_FreePtr(plan);
+      }
+}
+
+const PRISMATransform::Plan& PRISMATransform::plan(Layout src, Layout dst) {
+  std::atomic<Plan*>& entry = plans_[static_cast<int>(src)][static_cast<int>(dst)];
+  if (const Plan* const made = entry.load(std::memory_order_acquire)) return *made;
+  const std::lock_guard hold(lock_);
+  if (const Plan* const made = entry.load(std::memory_order_acquire)) return *made;
+
+  Plan next;
+  if (legs.size() == 1 && !info(src).cmyk && !info(dst).cmyk) {
+    if (!shaper_tried_) prepare_shaper(context, legs[0], shaper_);
+    shaper_tried_ = true;
+    next.by_shaper = shaper_.ready();
+  }
+  if (next.by_shaper) {
+    shaper_.prepare_pair(src, dst);
+  } else {
+    Counted<cmsHPROFILE> profiles;
+    Counted<u32> intents;
+    for (const Leg& leg : legs) {
+      profiles.insert(profiles.end(), {leg.from.get()->handle.get(), leg.to.get()->handle.get()});
+      intents.insert(intents.end(), 2, static_cast<u32>(leg.intent));
+    }
+    const u32 count = static_cast<u32>(profiles.size());
+    Counted<cmsBool> compensation(count, FALSE);
+    Counted<f64> adaptation(count, 1.0);
+    const bool clip_src = legs.front().clip, clip_dst = legs.back().clip;
+    // Tables hold 0..1 only, so floats that may leave that range are never sent through them.
+    const bool bounded = (src != Layout::rgb_float || clip_src) && (dst != Layout::rgb_float || clip_dst);
+    const bool as_float = level == 0 || !bounded;
+    u32 flags = cmsFLAGS_NOCACHE;
+    if (as_float)
+      flags |= cmsFLAGS_NOOPTIMIZE;
+    else if (level < 100)
+      flags |= cmsFLAGS_HIGHRESPRECALC;
+    next.lcms.reset(cmsCreateExtendedTransform(
+        context.raw(), count, profiles.data(), compensation.data(), intents.data(), adaptation.data(), nullptr, 0,
+        lcms_format(src, as_float, clip_src), lcms_format(dst, as_float, clip_dst), flags));
+    obtained(next.lcms.get());
+  }
+  void* const place = HB_AllocatePtr(sizeof(Plan), EngineLabel::text, ZR_ModuleCode | ZR_Site_ColourEngine);
+  if (place == nullptr) throw i32{ZR_Err_OutOfMemory};
+  Plan* const made = new (place) Plan(std::move(next));
+  entry.store(made, std::memory_order_release);
+  return *made;
+}
+
+void PRISMATransform::apply(u32 src_layout, const void* src, u32 dst_layout, void* dst, size_t count,
+                            PRISMA_IterateFunc iterate) {
+  const Layout from = layout_of(src_layout), to = layout_of(dst_layout);
+  check_end(from, legs.front().from.get()->space);
+  check_end(to, legs.back().to.get()->space);
+  const Plan& way = plan(from, to);
+  const u8* const in = static_cast<const u8*>(src);
+  u8* const out = static_cast<u8*>(dst);
+  const i32 error = in_bands(count, iterate, [&](size_t begin, size_t length) {
+    const u8* const band_in = in + begin * info(from).pixel_bytes;
+    u8* const band_out = out + begin * info(to).pixel_bytes;
+    if (way.by_shaper) {
+      shaper_.run(from, legs[0].clip, band_in, to, legs[0].clip, band_out, length);
+    } else {
+      for (size_t done = 0; done < length; done += 1u << 24)  // lcms counts pixels in 32 bits
+        cmsDoTransform(way.lcms.get(), band_in + done * info(from).pixel_bytes, band_out + done * info(to).pixel_bytes,
+                       static_cast<u32>(std::min<size_t>(length - done, 1u << 24)));
+    }
+  });
+  if (error != 0) throw error;
+}
