@@ -5,7 +5,12 @@
 
 namespace zr::prisma {
 
-f32 FormulaCurve::exact(f32 x) const { return cmsEvalToneCurveFloat(curve_, x); }
+// lcms knows no numbers beyond 1e22: it gives its lowest for them, and for NaN.
+f32 FormulaCurve::exact(f32 x) const {
+  constexpr f32 largest = 1e20f;
+  const auto bounded = [](f32 v) { return v < -largest ? -largest : v > largest ? largest : v; };
+  return x == x ? bounded(cmsEvalToneCurveFloat(curve_, bounded(x))) : x;
+}
 
 // Through the curve at both ends and the middle of a piece; checked half way between.
 bool FormulaCurve::fit(i32 piece, f32 sign) {

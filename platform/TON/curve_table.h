@@ -19,7 +19,8 @@ template <class T>
 using CurveVector = std::vector<T, HB_Allocator<T, CurveLabel>>;
 
 // A curve given by a formula. Pieces of 1/64 of an octave hold a parabola each: near zero, where the
-// inverse of a gamma is steep, they are as fine as the numbers themselves.
+// inverse of a gamma is steep, they are as fine as the numbers themselves. Magnitudes above 1e20 count as
+// 1e20; NaN stays NaN.
 class FormulaCurve {
  public:
   // False when the curve is not smooth enough for the pieces: then it is not to be used.
