@@ -12,20 +12,22 @@ f32 FormulaCurve::exact(f32 x) const {
   return x == x ? bounded(cmsEvalToneCurveFloat(curve_, bounded(x))) : x;
 }
 
-// Through the curve at both ends and the middle of a piece; checked half way between.
-bool FormulaCurve::fit(i32 piece, f32 sign) {
+// Through the curve at both ends and the middle of a piece; false when it misses the curve in between.
+// *y0 is the curve at the near end, and then at the far one.
+bool FormulaCurve::fit(i32 piece, f32 sign, f64* at_near) {
   const auto edge = [](i32 at) { return std::bit_cast<f32>(static_cast<u32>(at + first_piece) << mantissa_shift); };
   const bool first = piece == 0;
   const f32 near = first ? 0.0f : edge(piece), far = edge(piece + 1);
   const f32 x0 = sign * near, x2 = sign * far, x1 = 0.5f * (x0 + x2);
-  const f64 y0 = exact(x0), y1 = exact(x1), y2 = exact(x2);
+  const f64 y0 = *at_near, y1 = exact(x1), y2 = exact(x2);
+  *at_near = y2;
   const f64 half = (static_cast<f64>(x2) - x0) * 0.5;
   // Newton's form about x0, x1, then powers of x. The first piece is a chord: a parabola would bend back.
   const f64 slope = first ? (y2 - y0) / (2 * half) : (y1 - y0) / half;
   const f64 bend = first ? 0.0 : ((y2 - y1) / half - slope) / (2 * half);
   Parabola& p = parabolas_[static_cast<size_t>(piece + (sign < 0 ? pieces : 0))];
   p = {static_cast<f32>(y0 - slope * x0 + bend * x0 * x1), static_cast<f32>(slope - bend * (static_cast<f64>(x0) + x1)),
-       static_cast<f32>(bend), 0.0f};
+       static_cast<f32>(bend), 0};
   for (const f32 part : {0.25f, 0.75f}) {
     const f32 x = x0 + part * (x2 - x0);
     const f64 is = p.a + x * (p.b + x * p.c), should = exact(x);
@@ -39,9 +41,16 @@ bool FormulaCurve::fit(i32 piece, f32 sign) {
 bool FormulaCurve::build(const cmsToneCurve* curve) {
   curve_ = curve;
   parabolas_.resize(2 * static_cast<size_t>(pieces));
-  for (const f32 sign : {1.0f, -1.0f})
-    for (i32 piece = 0; piece < pieces; ++piece)
-      if (!fit(piece, sign)) return false;
+  // A formula's numbers are rounded in a profile, so its parts may meet with a step of some millionths.
+  int left_to_formula = 8;
+  for (const f32 sign : {1.0f, -1.0f}) {
+    f64 y = exact(0.0f);
+    for (i32 piece = 0; piece < pieces; ++piece) {
+      if (fit(piece, sign, &y)) continue;
+      if (left_to_formula-- == 0) return false;
+      parabolas_[static_cast<size_t>(piece + (sign < 0 ? pieces : 0))].by_formula = 1;
+    }
+  }
   return true;
 }
 

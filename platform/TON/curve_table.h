@@ -18,12 +18,12 @@ struct CurveLabel {
 template <class T>
 using CurveVector = std::vector<T, HB_Allocator<T, CurveLabel>>;
 
-// A curve given by a formula. Pieces of 1/64 of an octave hold a parabola each: near zero, where the
-// inverse of a gamma is steep, they are as fine as the numbers themselves. Magnitudes above 1e20 count as
-// 1e20; NaN stays NaN.
+// A curve given by a formula, which is one or two smooth parts. Pieces of 1/64 of an octave hold a parabola each: near
+// zero, where the inverse of a gamma is steep, they are as fine as the numbers themselves. Magnitudes above 1e20 count
+// as 1e20; NaN stays NaN.
 class FormulaCurve {
  public:
-  // False when the curve is not smooth enough for the pieces: then it is not to be used.
+  // False when the curve is smooth in too few pieces: then it is not to be used.
   bool build(const cmsToneCurve* curve);
   f32 operator()(f32 x) const {
     const u32 bits = std::bit_cast<u32>(x);
@@ -31,19 +31,20 @@ class FormulaCurve {
     piece = piece < 0 ? 0 : piece;
     if (piece >= pieces) return exact(x);
     const Parabola& p = parabolas_[static_cast<size_t>(piece + static_cast<i32>(bits >> 31) * pieces)];
-    return p.a + x * (p.b + x * p.c);
+    return p.by_formula ? exact(x) : p.a + x * (p.b + x * p.c);
   }
   // The same for arguments of 0..1.
   f32 in_unit(f32 x) const {
     i32 piece = static_cast<i32>(std::bit_cast<u32>(x) >> mantissa_shift) - first_piece;
     piece = piece < 0 ? 0 : piece;
     const Parabola& p = parabolas_[static_cast<size_t>(piece)];
-    return p.a + x * (p.b + x * p.c);
+    return p.by_formula ? exact(x) : p.a + x * (p.b + x * p.c);
   }
 
  private:
   struct Parabola {
-    f32 a, b, c, unused;
+    f32 a, b, c;
+    u32 by_formula;  // the curve has a corner or a step here
   };
   static constexpr int mantissa_bits = 6, mantissa_shift = 23 - mantissa_bits;
   static constexpr int lowest_exponent = -40, beyond_exponent = 10;
@@ -52,7 +53,7 @@ class FormulaCurve {
   static constexpr i32 pieces = ((beyond_exponent - lowest_exponent) << mantissa_bits) + 1;
 
   f32 exact(f32 x) const;
-  bool fit(i32 piece, f32 sign);
+  bool fit(i32 piece, f32 sign, f64* y0);
 
   const cmsToneCurve* curve_ = nullptr;
   CurveVector<Parabola> parabolas_;

@@ -1,7 +1,9 @@
 // The engine's lcms context: memory through HB, formatters of worlds, errors to the log.
 #include <JRN/jrn.h>
 
+#include <cstdlib>
 #include <cstring>
+#include <new>
 #include <utility>
 
 #include "TON/lcms_engine.h"
@@ -25,23 +27,33 @@ Current& current() {
 // A damaged profile may ask for any size; nothing that a good one needs is larger.
 constexpr u32 largest_block = 256u << 20;
 
-// The size stands before each block, for resizing.
+// Stands before each block: its size, for resizing, and where it came from.
 struct alignas(16) Head {
   u32 bytes;
+  bool counted;
 };
 
+// lcms does not survive every refusal of memory. So what HB refuses comes from the C library, lcms goes on,
+// and the call that it works for fails afterwards and throws its result away.
 void* allocate(cmsContext, u32 bytes) {
   if (bytes > largest_block) return nullptr;
-  auto* const head = static_cast<Head*>(HB_AllocatePtrQuiet(sizeof(Head) + bytes));
-  if (head == nullptr) {
+  const size_t all = sizeof(Head) + bytes;
+  void* place = HB_AllocatePtrQuiet(all);
+  const bool counted = place != nullptr;
+  if (!counted) {
     memory_failed = true;
-    return nullptr;
+    place = std::malloc(all);
+    if (place == nullptr) return nullptr;
   }
-  head->bytes = bytes;
-  return head + 1;
+  return new (place) Head{bytes, counted} + 1;
 }
 void give_back(cmsContext, void* block) {
-  if (block != nullptr) HB_FreePtr(static_cast<Head*>(block) - 1);
+  if (block == nullptr) return;
+  Head* const head = static_cast<Head*>(block) - 1;
+  if (head->counted)
+    HB_FreePtr(head);
+  else
+    std::free(head);
 }
 void* resize(cmsContext id, void* block, u32 bytes) {
   void* const moved = allocate(id, bytes);
@@ -52,9 +64,30 @@ void* resize(cmsContext id, void* block, u32 bytes) {
   return moved;
 }
 
+// lcms's own mutexes are not made of its memory as ours are.
+void* create_mutex(cmsContext id) {
+  void* const place = allocate(id, sizeof(std::mutex));
+  return place != nullptr ? new (place) std::mutex : nullptr;
+}
+void destroy_mutex(cmsContext id, void* mutex) {
+  if (mutex == nullptr) return;
+  static_cast<std::mutex*>(mutex)->~mutex();
+  give_back(id, mutex);
+}
+cmsBool lock_mutex(cmsContext, void* mutex) {
+  if (mutex == nullptr) return FALSE;
+  static_cast<std::mutex*>(mutex)->lock();
+  return TRUE;
+}
+void unlock_mutex(cmsContext, void* mutex) {
+  if (mutex != nullptr) static_cast<std::mutex*>(mutex)->unlock();
+}
+
 void log_error(cmsContext, cmsUInt32Number, const char* text) { JRN_Log(20, "TON", "lcms", text); }
 
-cmsPluginFormatters formatters_plugin = {{cmsPluginMagicNumber, 2060, cmsPluginFormattersSig, nullptr},
+cmsPluginMutex mutex_plugin = {
+    {cmsPluginMagicNumber, 2060, cmsPluginMutexSig, nullptr}, create_mutex, destroy_mutex, lock_mutex, unlock_mutex};
+cmsPluginFormatters formatters_plugin = {{cmsPluginMagicNumber, 2060, cmsPluginFormattersSig, &mutex_plugin.base},
                                          world_formatter};
 cmsPluginMemHandler memory_plugin = {{cmsPluginMagicNumber, 2060, cmsPluginMemHandlerSig, &formatters_plugin.base},
                                      allocate,
@@ -71,7 +104,10 @@ bool memory_has_failed() { return memory_failed; }
 
 Context::Context() : PRISMA_Object(destroy_object<Context>) {
   raw = cmsCreateContext(&memory_plugin, nullptr);
-  if (raw == nullptr) throw i32{ZR_Err_OutOfMemory};
+  if (raw == nullptr || memory_failed) {
+    if (raw != nullptr) cmsDeleteContext(raw);
+    throw i32{ZR_Err_OutOfMemory};
+  }
   cmsSetLogErrorHandlerTHR(raw, log_error);
 }
 Context::~Context() { cmsDeleteContext(raw); }

@@ -20,8 +20,8 @@ struct EngineLabel {
 template <class T>
 using Counted = std::vector<T, HB_Allocator<T, EngineLabel>>;
 
-// Runs the body of a procedure; what it throws becomes the status. Memory that lcms did not get, which it
-// tells only as a failure, is told as such.
+// Runs the body of a procedure; what it throws becomes the status. So does memory that lcms did not get:
+// what was made meanwhile is not to be used.
 void forget_memory_failure();
 bool memory_has_failed();
 template <class Body>
@@ -29,7 +29,7 @@ i32 with_status(Body&& body) noexcept {
   forget_memory_failure();
   try {
     body();
-    return 0;
+    return memory_has_failed() ? i32{ZR_Err_OutOfMemory} : 0;
   } catch (const i32 status) {
     return memory_has_failed() ? i32{ZR_Err_OutOfMemory} : status;
   } catch (const std::bad_alloc&) {

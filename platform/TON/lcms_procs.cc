@@ -50,7 +50,13 @@ PRISMATransform* with_level(const PRISMATransform& transform, u32 level) {
 
 template <class Object, class Body>
 i32 giving(Object** out, Body&& body) {
-  return with_status([&] { *out = body(); });
+  return with_status([&] {
+    Object* const made = body();
+    if (memory_has_failed())
+      TON_PRISMA_Release(made);
+    else
+      *out = made;
+  });
 }
 
 constexpr PRISMA_ProfileProcs profile_procs = {

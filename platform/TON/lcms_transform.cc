@@ -1,4 +1,7 @@
 // Transforms: legs between profiles, and the plan by which a pair of layouts is run.
+#include <algorithm>
+#include <cmath>
+
 #include "TON/lcms_engine.h"
 
 namespace zr::prisma {
@@ -14,6 +17,27 @@ void check_end(Layout layout, cmsColorSpaceSignature space) {
   if (space != (info(layout).cmyk ? cmsSigCmykData : cmsSigRgbData)) refuse(PRISMA_Err_ColourSpace);
 }
 
+// Rows X, Y, Z; columns red, green, blue.
+bool matrix_of(const PRISMAProfile& profile, f64 out[3][3]) {
+  for (int c = 0; c < 3; ++c) {
+    const auto* const colorant = static_cast<const cmsCIEXYZ*>(cmsReadTag(profile.handle.get(), colorant_tags[c]));
+    if (colorant == nullptr) return false;
+    out[0][c] = colorant->X;
+    out[1][c] = colorant->Y;
+    out[2][c] = colorant->Z;
+  }
+  return true;
+}
+
+bool invert(f64 m[3][3]) {
+  cmsMAT3 in, out;
+  for (int i = 0; i < 3; ++i) _cmsVEC3init(&in.v[i], m[i][0], m[i][1], m[i][2]);
+  if (!_cmsMAT3inverse(&in, &out)) return false;
+  for (int i = 0; i < 3; ++i)
+    for (int c = 0; c < 3; ++c) m[i][c] = out.v[i].n[c];
+  return true;
+}
+
 // The affine map between the linear light of two profiles, asked of lcms itself at black and the primaries.
 void affine_between(const ContextRef& context, const PRISMATransform::Leg& leg, f32 columns[3][3], f32 offset[3]) {
   const TON_PRISMA_Ref<PRISMAProfile> from(linear_profile(*leg.from.get())), to(linear_profile(*leg.to.get()));
@@ -27,6 +51,18 @@ void affine_between(const ContextRef& context, const PRISMATransform::Leg& leg, 
     offset[i] = results[0][i];
     for (int c = 0; c < 3; ++c) columns[c][i] = results[c + 1][i] - results[0][i];
   }
+
+  // Where that is nothing but the product of both matrices, the product is taken at double precision.
+  f64 forth[3][3], back[3][3];
+  if (!matrix_of(*from.get(), forth) || !matrix_of(*to.get(), back) || !invert(back)) return;
+  f64 product[3][3];
+  for (int i = 0; i < 3; ++i)
+    for (int c = 0; c < 3; ++c) {
+      product[i][c] = back[i][0] * forth[0][c] + back[i][1] * forth[1][c] + back[i][2] * forth[2][c];
+      if (!(std::fabs(product[i][c] - columns[c][i]) < 3e-6) || offset[i] != 0.0f) return;
+    }
+  for (int i = 0; i < 3; ++i)
+    for (int c = 0; c < 3; ++c) columns[c][i] = static_cast<f32>(product[i][c]);
 }
 
 // False: this leg is not made of curves and a matrix that can be run here.
@@ -102,8 +138,11 @@ const PRISMATransform::Plan& PRISMATransform::plan(Layout src, Layout dst) {
 
   Plan next;
   if (legs.size() == 1 && !info(src).cmyk && !info(dst).cmyk) {
-    if (!shaper_tried_) prepare_shaper(context, legs[0], shaper_);
-    shaper_tried_ = true;
+    if (!shaper_tried_) {
+      prepare_shaper(context, legs[0], shaper_);
+      if (memory_has_failed()) throw i32{ZR_Err_OutOfMemory};
+      shaper_tried_ = true;
+    }
     next.by_shaper = shaper_.ready();
   }
   if (next.by_shaper) {
@@ -132,6 +171,7 @@ const PRISMATransform::Plan& PRISMATransform::plan(Layout src, Layout dst) {
         lcms_format(src, as_float, clip_src), lcms_format(dst, as_float, clip_dst), flags));
     obtained(next.lcms.get());
   }
+  if (memory_has_failed()) throw i32{ZR_Err_OutOfMemory};
   void* const place = HB_AllocatePtr(sizeof(Plan), EngineLabel::text, ZR_ModuleCode | ZR_Site_ColourEngine);
   if (place == nullptr) throw i32{ZR_Err_OutOfMemory};
   Plan* const made = new (place) Plan(std::move(next));

@@ -6,32 +6,29 @@ namespace {
 class HostileProfiles : public ColourLibrary {};
 
 // Everything that can be asked of a profile; whatever it throws is fine.
-void use(const TON_PRISMA_Profile& one) {
+void use(const TON_PRISMA_Profile& one, const TON_PRISMA_Profile& other, bool forth, i32 intent) {
   const auto shared = boost::make_shared<TON_PRISMA_Profile>(one);
   thrown_by([&] { TON_PRISMA_Profile_GetName(one); });
   thrown_by([&] { TON_PRISMA_Profile_IsOverRange(one); });
   thrown_by([&] { TON_PRISMA_GetCalRGB(one); });
   thrown_by([&] { TON_PRISMA_GetLinearRGBProfile(shared); });
-  const TON_PRISMA_Profile other(PRISMA_Profile_DisplayP3);
   const bool ink = one.GetColourSpace() == PRISMA_Word("CMYK");
-  for (const bool forth : {true, false})
-    for (const i32 intent : {1, 3}) {
-      ZR_WorldX<ZR_Pixel8> world(3, 1, ZR_WorldFlag_Clear);
-      ZR_WorldX<ZR_PixelFloat> floats(3, 1, ZR_WorldFlag_Clear);
-      const i32 code = thrown_by([&] {
-        const TON_PRISMA_Transform transform(forth ? one : other, forth ? other : one, intent,
-                                             TON_GetDefaultPRISMAOptions());
-        if (ink && forth)
-          ZR_PRISMAApplyTransformSrcCMYK(transform.Get(), &world, &floats, false, nullptr);
-        else
-          ZR_PRISMAApplyTransform(transform.Get(), &world, &floats, false, nullptr);
-      });
-      EXPECT_TRUE(code == 0 || floats.At(1, 0)->red == 0.0f) << "a refused call writes nothing";
-    }
+  ZR_WorldX<ZR_Pixel8> world(3, 1, ZR_WorldFlag_Clear);
+  ZR_WorldX<ZR_PixelFloat> floats(3, 1, ZR_WorldFlag_Clear);
+  const i32 code = thrown_by([&] {
+    const TON_PRISMA_Transform transform(forth ? one : other, forth ? other : one, intent,
+                                         TON_GetDefaultPRISMAOptions());
+    if (ink && forth)
+      ZR_PRISMAApplyTransformSrcCMYK(transform.Get(), &world, &floats, false, nullptr);
+    else
+      ZR_PRISMAApplyTransform(transform.Get(), &world, &floats, false, nullptr);
+  });
+  EXPECT_TRUE(code == 0 || floats.At(1, 0)->red == 0.0f) << "a refused call writes nothing";
 }
 
 TEST_F(HostileProfiles, FlippedAndCut) {
   std::mt19937 random(20);
+  const TON_PRISMA_Profile other(PRISMA_Profile_DisplayP3);
   int opened = 0;
   for (const char* const name : {"sRGB-v4", "sRGB-v2-magic", "scRGB-v2", "sGrey-v4", "CGATS001Compat-v2-micro"}) {
     const std::vector<u8> whole = profile_bytes(name);
@@ -49,7 +46,7 @@ TEST_F(HostileProfiles, FlippedAndCut) {
       TON_PRISMA_Profile one;
       if (thrown_by([&] { one = TON_PRISMA_Profile(bytes.data(), bytes.size()); }) != 0) continue;
       ++opened;
-      use(one);
+      use(one, other, i % 2 == 0, i % 3 == 0 ? 3 : 1);
     }
   }
   EXPECT_GT(opened, 500) << "most damage lies behind the header";
