@@ -6,6 +6,7 @@
 #include <lcms2.h>
 #include <lcms2_plugin.h>
 
+#include <deque>
 #include <mutex>
 #include <vector>
 
@@ -154,11 +155,14 @@ struct PRISMATransform : PRISMA_Object {
 
  private:
   struct Plan;
+  void prepare_shapers();
+  void run_shapers(zr::prisma::Layout src, const u8* from, zr::prisma::Layout dst, u8* to, size_t count) const;
   const Plan& plan(zr::prisma::Layout src, zr::prisma::Layout dst);
 
   // Made on first use under the lock, then only read.
   std::mutex lock_;
   std::atomic<Plan*> plans_[zr::prisma::layout_count][zr::prisma::layout_count] = {};
-  zr::prisma::MatrixShaper shaper_;
-  bool shaper_tried_ = false;
+  // One for each leg, or none when a leg is more than curves and a matrix.
+  std::deque<zr::prisma::MatrixShaper, HB_Allocator<zr::prisma::MatrixShaper, zr::prisma::EngineLabel>> shapers_;
+  bool shapers_tried_ = false;
 };

@@ -114,7 +114,7 @@ i32 in_bands(size_t count, PRISMA_IterateFunc iterate, const Run& run) {
 using namespace zr::prisma;
 
 struct PRISMATransform::Plan {
-  bool by_shaper = false;
+  bool by_shapers = false;
   TransformPtr lcms;
 };
 
@@ -130,6 +130,33 @@ PRISMATransform::~PRISMATransform() {
       }
 }
 
+void PRISMATransform::prepare_shapers() {
+  if (shapers_tried_) return;
+  decltype(shapers_) made;
+  for (const Leg& leg : legs)
+    if (!prepare_shaper(context, leg, made.emplace_back())) {
+      made.clear();
+      break;
+    }
+  if (memory_has_failed()) throw i32{ZR_Err_OutOfMemory};
+  shapers_.swap(made);
+  shapers_tried_ = true;
+}
+
+// Between two legs colours are floats of any size.
+void PRISMATransform::run_shapers(Layout src, const u8* from, Layout dst, u8* to, size_t count) const {
+  const bool clip_src = legs.front().clip, clip_dst = legs.back().clip;
+  if (shapers_.size() == 1) return shapers_[0].run(src, clip_src, from, dst, clip_dst, to, count);
+  ZR_PixelFloat between[512];
+  for (size_t done = 0; done < count; done += std::size(between)) {
+    const size_t block = std::min(count - done, std::size(between));
+    shapers_.front().run(src, clip_src, from + done * info(src).pixel_bytes, Layout::rgb_float, false, between, block);
+    for (size_t i = 1; i + 1 < shapers_.size(); ++i)
+      shapers_[i].run(Layout::rgb_float, false, between, Layout::rgb_float, false, between, block);
+    shapers_.back().run(Layout::rgb_float, false, between, dst, clip_dst, to + done * info(dst).pixel_bytes, block);
+  }
+}
+
 const PRISMATransform::Plan& PRISMATransform::plan(Layout src, Layout dst) {
   std::atomic<Plan*>& entry = plans_[static_cast<int>(src)][static_cast<int>(dst)];
   if (const Plan* const made = entry.load(std::memory_order_acquire)) return *made;
@@ -137,16 +164,11 @@ const PRISMATransform::Plan& PRISMATransform::plan(Layout src, Layout dst) {
   if (const Plan* const made = entry.load(std::memory_order_acquire)) return *made;
 
   Plan next;
-  if (legs.size() == 1 && !info(src).cmyk && !info(dst).cmyk) {
-    if (!shaper_tried_) {
-      prepare_shaper(context, legs[0], shaper_);
-      if (memory_has_failed()) throw i32{ZR_Err_OutOfMemory};
-      shaper_tried_ = true;
-    }
-    next.by_shaper = shaper_.ready();
-  }
-  if (next.by_shaper) {
-    shaper_.prepare_pair(src, dst);
+  if (!info(src).cmyk && !info(dst).cmyk) prepare_shapers();
+  if (!info(src).cmyk && !info(dst).cmyk && !shapers_.empty()) {
+    next.by_shapers = true;
+    shapers_.front().prepare_pair(src, Layout::rgb_float);
+    shapers_.back().prepare_pair(Layout::rgb_float, dst);
   } else {
     Counted<cmsHPROFILE> profiles;
     Counted<u32> intents;
@@ -190,8 +212,8 @@ void PRISMATransform::apply(u32 src_layout, const void* src, u32 dst_layout, voi
   const i32 error = in_bands(count, iterate, [&](size_t begin, size_t length) {
     const u8* const band_in = in + begin * info(from).pixel_bytes;
     u8* const band_out = out + begin * info(to).pixel_bytes;
-    if (way.by_shaper) {
-      shaper_.run(from, legs[0].clip, band_in, to, legs[0].clip, band_out, length);
+    if (way.by_shapers) {
+      run_shapers(from, band_in, to, band_out, length);
     } else {
       for (size_t done = 0; done < length; done += 1u << 24)  // lcms counts pixels in 32 bits
         cmsDoTransform(way.lcms.get(), band_in + done * info(from).pixel_bytes, band_out + done * info(to).pixel_bytes,

@@ -3,7 +3,6 @@
 
 #include <algorithm>
 #include <cstring>
-#include <utility>
 
 namespace zr::prisma {
 namespace {
@@ -49,16 +48,13 @@ bool CurveSet::prepare(const cmsToneCurve* const curves[3]) {
   return true;
 }
 
-MatrixShaper::~MatrixShaper() { free_curves(); }
-
-void MatrixShaper::free_curves() {
-  for (cmsToneCurve*& curve : inverse_curves_)
-    if (curve != nullptr) cmsFreeToneCurve(std::exchange(curve, nullptr));
+MatrixShaper::~MatrixShaper() {
+  for (cmsToneCurve* const curve : inverse_curves_)
+    if (curve != nullptr) cmsFreeToneCurve(curve);
 }
 
 bool MatrixShaper::prepare(const cmsToneCurve* const forward[3], cmsToneCurve* const inverse[3],
                            const f32 columns[3][3], const f32 offset[3]) {
-  free_curves();  // of a try that ran out of memory
   std::copy(inverse, inverse + 3, inverse_curves_);
   for (int i = 0; i < 3; ++i) {
     offset_[i] = offset[i];

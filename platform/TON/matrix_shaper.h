@@ -51,7 +51,6 @@ class MatrixShaper {
   typedef f32 Vector __attribute__((vector_size(16)));  // red, green, blue, nothing
   struct Kernels;
 
-  void free_curves();
   void prepare_source8();
   void prepare_source16();
   void prepare_result8();
