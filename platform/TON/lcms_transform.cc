@@ -167,8 +167,12 @@ const PRISMATransform::Plan& PRISMATransform::plan(Layout src, Layout dst) {
   if (!info(src).cmyk && !info(dst).cmyk) prepare_shapers();
   if (!info(src).cmyk && !info(dst).cmyk && !shapers_.empty()) {
     next.by_shapers = true;
-    shapers_.front().prepare_pair(src, Layout::rgb_float);
-    shapers_.back().prepare_pair(Layout::rgb_float, dst);
+    if (shapers_.size() == 1) {
+      shapers_[0].prepare_pair(src, dst);
+    } else {
+      shapers_.front().prepare_pair(src, Layout::rgb_float);
+      shapers_.back().prepare_pair(Layout::rgb_float, dst);
+    }
   } else {
     Counted<cmsHPROFILE> profiles;
     Counted<u32> intents;

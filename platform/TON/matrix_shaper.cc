@@ -2,6 +2,7 @@
 #include "TON/matrix_shaper.h"
 
 #include <algorithm>
+#include <cmath>
 #include <cstring>
 
 namespace zr::prisma {
@@ -60,6 +61,10 @@ bool MatrixShaper::prepare(const cmsToneCurve* const forward[3], cmsToneCurve* c
     offset_[i] = offset[i];
     for (int c = 0; c < 3; ++c) columns_[c][i] = columns[c][i];
   }
+  same_light_ = true;
+  for (int i = 0; i < 3; ++i)
+    for (int c = 0; c < 3; ++c)
+      same_light_ = same_light_ && std::fabs(columns[c][i] - (i == c ? 1.0f : 0.0f)) < 2e-6f && offset[i] == 0.0f;
   ready_ = forward_.prepare(forward) && inverse_.prepare(inverse);
   return ready_;
 }
@@ -104,7 +109,37 @@ void MatrixShaper::prepare_result8() {
   }
 }
 
+// Where linear light is the same on both sides, a code decides its result alone.
+template <class From, class To>
+void MatrixShaper::prepare_codes() {
+  for (int c = 0; c < 3; ++c) {
+    CurveVector<u8>& table = codes_[sizeof(From) - 1][sizeof(To) - 1][c];
+    if (code_table(c) != c || !table.empty()) continue;
+    constexpr u32 white = static_cast<u32>(white_code<From>);
+    CurveVector<u8> bytes((white + 1) * sizeof(To));
+    for (u32 v = 0; v <= white; ++v) {
+      const To code = from_unit<To>(inverse_(c, forward_(c, unit(static_cast<From>(v)))));
+      std::memcpy(bytes.data() + v * sizeof(To), &code, sizeof code);
+    }
+    table.swap(bytes);
+  }
+}
+
+int MatrixShaper::code_table(int channel) const {
+  for (int c = 0; c < channel; ++c)
+    if (forward_.distinct(c) == forward_.distinct(channel) && inverse_.distinct(c) == inverse_.distinct(channel))
+      return c;
+  return channel;
+}
+
 void MatrixShaper::prepare_pair(Layout src, Layout dst) {
+  if (same_light_ && src != Layout::rgb_float && dst != Layout::rgb_float) {
+    if (src == Layout::rgb8)
+      dst == Layout::rgb8 ? prepare_codes<u8, u8>() : prepare_codes<u8, u16>();
+    else
+      dst == Layout::rgb8 ? prepare_codes<u16, u8>() : prepare_codes<u16, u16>();
+    return;
+  }
   if (src == Layout::rgb8) prepare_source8();
   if (src == Layout::rgb16) prepare_source16();
   if (dst == Layout::rgb8) prepare_result8();
@@ -185,10 +220,13 @@ struct MatrixShaper::Kernels {
     const Curve &red, &green, &blue;
     Integers(const Curve& r, const Curve& g, const Curve& b) : red(r), green(g), blue(b) {}
     void operator()(Vector v, Pixel& p) const {
+      typedef i32 Codes __attribute__((vector_size(16)));
       v = within(v, 0.0f);
-      p.red = from_unit<Channel<P>>(red.in_unit(v[0]));
-      p.green = from_unit<Channel<P>>(green.in_unit(v[1]));
-      p.blue = from_unit<Channel<P>>(blue.in_unit(v[2]));
+      const Vector unit = within(Vector{red.in_unit(v[0]), green.in_unit(v[1]), blue.in_unit(v[2]), 0.0f}, 0.0f);
+      const Codes codes = __builtin_convertvector(unit * all(white_code<Channel<P>>) + all(0.5f), Codes);
+      p.red = static_cast<Channel<P>>(codes[0]);
+      p.green = static_cast<Channel<P>>(codes[1]);
+      p.blue = static_cast<Channel<P>>(codes[2]);
     }
   };
   template <class Curve, bool clip>
@@ -212,6 +250,28 @@ struct MatrixShaper::Kernels {
     for (size_t i = 0; i < count; ++i) result(source(src[i]), dst[i]);
   }
 
+  template <class From, class To>
+  static void codes(const MatrixShaper& s, const void* from, void* to, size_t count) {
+    const auto* src = static_cast<const From*>(from);
+    auto* dst = static_cast<To*>(to);
+    using In = Channel<From>;
+    using Out = Channel<To>;
+    const auto table = [&](int c) {
+      return reinterpret_cast<const Out*>(s.codes_[sizeof(In) - 1][sizeof(Out) - 1][s.code_table(c)].data());
+    };
+    const Out* const red = table(0);
+    const Out* const green = table(1);
+    const Out* const blue = table(2);
+    constexpr In white = static_cast<In>(Depth<From>::white);
+    const auto legal = [](In v) { return v < white ? v : white; };
+    for (size_t i = 0; i < count; ++i) {
+      const From p = src[i];
+      dst[i].red = red[legal(p.red)];
+      dst[i].green = green[legal(p.green)];
+      dst[i].blue = blue[legal(p.blue)];
+    }
+  }
+
   template <class Body>
   static void with_curves(const CurveSet& set, Body&& body) {
     if (set.sampled())
@@ -224,6 +284,13 @@ struct MatrixShaper::Kernels {
 void MatrixShaper::run(Layout src, bool clip_src, const void* from, Layout dst, bool clip_dst, void* to,
                        size_t count) const {
   using K = Kernels;
+  if (same_light_ && src != Layout::rgb_float && dst != Layout::rgb_float) {
+    const auto run_codes = src == Layout::rgb8
+                               ? dst == Layout::rgb8 ? K::codes<ZR_Pixel8, ZR_Pixel8> : K::codes<ZR_Pixel8, ZR_Pixel16>
+                           : dst == Layout::rgb8 ? K::codes<ZR_Pixel16, ZR_Pixel8>
+                                                 : K::codes<ZR_Pixel16, ZR_Pixel16>;
+    return run_codes(*this, from, to, count);
+  }
   const auto to_result = [&](const auto& source) {
     if (dst == Layout::rgb8 && bytes_are_fine_) return K::loop(source, K::Bytes(*this), from, to, count);
     K::with_curves(inverse_, [&]<class Curve>(const Curve& r, const Curve& g, const Curve& b) {

@@ -51,6 +51,9 @@ class MatrixShaper {
   typedef f32 Vector __attribute__((vector_size(16)));  // red, green, blue, nothing
   struct Kernels;
 
+  template <class From, class To>
+  void prepare_codes();
+  int code_table(int channel) const;  // the first channel with the same curves
   void prepare_source8();
   void prepare_source16();
   void prepare_result8();
@@ -62,6 +65,8 @@ class MatrixShaper {
   CurveVector<Vector> products8_[3];  // curve and column of each byte; the offset is in the first
   CurveVector<f32> linear16_[3];      // curve of each 16-bit value
   CurveVector<u8> bytes_[3];          // finished byte by the top bits of the linear float
+  CurveVector<u8> codes_[2][2][3];    // results of integer codes, by bytes of both sides less one
+  bool same_light_ = false;           // the map is the identity
   bool bytes_are_fine_ = false;       // no step of bytes_ skips a code
 };
 

@@ -30,13 +30,15 @@ constexpr f32 clamp_unit(f32 v) {
   v = v > 0.0f ? v : 0.0f;
   return v < 1.0f ? v : 1.0f;
 }
+template <class Channel>
+inline constexpr f32 white_code = sizeof(Channel) == 1 ? 255.0f : 32768.0f;
 // Back, rounded to nearest; the argument is clamped.
 template <class Channel>
 constexpr Channel from_unit(f32 v) {
   if constexpr (std::is_same_v<Channel, f32>)
     return v;
   else
-    return static_cast<Channel>(static_cast<i32>(clamp_unit(v) * (sizeof(Channel) == 1 ? 255.0f : 32768.0f) + 0.5f));
+    return static_cast<Channel>(static_cast<i32>(clamp_unit(v) * white_code<Channel> + 0.5f));
 }
 
 }  // namespace zr::prisma
