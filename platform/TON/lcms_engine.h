@@ -134,7 +134,8 @@ struct PRISMAProfile : PRISMA_Object {
   zr::prisma::Counted<u8> data;
   zr::prisma::ProfilePtr handle;
   _t_PRISMA_ID id;
-  cmsColorSpaceSignature space;
+  // Four-character words of the header. A damaged one may hold anything, so they are no enumerators.
+  u32 kind, space, connection_space;
 };
 
 struct PRISMATransform : PRISMA_Object {

@@ -19,7 +19,7 @@ u32 option(const PRISMA_Options* options, u32 tag, u32 otherwise) {
   return otherwise;
 }
 
-bool is_device(cmsColorSpaceSignature space) { return space == cmsSigRgbData || space == cmsSigCmykData; }
+bool is_device(u32 space) { return space == cmsSigRgbData || space == cmsSigCmykData; }
 
 PRISMATransform* create(PRISMAProfile& from, PRISMAProfile& to, i32 intent, const PRISMA_Options* options) {
   if (intent < PRISMA_Intent_Perceptual || intent > PRISMA_Intent_AbsoluteColorimetric) refuse(PRISMA_Err_BadParam);
@@ -86,7 +86,7 @@ constexpr PRISMA_ProfileProcs profile_procs = {
       return 0;
     },
     .colour_space = [](PRISMAProfile* profile, u32* out) -> i32 {
-      *out = static_cast<u32>(profile->space);
+      *out = profile->space;
       return 0;
     },
     .name = [](PRISMAProfile* profile, char16_t* text, size_t limit, size_t* length) -> i32 {

@@ -21,6 +21,11 @@ _t_PRISMA_ID digest(const ContextRef& context, const Counted<u8>& data) {
   return id;
 }
 
+u32 word_at(const Counted<u8>& data, size_t at) {
+  return static_cast<u32>(data[at]) << 24 | static_cast<u32>(data[at + 1]) << 16 | static_cast<u32>(data[at + 2]) << 8 |
+         data[at + 3];
+}
+
 // Whether a profile has one of the tables that take the place of matrix and curves, or of unbounded floats.
 bool has_any(cmsHPROFILE profile, std::initializer_list<cmsTagSignature> tags) {
   for (const cmsTagSignature tag : tags)
@@ -77,14 +82,15 @@ PRISMAProfile::PRISMAProfile(const ContextRef& from, Counted<u8> bytes)
     : PRISMA_Object(destroy_object<PRISMAProfile>), context(from), data(std::move(bytes)), id(digest(context, data)) {
   handle.reset(cmsOpenProfileFromMemTHR(context.raw(), data.data(), static_cast<u32>(data.size())));
   obtained(handle.get());
-  space = cmsGetColorSpace(handle.get());
+  kind = word_at(data, 12);
+  space = word_at(data, 16);
+  connection_space = word_at(data, 20);
   // Links and named colours describe no device.
-  const cmsProfileClassSignature kind = cmsGetDeviceClass(handle.get());
   if (kind == cmsSigLinkClass || kind == cmsSigNamedColorClass) refuse(PRISMA_Err_BadProfile);
 }
 
 bool PRISMAProfile::is_plain_matrix_shaper() const {
-  return space == cmsSigRgbData && cmsGetPCS(handle.get()) == cmsSigXYZData && cmsIsMatrixShaper(handle.get()) &&
+  return space == cmsSigRgbData && connection_space == cmsSigXYZData && cmsIsMatrixShaper(handle.get()) &&
          !has_any(handle.get(), {cmsSigAToB0Tag, cmsSigAToB1Tag, cmsSigAToB2Tag, cmsSigBToA0Tag, cmsSigBToA1Tag,
                                  cmsSigBToA2Tag, cmsSigDToB0Tag, cmsSigDToB1Tag, cmsSigDToB2Tag, cmsSigDToB3Tag,
                                  cmsSigBToD0Tag, cmsSigBToD1Tag, cmsSigBToD2Tag, cmsSigBToD3Tag});
@@ -113,8 +119,7 @@ bool is_over_range(const PRISMAProfile& profile) {
 
 PRISMAProfile* linear_profile(PRISMAProfile& profile) {
   if (profile.space != cmsSigRgbData) refuse(PRISMA_Err_ColourSpace);
-  if (!cmsIsMatrixShaper(profile.handle.get()) || cmsGetPCS(profile.handle.get()) != cmsSigXYZData)
-    refuse(PRISMA_Err_NoGamma);
+  if (!cmsIsMatrixShaper(profile.handle.get()) || profile.connection_space != cmsSigXYZData) refuse(PRISMA_Err_NoGamma);
   if (profile.is_linear() && profile.is_plain_matrix_shaper()) {
     TON_PRISMA_Retain(&profile);
     return &profile;

@@ -13,8 +13,8 @@ Layout layout_of(u32 code) {
   refuse(PRISMA_Err_BadParam);
 }
 
-void check_end(Layout layout, cmsColorSpaceSignature space) {
-  if (space != (info(layout).cmyk ? cmsSigCmykData : cmsSigRgbData)) refuse(PRISMA_Err_ColourSpace);
+void check_end(Layout layout, u32 space) {
+  if (space != static_cast<u32>(info(layout).cmyk ? cmsSigCmykData : cmsSigRgbData)) refuse(PRISMA_Err_ColourSpace);
 }
 
 // Rows X, Y, Z; columns red, green, blue.

@@ -94,7 +94,7 @@ To converted(const From& p, const ZR_LinearBlendingTables& t) {
   const auto colour = [&](auto c) -> f64 {
     const i32 v = static_cast<i32>(std::min<f64>(c, 1e6));
     if (from == to) return c;
-    if (from == 8 && to == 16) return (v * 0x808080 + 33200) >> 16;
+    if (from == 8 && to == 16) return (static_cast<u32>(v) * 0x808080u + 33200u) >> 16;
     if (from == 16 && to == 8) return (v * 255 + 16384) >> 15;
     if (from == 8) return t.to_linear[v] / 32768.0;
     if (from == 16) return forward(v) / 32768.0;
