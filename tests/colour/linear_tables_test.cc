@@ -92,7 +92,7 @@ To converted(const From& p, const ZR_LinearBlendingTables& t) {
   };
   constexpr int from = zr::Depth<From>::bits, to = zr::Depth<To>::bits;
   const auto colour = [&](auto c) -> f64 {
-    const i32 v = static_cast<i32>(std::min<f64>(c, 1e6));
+    const i32 v = from == 32 ? 0 : static_cast<i32>(c);
     if (from == to) return c;
     if (from == 8 && to == 16) return (static_cast<u32>(v) * 0x808080u + 33200u) >> 16;
     if (from == 16 && to == 8) return (v * 255 + 16384) >> 15;

@@ -2,13 +2,13 @@
 #include <ZR/transfer_mode.h>
 
 #include <bit>
+#include <cstring>
 #include <limits>
 #include <random>
 
-#include "composite/mode_model.h"
 #include "composite/random_pixels.h"
-#include "composite/soft_light_state.h"
 #include "support/born_library.h"
+#include "support/gamma_tables.h"
 
 namespace {
 
@@ -132,62 +132,12 @@ TEST_F(Modes, FloatPoints) {
   EXPECT_EQ(ramp.red, 0.5f);
 }
 
-// ------------------------------------------------------------------------------ against the second telling
-
-template <class T>
-testing::AssertionResult agrees(i32 mode, const T& src, const ZR_LinearBlendingTables* tables,
-                                const zr::Channel<T>* opacity, int count, const T& dst) {
-  T d = dst;
-  transfer<T>(mode, src, tables, opacity, count, d);
-  const T expected = model::transfer<T>(mode, src, tables, opacity, count, dst);
-  if (same(d, expected)) return testing::AssertionSuccess();
-  return testing::AssertionFailure() << "mode " << mode << (tables ? " linear" : "") << ", " << count
-                                     << " opacities: " << text(src) << " onto " << text(dst) << " gives " << text(d)
-                                     << " and not " << text(expected);
-}
-
-TEST_F(Modes, EightBitEveryPairOfChannels) {
-  static constexpr u8 alphas[][2] = {{255, 255}, {255, 90}, {255, 0},   {1, 255},
-                                     {128, 254}, {77, 3},   {254, 128}, {3, 0}};
-  for (i32 mode = 0; mode <= 40; ++mode)
-    for (const auto& [A, D] : alphas)
-      for (int s = 0; s < 256; ++s)
-        for (int d = 0; d < 256; d += 3) {
-          const auto c = [](int v) { return static_cast<u8>(v); };
-          const int d2 = std::min(d + 1, 255), d3 = std::min(d + 2, 255);
-          const ZR_Pixel8 src{A, c(s), c(s), c(s)}, dst{D, c(d), c(d2), c(d3)};
-          ASSERT_TRUE(agrees<ZR_Pixel8>(mode, src, nullptr, nullptr, 0, dst));
-        }
-}
-
-TEST_F(Modes, EightBitEveryPairOfAlphas) {
-  const ZR_Pixel8 colours[][2] = {{{0, 200, 3, 128}, {0, 10, 255, 127}}, {{0, 254, 65, 190}, {0, 128, 64, 33}}};
-  for (i32 mode = 0; mode <= 40; ++mode)
-    for (const auto& pair : colours)
-      for (int a = 0; a < 65536; ++a) {
-        ZR_Pixel8 src = pair[0], dst = pair[1];
-        src.alpha = static_cast<u8>(a >> 8), dst.alpha = static_cast<u8>(a);
-        ASSERT_TRUE(agrees<ZR_Pixel8>(mode, src, nullptr, nullptr, 0, dst));
-      }
-}
-
-TYPED_TEST(ModesAt, RandomPixelsUnderEveryFormOfOpacity) {
-  RandomPixels<TypeParam> random;
-  const ZR_LinearBlendingTables tables = model::gamma_tables(2.2);
-  for (i32 mode = 0; mode <= 40; ++mode)
-    for (int round = 0; round < 6000; ++round) {
-      const TypeParam src = random.pixel(), dst = random.pixel();
-      const zr::Channel<TypeParam> opacity[2] = {random.alpha(), random.alpha()};
-      ASSERT_TRUE(agrees<TypeParam>(mode, src, round % 2 ? &tables : nullptr, opacity, round % 3, dst));
-    }
-}
-
 // ------------------------------------------------------------------------------ what holds for all
 
 TYPED_TEST(ModesAt, AClearSourceChangesNothingButInAddPremul) {
   using D = zr::Depth<TypeParam>;
   RandomPixels<TypeParam> random;
-  const ZR_LinearBlendingTables tables = model::gamma_tables(2.2);
+  const ZR_LinearBlendingTables tables = gamma_tables(2.2);
   const auto white = static_cast<zr::Channel<TypeParam>>(D::white);
   for (i32 mode = 0; mode <= 40; ++mode)
     for (const auto* linear : {static_cast<const ZR_LinearBlendingTables*>(nullptr), &tables}) {
@@ -234,7 +184,7 @@ TYPED_TEST(ModesAt, IllegalChannelsDoNoHarm) {
     values = {0, 1, static_cast<Channel>(~Channel{0}), static_cast<Channel>(zr::Depth<TypeParam>::white + 1)};
     if constexpr (sizeof(Channel) == 2) values.insert(values.end(), {32767, 32768, 40000, 65528});
   }
-  const ZR_LinearBlendingTables tables = model::gamma_tables(2.2);
+  const ZR_LinearBlendingTables tables = gamma_tables(2.2);
   std::mt19937 random{1};
   const auto any = [&] { return values[random() % values.size()]; };
   for (i32 mode = 0; mode <= 40; ++mode)
@@ -255,24 +205,6 @@ TEST_F(Modes, SlotsBehindTheModesAreNull) {
     EXPECT_EQ(ZR_Get_Xfer1_Opacity2_tableF(mode) != nullptr, mode <= 40) << mode;
     EXPECT_EQ(ZR_Get_Xfer1_Opacity_table16(mode), ZRp_G_Xfer1_Opacity_table16[mode]);
   }
-}
-
-TEST_F(Modes, SoftLightTablesFollowTheirCurves) {
-  using model::N16, model::N8, model::NF;
-  for (int i = 0; i < 256; ++i) {
-    EXPECT_EQ(zr::soft_light_low_8[static_cast<size_t>(i)], N8::soft(false, i)) << i;
-    EXPECT_EQ(zr::soft_light_high_8[static_cast<size_t>(i)], N8::soft(true, i)) << i;
-  }
-  EXPECT_EQ(*std::max_element(zr::soft_light_low_8.begin(), zr::soft_light_low_8.end()), 64);
-  EXPECT_EQ(*std::max_element(zr::soft_light_high_8.begin(), zr::soft_light_high_8.end()), 64);
-  for (int i = 0; i <= 4096; ++i) {
-    EXPECT_EQ(zr::soft_light_low_16[i], N16::soft_entry(false, i)) << i;
-    EXPECT_EQ(zr::soft_light_high_16[i], N16::soft_entry(true, i)) << i;
-    EXPECT_EQ(zr::soft_light_low_float[i], NF::soft_entry(false, i)) << i;
-    EXPECT_EQ(zr::soft_light_high_float[i], NF::soft_entry(true, i)) << i;
-  }
-  EXPECT_EQ(zr::soft_light_low_float[4097], 0);
-  EXPECT_EQ(zr::soft_light_high_float[4097], 0);
 }
 
 TEST_F(Modes, TransferFlags) {

@@ -2,12 +2,15 @@
 // plan of a row and its failures.
 #include <ZR/composite.h>
 
+#include <algorithm>
+#include <cstring>
 #include <limits>
+#include <vector>
 
 #include "composite/ground_rows.h"
 #include "composite/random_pixels.h"
-#include "composite/row_model.h"
 #include "support/born_library.h"
+#include "support/gamma_tables.h"
 #include "world/slot_table.h"
 
 namespace {
@@ -74,38 +77,6 @@ class RowsAt : public BornLibrary {};
 using Depths = testing::Types<ZR_Pixel8, ZR_Pixel16, ZR_PixelFloat>;
 TYPED_TEST_SUITE(RowsAt, Depths);
 using Rows = BornLibrary;
-
-// ------------------------------------------------------------------------------ against the second telling
-
-TYPED_TEST(RowsAt, EveryModeWithAndWithoutMaskTablesAndKeptAlpha) {
-  using T = TypeParam;
-  RandomPixels<T> random;
-  const ZR_LinearBlendingTables gamma = model::gamma_tables(2.2);
-  for (i32 mode = -3; mode <= 40; ++mode) {
-    if (mode == -1) continue;
-    for (int round = 0; round < 240; ++round) {
-      const bool masked = round & 1, linear = round & 2, keep = round & 4;
-      const auto opacity = round % 3 == 0 ? white<T> : round % 17 == 0 ? zr::Channel<T>{0} : random.alpha();
-      const i32 seed = static_cast<i32>(random.random());
-      std::vector<T> src, mask, dst;
-      for (int i = round % 23; i > 0; --i) {
-        src.push_back(random.pixel());
-        dst.push_back(random.pixel());
-        mask.push_back(random.pixel());
-      }
-      const ZR_LinearBlendingTables* tables = linear ? &gamma : nullptr;
-      std::vector<T> expected = dst;
-      model::composite_row<T>({mode, seed, opacity, keep}, tables, src, masked ? &mask : nullptr, expected);
-      const std::vector<T> got =
-          run<T>(record<T>(mode, opacity, keep, seed), tables, src, masked ? &mask : nullptr, dst);
-      for (size_t i = 0; i < dst.size(); ++i)
-        ASSERT_TRUE(same(got[i], expected[i]))
-            << "mode " << mode << (masked ? " masked" : "") << (linear ? " linear" : "") << (keep ? " keep" : "")
-            << " opacity " << +opacity << ": " << text(src[i]) << "onto " << text(dst[i]) << "gives " << text(got[i])
-            << "and not " << text(expected[i]);
-    }
-  }
-}
 
 // A plan for masked rows takes a row without mask as one that is open everywhere.
 TYPED_TEST(RowsAt, AMissingMaskIsAnOpenOne) {
@@ -220,7 +191,7 @@ TYPED_TEST(RowsAt, GroundRowsReadFromAnotherRowToo) {
 
 TYPED_TEST(RowsAt, EmptyRowsAreNotTouched) {
   using T = TypeParam;
-  const ZR_LinearBlendingTables gamma = model::gamma_tables(2.2);
+  const ZR_LinearBlendingTables gamma = gamma_tables(2.2);
   for (i32 mode = -3; mode <= 40; ++mode) {
     if (mode == -1) continue;
     const ZR_BlendModeDescriptor<T> plan(record<T>(mode, white<T>, true), mode & 1, mode & 2 ? &gamma : nullptr);
@@ -243,7 +214,7 @@ TYPED_TEST(RowsAt, IllegalChannelsDoNoHarm) {
   }
   std::mt19937 random{3};
   const auto any = [&] { return values[random() % values.size()]; };
-  const ZR_LinearBlendingTables gamma = model::gamma_tables(2.2);
+  const ZR_LinearBlendingTables gamma = gamma_tables(2.2);
   for (i32 mode = -3; mode <= 40; ++mode) {
     if (mode == -1) continue;
     for (int round = 0; round < 8; ++round) {
@@ -278,7 +249,7 @@ TEST_F(Rows, ThePlanAsksTheSlotOfItsVariantTwice) {
   const SlotOverride linear(ZR_Slot_inner_blend_linear16, address(&recording_getter<11>));
   const SlotOverride mask(ZR_Slot_inner_blend_mask16, address(&recording_getter<12>));
   const SlotOverride both(ZR_Slot_inner_blend_mask_linear16, address(&recording_getter<13>));
-  const ZR_LinearBlendingTables gamma = model::gamma_tables(2.2);
+  const ZR_LinearBlendingTables gamma = gamma_tables(2.2);
   for (const i32 i : {0, 1, 2, 3}) {
     asked.clear();
     const ZR_BlendModeDescriptor<ZR_Pixel16> plan(record<ZR_Pixel16>(XferHue, 5), i & 2, i & 1 ? &gamma : nullptr);
