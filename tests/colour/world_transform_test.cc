@@ -2,6 +2,8 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdlib>
+#include <memory>
+#include <thread>
 
 #include "colour/colour_support.h"
 #include "support/worlds.h"
@@ -145,6 +147,29 @@ TEST_F(WorldTransform, LinearizeBothWays) {
   *world.At(0, 0) = {1, 0, 1.0f, 0};
   ZR_PRISMAApplyTransform(ZR_GetLinearizeTransform(p3, rec, true).Get(), &world, &world, false, nullptr);
   EXPECT_NEAR(world.At(0, 0)->red, 0.19858f, 2e-3f);  // the green of P3 by the primaries of Rec. 2020
+}
+
+// First uses race for the tables; whoever comes later takes what is there.
+TEST_F(WorldTransform, OneTransformFromManyThreads) {
+  for (const bool by_lcms : {false, true}) {
+    const TON_PRISMA_Transform transform(profile("sRGB-v4"), profile("DisplayP3-v4"), by_lcms ? 0 : 1,
+                                         TON_GetDefaultPRISMAOptions());
+    ZR_WorldX<ZR_Pixel8> src(64, 40, 0);
+    randomise(src, 41);
+    std::vector<std::unique_ptr<ZR_WorldX<ZR_Pixel8>>> results;
+    for (int i = 0; i < 4; ++i) results.push_back(std::make_unique<ZR_WorldX<ZR_Pixel8>>(64, 40, ZR_WorldFlag_Clear));
+    std::vector<std::thread> threads;
+    for (int i = 0; i < 4; ++i)
+      threads.emplace_back([&, i] {
+        ZR_PRISMAApplyTransform(transform.Get(), &src, results[static_cast<size_t>(i)].get(), i % 2 != 0, nullptr);
+      });
+    for (std::thread& thread : threads) thread.join();
+    for (i32 y = 0; y < 40; ++y) {
+      EXPECT_EQ(std::memcmp(results[0]->Row(y), results[2]->Row(y), 64 * 4), 0);
+      EXPECT_EQ(std::memcmp(results[1]->Row(y), results[3]->Row(y), 64 * 4), 0);
+      EXPECT_EQ(results[0]->At(7, y)->green, results[1]->At(7, y)->green);
+    }
+  }
 }
 
 // Legs of plain lcms at float precision, one after the other.
