@@ -126,7 +126,7 @@ PRISMAProfile* linear_profile(PRISMAProfile& profile) {
   }
   cmsHPROFILE const from = profile.handle.get();
   const ContextRef& context = profile.context;
-  const ProfilePtr made(obtained(cmsCreateProfilePlaceholder(context.raw())));
+  const ProfilePtr made(obtained(cmsCreateRGBProfileTHR(context.raw(), nullptr, nullptr, nullptr)));
   cmsHPROFILE const to = made.get();
   cmsSetProfileVersion(to, cmsGetProfileVersion(from));
   cmsSetDeviceClass(to, cmsGetDeviceClass(from));

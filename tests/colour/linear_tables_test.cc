@@ -166,6 +166,10 @@ TEST_F(LinearTables, DepthConvertRefusals) {
   EXPECT_EQ(thrown_by([&] { ZR_DepthConvertWorld(tables->to_linear, &odd, &small); }), ZR_Err_Internal);
   EXPECT_EQ(caught.take_verification(), "Unknown bit depth attempting to depth convert.");
   EXPECT_EQ(thrown_by([&] { ZR_DepthConvertWorld(tables->to_linear, &small, &odd); }), ZR_Err_Internal);
+  caught.clear();
+  const TON_PRISMA_Transform transform = ZR_GetLinearizeTransform({}, {}, true);
+  EXPECT_EQ(thrown_by([&] { ZR_PRISMAApplyTransform(transform.Get(), &odd, &small, true, nullptr); }), ZR_Err_Internal);
+  EXPECT_EQ(caught.take_verification(), "Unknown world bitdepth in##CONDITIONNAME");
 }
 
 }  // namespace

