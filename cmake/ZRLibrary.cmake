@@ -3,13 +3,16 @@
 find_package(spdlog REQUIRED)
 find_package(PkgConfig REQUIRED)
 find_package(Threads REQUIRED)
+pkg_check_modules(LCMS2 REQUIRED IMPORTED_TARGET lcms2)
+find_package(Boost 1.70 REQUIRED)
+find_path(ZR_XXHASH_FOLDER xxhash.h REQUIRED)
 
 get_property(zr_sources GLOBAL PROPERTY ZR_LIBRARY_SOURCES)
 add_library(zr_objects OBJECT ${zr_sources})
 target_include_directories(zr_objects
   PUBLIC $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include>
   PRIVATE ${PROJECT_SOURCE_DIR}/platform ${PROJECT_SOURCE_DIR}/pkg/ZR/indep)
-target_link_libraries(zr_objects PUBLIC zr_rules PRIVATE spdlog::spdlog)
+target_link_libraries(zr_objects PUBLIC zr_rules Boost::headers PRIVATE spdlog::spdlog PkgConfig::LCMS2)
 set_target_properties(zr_objects PROPERTIES
   POSITION_INDEPENDENT_CODE ON
   C_VISIBILITY_PRESET hidden
@@ -21,7 +24,7 @@ add_library(zr_internal INTERFACE)
 target_include_directories(zr_internal INTERFACE
   ${PROJECT_SOURCE_DIR}/include ${PROJECT_SOURCE_DIR}/platform ${PROJECT_SOURCE_DIR}/pkg/ZR/indep)
 target_link_libraries(zr_internal INTERFACE zr_objects $<TARGET_OBJECTS:zr_objects> zr_rules
-  spdlog::spdlog Threads::Threads ${CMAKE_DL_LIBS})
+  spdlog::spdlog PkgConfig::LCMS2 Boost::headers Threads::Threads ${CMAKE_DL_LIBS})
 
 add_library(zr SHARED)
 add_library(zr_static STATIC)
@@ -35,7 +38,8 @@ set_target_properties(zr_static PROPERTIES OUTPUT_NAME zr EXPORT_NAME zr_static)
 foreach(library zr zr_static)
   target_link_libraries(${library} PRIVATE $<BUILD_INTERFACE:zr_objects> $<BUILD_INTERFACE:zr_rules>)
   target_sources(${library} PRIVATE $<TARGET_OBJECTS:zr_objects>)
-  target_link_libraries(${library} PRIVATE spdlog::spdlog Threads::Threads ${CMAKE_DL_LIBS})
+  target_link_libraries(${library} PRIVATE spdlog::spdlog PkgConfig::LCMS2 Threads::Threads ${CMAKE_DL_LIBS})
+  target_link_libraries(${library} PUBLIC Boost::headers)
   target_include_directories(${library} INTERFACE
     $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include> $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
   add_library(ZR::${library} ALIAS ${library})

@@ -2,11 +2,16 @@
 #pragma once
 
 #include <ZR/callback_block.h>
+#include <ZR/colour_settings.h>
+#include <ZR/colour_transform.h>
 #include <ZR/composite.h>
 #include <ZR/depth.h>
 #include <ZR/errors.h>
+#include <ZR/guid.h>
+#include <ZR/linear_tables.h>
 #include <ZR/module.h>
 #include <ZR/platform.h>
+#include <ZR/prisma.h>
 #include <ZR/slots.h>
 #include <ZR/transfer_mode.h>
 #include <ZR/vec_pixel.h>

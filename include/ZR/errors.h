@@ -44,6 +44,10 @@ enum ZR_CallSite : u32 {
   ZR_Site_ModuleLoad = 0x81,
   ZR_Site_EmptySlot = 0x82,
   ZR_Site_CallbackBlock = 0x83,
+  ZR_Site_ColourEngine = 0x84,
+  ZR_Site_ColourSettings = 0x85,
+  ZR_Site_ColourTransform = 0x86,
+  ZR_Site_DepthConvert = 0x87,
   ZR_Site_UnknownDepth = 0x3e7,
 };
 

@@ -128,6 +128,13 @@ int OPT_GetInt(const char* key, int fallback) {
   return error == std::errc() && stop == end ? value : fallback;
 }
 
+i32 OPT_GetTextPrefData(const char* section, const char* key, bool* out) {
+  const std::string text = OPT_GetString((std::string(section) + "." + key).c_str(), "false");
+  if (text != "true" && text != "false") return ZR_Err_BadParam;
+  *out = text == "true";
+  return ZR_Err_None;
+}
+
 void OPT_Reload() {
   Preferences& all = preferences();
   const std::lock_guard hold(all.lock);

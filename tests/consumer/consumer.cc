@@ -1,6 +1,8 @@
 // The C++ classes against the installed package.
 #include <ZR/ZR.h>
 
+#include <boost/make_shared.hpp>
+
 #include <cstdio>
 #include <memory>
 
@@ -29,6 +31,16 @@ int main() {
     f32 scratch[2];
     if (ZR_BlendPipeline<ZR_PixelFloat>(nullptr, 2, &plan, over, nullptr, scratch, row) != 0) return 5;
     if (row[0].red != 0.625f || row[1].red != 0.25f) return 6;
+    TON_PRISMA_ProfilePool pool;
+    ZR_ColorSettings settings(&pool);
+    settings.SetProfile(boost::make_shared<TON_PRISMA_Profile>(PRISMA_Profile_AdobeRGB));
+    settings.SetLinearBlending(true);
+    if (settings.GetLinearBlendingTables(false)->from_linear[4096] != 32768) return 7;
+    if (settings.GetCalGrayGamma() < 2.19f || settings.GetRenderGuid().ToString().size() != 36) return 8;
+    ZR_ConvertProfileToProfile(PRISMA_Profile_sRGB, PRISMA_Profile_DisplayP3, narrow.get(), narrow.get(), true,
+                               nullptr);
+    std::printf("%u %u %u %u\n", pixel->alpha, pixel->red, pixel->green, pixel->blue);
+    if (pixel->alpha != 255 || pixel->red < 70 || pixel->red > 85 || pixel->blue > 250) return 9;
   }
   return ZR_Death();
 }

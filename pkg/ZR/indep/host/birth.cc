@@ -5,12 +5,14 @@
 #include <GX/gx.h>
 #include <JRN/jrn.h>
 #include <OPT/opt.h>
+#include <TON/ton.h>
 #include <ZR/composite.h>
 
 #include <algorithm>
 #include <iterator>
 #include <string>
 
+#include "colour/emergency_settings_state.h"
 #include "composite/scratch_state.h"
 #include "composite/soft_light_state.h"
 #include "host/accel_modules_state.h"
@@ -96,6 +98,22 @@ i32 log_death() {
   return ZR_Err_None;
 }
 
+// The answer of a birth without a colour engine: everything else works.
+constexpr i32 no_colour_engine = 1;
+
+i32 bind_colour_engine() {
+  TON_AddressProc proc = nullptr;
+  if (const i32 error = TON_GetQILAddressProc(&proc)) return error;
+  return TON_PRISMA_Bind(proc) ? i32{ZR_Err_None} : no_colour_engine;
+}
+
+i32 free_colour_settings() { return free_emergency_settings(); }
+
+i32 let_colour_engine_go() {
+  TON_PRISMA_Unbind();
+  return ZR_Err_None;
+}
+
 i32 clear_registries() {
   ADDIN_ClearTWSuites();
   DSK_ClearExtensionMap();
@@ -118,11 +136,16 @@ constexpr Step birth_steps[] = {
     {"modules", run_module_scan},
 };
 
+// After all others, and its failure leaves the library born: only colour calls fail then.
+constexpr Step colour_step = {"colour engine", bind_colour_engine};
+
 // All of them run; the first failure is the result.
 constexpr Step death_steps[] = {
     {"multiply tables", give_multiply_tables_back},
     {"modules", unload_modules},
     {"scratch", give_scratch_back},
+    {"colour settings", free_colour_settings},
+    {"colour engine", let_colour_engine_go},
     {"registries", clear_registries},
 };
 
@@ -156,7 +179,7 @@ extern "C" i32 ZR_Birth(void) {
       zr::empty_slots();
       return error;
     }
-    return i32{ZR_Err_None};
+    return zr::run_guarded(zr::colour_step, "Birth");
   });
 }
 
