@@ -59,7 +59,7 @@ TEST_F(CompositeRect, EveryPairOfAlphas) {
 }
 
 TEST_F(CompositeRect, PlaceFieldsAndPolls) {
-  constexpr i32 rows = 70;
+  static constexpr i32 rows = 70;
   World src(6, rows), empty(9, rows + 5);
   src.fill({255, 9, 9, 9});
   const GX_LRect rect = {1, 0, 5, rows};

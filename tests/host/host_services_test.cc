@@ -3,6 +3,8 @@
 
 #include <SHM/shm.h>
 
+#include <cstring>
+
 #include "support/born_library.h"
 
 namespace {
