@@ -169,9 +169,16 @@ struct ToldProgress {
   }
 };
 
-inline const ZR_LinearBlendingTables& test_tables() {
-  static const ZR_LinearBlendingTables tables = gamma_tables(2.2);
-  return tables;
+// Tables of a bright and a dark curve, and one of no curve at all, in which every neighbour differs.
+inline const ZR_LinearBlendingTables* test_tables(u32 which) {
+  static const std::array<ZR_LinearBlendingTables, 3> tables = [] {
+    std::array<ZR_LinearBlendingTables, 3> made{gamma_tables(2.2), gamma_tables(0.45), gamma_tables(1.8)};
+    Random random(7);
+    for (u16& v : made[2].to_linear) v = random.channel<Sixteen>();
+    for (u16& v : made[2].from_linear) v = random.channel<Sixteen>();
+    return made;
+  }();
+  return &tables[which % tables.size()];
 }
 
 }  // namespace model
