@@ -2,11 +2,8 @@
 #include <ZR/hostkit.h>
 #include <ZR/platform.h>
 #include <ZR/slots.h>
-#include <oneapi/tbb/global_control.h>
-#include <oneapi/tbb/info.h>
 
 #include <atomic>
-#include <optional>
 #include <stdexcept>
 #include <utility>
 
@@ -16,17 +13,14 @@
 namespace zr {
 namespace {
 
-int thread_count(int asked) { return asked > 0 ? asked : tbb::info::default_concurrency(); }
+int thread_count(int asked) { return asked > 0 ? asked : WorkerPool::machine_threads(); }
 
 }  // namespace
 
 struct Hostkit::State {
-  explicit State(HostkitOptions given) : options(std::move(given)), threads(thread_count(options.threads)) {
-    // More threads than processors are started only when the scheduler is told so; fewer is the arena's matter.
-    if (threads.count > tbb::info::default_concurrency())
-      more_threads.emplace(tbb::global_control::max_allowed_parallelism, static_cast<size_t>(threads.count));
-    IterateThreads* nobody = nullptr;
-    if (!G_iterate_threads.compare_exchange_strong(nobody, &threads))
+  explicit State(HostkitOptions given) : options(std::move(given)), workers(thread_count(options.threads)) {
+    WorkerPool* nobody = nullptr;
+    if (!G_iterate_workers.compare_exchange_strong(nobody, &workers))
       throw std::runtime_error("a second Hostkit in one process");
   }
   ~State() {
@@ -37,7 +31,7 @@ struct Hostkit::State {
     if (!options.module_folders.empty()) ADDIN_SetModuleFolders(nullptr, 0);
     if (options.message_sink) HB_SetMessageSink(nullptr, nullptr);
     if (options.verification_sink) HB_SetVerificationSink(nullptr, nullptr);
-    G_iterate_threads.store(nullptr);
+    G_iterate_workers.store(nullptr);
   }
   State(const State&) = delete;
   State& operator=(const State&) = delete;
@@ -61,18 +55,17 @@ struct Hostkit::State {
       ADDIN_SetModuleFolders(folders.data(), static_cast<i32>(folders.size()));
     }
     if (options.frame_pool_limit >= 0) RS_SetFramePoolLimit(static_cast<u64>(options.frame_pool_limit));
-    HB_SetNumThreads(threads.count);
+    HB_SetNumThreads(workers.count());
   }
   void begin_life() {
     if (const i32 error = ZR_Birth(); error != ZR_Err_None)
       throw std::runtime_error("ZR_Birth failed with error " + std::to_string(error));
     alive = true;
-    if (threads.count > 1) ZR_SetOverrideFunc(ZR_Slot_iterate_generic, reinterpret_cast<void*>(&threaded_iterate));
+    if (workers.count() > 1) ZR_SetOverrideFunc(ZR_Slot_iterate_generic, reinterpret_cast<void*>(&threaded_iterate));
   }
 
   HostkitOptions options;
-  std::optional<tbb::global_control> more_threads;
-  IterateThreads threads;
+  WorkerPool workers;
   bool alive = false;
 };
 
@@ -83,7 +76,7 @@ Hostkit::Hostkit(HostkitOptions options) : state_(std::make_unique<State>(std::m
 
 Hostkit::~Hostkit() = default;
 
-int Hostkit::threads() const { return state_ != nullptr ? state_->threads.count : 0; }
+int Hostkit::threads() const { return state_ != nullptr ? state_->workers.count() : 0; }
 
 i32 Hostkit::End() {
   if (state_ == nullptr) return ZR_Err_None;

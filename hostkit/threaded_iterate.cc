@@ -1,9 +1,7 @@
-// Iteration on oneTBB: each worker of a call has an index of its own and takes bands of iterations.
+// Iteration on threads: each worker of a call has an index of its own and takes bands of iterations.
 #include "threaded_iterate.h"
 
 #include <ZR/platform.h>
-#include <oneapi/tbb/parallel_for.h>
-#include <oneapi/tbb/partitioner.h>
 
 #include <algorithm>
 #include <exception>
@@ -23,11 +21,9 @@ i32 invoke(ZR_GenericFunc fn, void* refcon, i32 thread_index, i32 i, i32 iterati
     return fn(refcon, thread_index, i, iterations);
   } catch (const i32 code) {
     return code != ZR_Err_None ? code : static_cast<i32>(ZR_Err_Internal);
-  } catch (const std::bad_alloc&) {
-    return ZR_Err_OutOfMemory;
   } catch (const std::exception& error) {
     HBp_ReportErrString(0x250000u | iterate_site, 8, error.what());
-    return ZR_Err_Internal;
+    return dynamic_cast<const std::bad_alloc*>(&error) != nullptr ? ZR_Err_OutOfMemory : ZR_Err_Internal;
   } catch (...) {
     return ZR_Err_Internal;
   }
@@ -106,19 +102,16 @@ struct Call {
   }
 };
 
-void run_workers(tbb::task_arena& arena, Call& call) {
+void run_workers(WorkerPool& pool, Call& call) {
   G_hand_over.fetch_add(1, std::memory_order_release);
-  arena.execute([&call] {
-    tbb::parallel_for(
-        0, call.workers,
-        [&call](int worker) {
-          G_hand_over.load(std::memory_order_acquire);
-          // Isolated: a callback that waits for parallel work of its own is not handed another row meanwhile.
-          tbb::this_task_arena::isolate([&call, worker] { call.run(worker); });
-          G_hand_over.fetch_add(1, std::memory_order_release);
-        },
-        tbb::simple_partitioner{});
-  });
+  pool.run(
+      call.workers,
+      [](void* refcon, i32 worker) {
+        G_hand_over.load(std::memory_order_acquire);
+        static_cast<Call*>(refcon)->run(worker);
+        G_hand_over.fetch_add(1, std::memory_order_release);
+      },
+      &call);
   G_hand_over.load(std::memory_order_acquire);
 }
 
@@ -139,19 +132,19 @@ i32 iterate_nested(i32 threads, i32 iterations, void* refcon, ZR_GenericFunc fn)
 i32 threaded_iterate(i32 iterations, void* refcon, ZR_GenericFunc fn) {
   if (fn == nullptr) return ZR_ReportBadCallbackParam(iterate_site);
   if (iterations < 1 && iterations != -1) return 0;
-  IterateThreads* const threads = G_iterate_threads.load(std::memory_order_acquire);
-  if (threads == nullptr) return ZR_IterateGeneric_Static(iterations, refcon, fn);
-  if (G_running_index >= 0) return iterate_nested(threads->count, iterations, refcon, fn);
+  WorkerPool* const pool = G_iterate_workers.load(std::memory_order_acquire);
+  if (pool == nullptr) return ZR_IterateGeneric_Static(iterations, refcon, fn);
+  if (G_running_index >= 0) return iterate_nested(pool->count(), iterations, refcon, fn);
   if (iterations == 1) return invoke(fn, refcon, 0, 0, 1);  // not counted as inside: what it calls may be parallel
 
-  const i32 workers = iterations == -1 ? threads->count : std::min(threads->count, iterations);
+  const i32 workers = iterations == -1 ? pool->count() : std::min(pool->count(), iterations);
   Call call{.fn = fn,
             .refcon = refcon,
             .iterations = iterations,
             .workers = workers,
             .band = std::max(1, iterations / (workers * bands_per_worker))};
   try {
-    run_workers(threads->arena, call);
+    run_workers(*pool, call);
   } catch (...) {  // the scheduler found no memory for its tasks; part of the work may be done
     return ZR_Err_OutOfMemory;
   }

@@ -3,7 +3,7 @@
 
 namespace zr {
 
-constinit std::atomic<IterateThreads*> G_iterate_threads = nullptr;
+constinit std::atomic<WorkerPool*> G_iterate_workers = nullptr;
 constinit thread_local i32 G_running_index = -1;
 constinit std::atomic<u64> G_hand_over = 0;
 

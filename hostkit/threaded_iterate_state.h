@@ -2,20 +2,15 @@
 #pragma once
 
 #include <ZR/zr.h>
-#include <oneapi/tbb/task_arena.h>
 
 #include <atomic>
 
+#include "worker_pool.h"
+
 namespace zr {
 
-struct IterateThreads {
-  explicit IterateThreads(i32 threads) : count(threads), arena(threads) {}
-  const i32 count;
-  tbb::task_arena arena;
-};
-
 // Set by a Hostkit for its life, on the main thread while nothing renders; null without one.
-extern constinit std::atomic<IterateThreads*> G_iterate_threads;
+extern constinit std::atomic<WorkerPool*> G_iterate_workers;
 
 // Index under which the calling thread runs callbacks at the moment; -1 when it runs none.
 extern constinit thread_local i32 G_running_index;

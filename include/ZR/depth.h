@@ -143,16 +143,17 @@ constexpr f32 widen_8_to_float_d(u8 v) { return static_cast<f32>(static_cast<f64
 constexpr f32 widen_16_to_float(u16 v) { return static_cast<f32>(v) * 3.0517578e-5f; }  // exactly v / 32768
 static_assert(0.003921569f == 1.0f / 255.0f && 3.0517578e-5f == 1.0f / 32768.0f);
 
+// All bits set where the condition holds: choices made this way stay out of the way of vectorisation.
+constexpr u32 mask_where(bool condition) { return 0u - static_cast<u32>(condition); }
+
 // Float narrowed to an integer depth, the scalar rule: the channel times white and a half, both in single
-// precision, truncated; below `floor` it is 0, above `ceiling` white. NaN passes both tests and
-// truncates to 0. Branch-free, so that rows of it vectorise.
+// precision, truncated; 0 below `floor`, white above `ceiling`. NaN passes both tests and truncates to 0.
 template <class Pixel>
 constexpr Channel<Pixel> narrow_float(f32 c, f32 floor, f32 ceiling) {
   const f32 scaled = c * static_cast<f32>(Depth<Pixel>::white);
-  f32 rounded = scaled + 0.5f;
-  rounded = scaled > ceiling ? ceiling : rounded;
-  rounded = floor > scaled ? 0.0f : rounded;
-  return static_cast<Channel<Pixel>>(static_cast<u32>(truncate_i32(rounded)));
+  const u32 truncated = static_cast<u32>(truncate_i32(scaled + 0.5f));
+  const u32 below = mask_where(floor > scaled), above = mask_where(scaled > ceiling);
+  return static_cast<Channel<Pixel>>((truncated & ~below & ~above) | (static_cast<u32>(Depth<Pixel>::white) & above));
 }
 // Colours are clamped. Alpha is not: out of range it wraps in the low 8 or 16 bits. Kept on purpose.
 template <class Pixel>
@@ -170,12 +171,12 @@ constexpr Channel<Pixel> narrow_float_alpha(f32 a) {
 // The vector rule, for aligned rows to 8 bits: nearest even, then clamped to 0..255, alpha alike. A
 // product above 32 bits counts as the lowest integer, as the processor's conversion gives it: 0, like NaN.
 constexpr u8 narrow_float_to_8_nearest(f32 c) {
-  f32 scaled = c * 255.0f;
-  scaled = scaled < 2147483648.0f ? scaled : -1.0f;
-  scaled = scaled > 0.0f ? scaled : 0.0f;
-  scaled = scaled < 255.0f ? scaled : 255.0f;
-  const f32 snapped = scaled + 8388608.0f;  // 2^23: the sum has no fraction bits, so adding it rounds
-  return static_cast<u8>(std::bit_cast<u32>(snapped) & 0xffu);
+  constexpr f32 white = static_cast<f32>(Depth<ZR_Pixel8>::white);
+  const f32 scaled = c * white;
+  const u32 snapped = std::bit_cast<u32>(scaled + 8388608.0f);  // 2^23: no room for a fraction, so adding rounds
+  const u32 inside = mask_where(scaled > 0.0f) & mask_where(scaled < white);
+  const u32 above = mask_where(scaled >= white) & mask_where(scaled < 2147483648.0f);
+  return static_cast<u8>((snapped & inside) | above);
 }
 // What a dither word adds to a float before it is narrowed: [-1/512, +1/512]; the factor is 2^-40.
 constexpr f32 dither_offset(u32 word) {
@@ -217,6 +218,15 @@ constexpr Channel<Pixel> premultiply(Channel<Pixel> c, Channel<Pixel> a) {
 template <class Pixel>
 inline Channel<Pixel> unmultiply(Channel<Pixel> c, Channel<Pixel> a) {
   return static_cast<Channel<Pixel>>(Depth<Pixel>::div(c, a));
+}
+// The same quotient as Depth::div, by a double: rows of it vectorise, and integer division does not. Exact,
+// because the numerator fits 31 bits: what lies below an integer lies far more below it than a double rounds.
+template <>
+constexpr u16 unmultiply<ZR_Pixel16>(u16 c, u16 a) {
+  constexpr i32 white = Depth<ZR_Pixel16>::white;
+  const f64 quotient = static_cast<f64>(c * white + (a >> 1)) / static_cast<f64>(a + (a == 0));
+  const u32 full = mask_where(c >= a);
+  return static_cast<u16>((static_cast<u32>(static_cast<i32>(quotient)) & ~full) | (static_cast<u32>(white) & full));
 }
 
 }  // namespace zr

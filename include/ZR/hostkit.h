@@ -16,12 +16,12 @@ struct HostkitOptions {
   // answers with the same number, so that operations size their scratch by it.
   int threads = 0;
   // Folders that are scanned for .ZNX acceleration modules, in this order; none leaves the preference.
-  std::vector<std::string> module_folders;
+  std::vector<std::string> module_folders = {};
   // Receives every message; null leaves them to the log. Called on whichever thread reports, also on two at
   // once; must not throw.
-  std::function<void(u32 code, i32 severity, const std::string& text)> message_sink;
+  std::function<void(u32 code, i32 severity, const std::string& text)> message_sink = nullptr;
   // Receives failed verifications; null leaves them to the log.
-  std::function<void(u32 code, i32 line, const std::string& text)> verification_sink;
+  std::function<void(u32 code, i32 line, const std::string& text)> verification_sink = nullptr;
   // Bytes that the frame pool may keep for reuse; negative leaves the pool's default.
   i64 frame_pool_limit = -1;
 };

@@ -59,7 +59,7 @@ TEST_F(CompositeRect, EveryPairOfAlphas) {
 }
 
 TEST_F(CompositeRect, PlaceFieldsAndPolls) {
-  constexpr i32 rows = 70;
+  static constexpr i32 rows = 70;
   World src(6, rows), empty(9, rows + 5);
   src.fill({255, 9, 9, 9});
   const GX_LRect rect = {1, 0, 5, rows};
@@ -96,7 +96,7 @@ TEST_F(CompositeRect, PlaceFieldsAndPolls) {
 
 TEST_F(CompositeRect, RowsGoThroughTheirSlots) {
   World src(2, 2), dst(2, 2);
-  const zr::CompositeBehindRowFunc* const mark = [](i32 n, u8 opacity, const ZR_Pixel8*, ZR_Pixel8* to) {
+  zr::CompositeBehindRowFunc* const mark = [](i32 n, u8 opacity, const ZR_Pixel8*, ZR_Pixel8* to) {
     for (i32 i = 0; i < n; ++i) to[i].blue = opacity;
   };
   for (const auto& [slot, call] :

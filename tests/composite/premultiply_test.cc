@@ -15,7 +15,8 @@ namespace {
 
 constexpr i64 floor_divide(i64 n, i64 d) { return n >= 0 ? n / d : -((d - 1 - n) / d); }
 
-// One channel against a matte, in exact integers; the 8-bit quotient is rounded, the 16-bit one floored.
+// One channel against a matte, in exact integers. The signed 8-bit product is rounded by the fold, which
+// for some negative products is one above the nearest; the 16-bit one is floored.
 template <class T>
 zr::Channel<T> matted(bool forward, zr::Channel<T> c, zr::Channel<T> a, zr::Channel<T> m) {
   constexpr auto white = zr::Depth<T>::white;
@@ -25,8 +26,8 @@ zr::Channel<T> matted(bool forward, zr::Channel<T> c, zr::Channel<T> a, zr::Chan
   } else {
     constexpr bool narrow = sizeof(T) == 4;
     const i64 t = (static_cast<i64>(c) - m) * a, k = static_cast<i64>(white - a) * m;
-    if (forward)
-      return static_cast<zr::Channel<T>>(m + (narrow ? floor_divide(2 * t + 255, 510) : floor_divide(t, 32768)));
+    const i64 product = narrow ? floor_divide(t + floor_divide(t + 128, 256) + 128, 256) : floor_divide(t, 32768);
+    if (forward) return static_cast<zr::Channel<T>>(m + product);
     const i64 left = std::max<i64>(c - (narrow ? (2 * k + 255) / 510 : (k + 16383) / 32768), 0);
     return static_cast<zr::Channel<T>>(left >= a ? white : (left * white + a / 2) / a);
   }

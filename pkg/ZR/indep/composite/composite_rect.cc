@@ -63,17 +63,14 @@ void composite_behind_row_straight(i32 n, u8 opacity, const ZR_Pixel8* src, ZR_P
 
 void composite_behind_row_premul(i32 n, u8 opacity, const ZR_Pixel8* src, ZR_Pixel8* dst) {
   for (i32 i = 0; i < n; ++i) {
-    const ZR_Pixel8 d = dst[i];
-    if (d.alpha == D::white) continue;
-    const ZR_Pixel8 s = {multiply(opacity, src[i].alpha), multiply(opacity, src[i].red),
-                         multiply(opacity, src[i].green), multiply(opacity, src[i].blue)};
+    const ZR_Pixel8 s = src[i], d = dst[i];
     const i32 room = D::inv(d.alpha);
-    // A colour that is above its alpha may wrap. Under a clear destination pixel `room` is white and the
-    // sum would be d + s; there the source replaces whatever colour stood.
-    const auto add = [&](i32 below, i32 source) { return static_cast<u8>(below + multiply(room, source)); };
-    dst[i] = d.alpha == 0
-                 ? s
-                 : ZR_Pixel8{add(d.alpha, s.alpha), add(d.red, s.red), add(d.green, s.green), add(d.blue, s.blue)};
+    // Under a clear pixel the source replaces whatever colour stood. Colours above their alpha may wrap.
+    const i32 kept = d.alpha == 0 ? 0 : 1;
+    const auto add = [&](i32 below, i32 source) {
+      return static_cast<u8>(below * kept + multiply(room, multiply(opacity, source)));
+    };
+    dst[i] = {add(d.alpha, s.alpha), add(d.red, s.red), add(d.green, s.green), add(d.blue, s.blue)};
   }
 }
 

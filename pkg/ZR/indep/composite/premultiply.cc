@@ -41,14 +41,15 @@ template <class T, bool forward>
 void matte_row(i32 n, const T& matte, const T* src, T* dst) {
   for (i32 i = 0; i < n; ++i) {
     const T p = src[i];
-    const auto channel = [a = p.alpha](Channel<T> c, Channel<T> m) {
-      if (a == Depth<T>::white) return c;
-      if constexpr (forward)
-        return onto_matte<T>(c, a, m);
-      else
-        return a == 0 ? c : off_matte<T>(c, a, m);
+    const Channel<T> a = p.alpha;
+    if (a == Depth<T>::white || (!forward && a == 0)) {
+      dst[i] = p;
+      continue;
+    }
+    const auto channel = [a](Channel<T> c, Channel<T> m) {
+      return forward ? onto_matte<T>(c, a, m) : off_matte<T>(c, a, m);
     };
-    dst[i] = {p.alpha, channel(p.red, matte.red), channel(p.green, matte.green), channel(p.blue, matte.blue)};
+    dst[i] = {a, channel(p.red, matte.red), channel(p.green, matte.green), channel(p.blue, matte.blue)};
   }
 }
 

@@ -20,8 +20,8 @@ constexpr i32 block_channels = 4 * block_pixels;
 // Runs rule(channel value, index of the channel in its pixel) over n pixels.
 template <class To, class From, class Rule>
 void each_channel(i32 n, const From* src, To* dst, Rule rule) {
-  const Channel<From>* __restrict in = &src->alpha;
-  Channel<To>* __restrict out = &dst->alpha;
+  const auto* __restrict in = reinterpret_cast<const Channel<From>*>(src);
+  auto* __restrict out = reinterpret_cast<Channel<To>*>(dst);
   i32 left = n;
   for (; left >= 4; left -= 4, in += 16, out += 16)  // a count that the compiler knows: no index to reduce
     for (i32 k = 0; k < 16; ++k) out[k] = rule(in[k], k);
@@ -32,8 +32,8 @@ void each_channel(i32 n, const From* src, To* dst, Rule rule) {
 template <class To, class From, class Rule>
 void each_channel_with_words(i32 n, const From* src, To* dst, Rule rule) {
   DitherRow dither;
-  const Channel<From>* __restrict in = &src->alpha;
-  Channel<To>* __restrict out = &dst->alpha;
+  const auto* __restrict in = reinterpret_cast<const Channel<From>*>(src);
+  auto* __restrict out = reinterpret_cast<Channel<To>*>(dst);
   for (i32 left = n; left > 0; left -= block_pixels, in += block_channels, out += block_channels) {
     const i32 channels = 4 * std::min(left, block_pixels);
     u32 words[block_channels];

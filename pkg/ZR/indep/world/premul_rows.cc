@@ -4,43 +4,77 @@
 #include <ZR/depth.h>
 
 #include <cstring>
+#include <type_traits>
 
 namespace zr {
 namespace {
 
-// Runs `rule(colour, alpha)` over the colours of a row. Blocks go through local memory: in place or not,
-// the compiler then knows that nothing overlaps, and vectorises.
-template <class T, class Rule>
-i32 colour_row(i32 n, const T* src, T* dst, Rule rule) {
-  constexpr i32 block = static_cast<i32>(64 / sizeof(T));
-  const T* in = src != nullptr ? src : dst;
-  const auto pixels = [&](i32 count, const T* from, T* to) {
-    for (i32 i = 0; i < count; ++i) {
-      const T p = from[i];
-      to[i] = {p.alpha, rule(p.red, p.alpha), rule(p.green, p.alpha), rule(p.blue, p.alpha)};
-    }
-  };
+// Long enough that what one loop of a block stores has left the store buffer before the next loop loads it in
+// another width.
+constexpr i32 block_pixels = 64;
+
+// Runs `block(pixels in, pixels out)` over a row, and over a last part of a block. The pixels pass through
+// local memory: in place or not, the compiler then knows that nothing overlaps, and vectorises.
+template <class T, class Block>
+i32 in_blocks(i32 n, const T* src, T* dst, Block block) {
+  constexpr i32 pixels = block_pixels;
+  const T* const in = src != nullptr ? src : dst;
+  T taken[pixels], made[pixels];
   i32 i = 0;
-  for (; i <= n - block; i += block) {
-    T taken[block], made[block];
+  for (; i <= n - pixels; i += pixels) {
     std::memcpy(taken, in + i, sizeof taken);
-    pixels(block, taken, made);
+    block(taken, made);
     std::memcpy(dst + i, made, sizeof made);
   }
-  pixels(n - i, in + i, dst + i);
+  if (const std::size_t rest = static_cast<std::size_t>(n > i ? n - i : 0); rest != 0) {
+    std::memset(taken, 0, sizeof taken);
+    std::memcpy(taken, in + i, rest * sizeof(T));
+    block(taken, made);
+    std::memcpy(dst + i, made, rest * sizeof(T));
+  }
   return 0;
+}
+
+// Every channel of a block by rule(channel, alpha of its pixel), in one flat loop; alpha itself is put back.
+template <class T, class Rule>
+void by_channel(const T* in, T* out, Rule rule) {
+  constexpr i32 channels = 4 * block_pixels;
+  Channel<T> value[channels], alpha[channels];
+  for (i32 k = 0; k < channels; k += 4) alpha[k] = alpha[k + 1] = alpha[k + 2] = alpha[k + 3] = in[k / 4].alpha;
+  std::memcpy(value, in, sizeof value);
+  for (i32 k = 0; k < channels; ++k) value[k] = rule(value[k], alpha[k]);
+  for (i32 k = 0; k < channels; k += 4) value[k] = alpha[k];
+  std::memcpy(out, value, sizeof value);
+}
+
+template <class T, class Rule>
+void by_pixel(const T* in, T* out, Rule rule) {
+  for (i32 i = 0; i < block_pixels; ++i) {
+    const T p = in[i];
+    out[i] = {p.alpha, rule(p.red, p.alpha), rule(p.green, p.alpha), rule(p.blue, p.alpha)};
+  }
 }
 
 }  // namespace
 
 template <class T>
 i32 premul_row(i32 n, const T* src, T* dst) {
-  return colour_row(n, src, dst, [](Channel<T> c, Channel<T> a) { return premultiply<T>(c, a); });
+  return in_blocks(n, src, dst, [](const T* in, T* out) {
+    if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+      by_pixel(in, out, premultiply<T>);
+    else
+      by_channel(in, out, premultiply<T>);
+  });
 }
 
 template <class T>
 i32 unmul_row(i32 n, const T* src, T* dst) {
-  return colour_row(n, src, dst, [](Channel<T> c, Channel<T> a) { return unmultiply<T>(c, a); });
+  return in_blocks(n, src, dst, [](const T* in, T* out) {
+    if constexpr (std::is_same_v<T, ZR_Pixel16>)
+      by_channel(in, out, unmultiply<T>);
+    else
+      by_pixel(in, out, unmultiply<T>);
+  });
 }
 
 template i32 premul_row(i32, const ZR_Pixel8*, ZR_Pixel8*);
