@@ -10,7 +10,7 @@
 #include <ZR/zr.h>
 
 template <class T>
-struct ZR_BlendingMode {
+struct ZR_API ZR_BlendingMode {
   i32 mode;                // -3..40
   i32 seed;                // XferDissolve only
   zr::Channel<T> opacity;  // 0..white, a factor on source alpha; not clamped

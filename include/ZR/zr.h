@@ -54,6 +54,10 @@ enum {
 
 /* ---------------------------------------------------------------------------------- records */
 
+#if defined(__GNUC__)
+#pragma GCC visibility push(default) /* the records are arguments of exported templates */
+#endif
+
 typedef struct ZR_Pixel8 {
   u8 alpha, red, green, blue;
 } ZR_Pixel8; /* 0..255 */
@@ -190,6 +194,10 @@ typedef struct ZR_Chunk {
   void** handle;
   void* data; /* the block while locked, else null */
 } ZR_Chunk;
+
+#if defined(__GNUC__)
+#pragma GCC visibility pop
+#endif
 
 #ifdef __cplusplus
 #define ZR_ASSERT_LAYOUT(condition) static_assert(condition, #condition)

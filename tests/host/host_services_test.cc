@@ -103,7 +103,7 @@ TEST_F(HostServices, BatchSamplingSaysThatItHasEnded) {
   void* selected = nullptr;
   ASSERT_EQ(ZR_GetCallbackAddr(nullptr, 0, 0, 4, &selected), 0);
   for (void* const routine : {block[3], selected}) {
-    EXPECT_EQ(reinterpret_cast<i32 (*)(void*, i32, void*)>(routine)(this, 1, nullptr), 3);
+    EXPECT_EQ(reinterpret_cast<i32 (*)()>(routine)(), 3);
     ASSERT_EQ(caught.verifications().size(), 1u);
     EXPECT_EQ(caught.verifications()[0].code, 0x25002eu);
     EXPECT_EQ(caught.take_verification(),

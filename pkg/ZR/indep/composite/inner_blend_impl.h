@@ -120,7 +120,7 @@ void run_row(Dissolve, const Row<T, masked>& row) {
     const T s = row.src[i];
     const Wide<T> A = cover(s.alpha, i);
     bool wins = A >= M::white;
-    if (!wins && A != 0) wins = M::dissolves(ZR_Rand(&seed), A);
+    if (!wins && A > 0) wins = M::dissolves(ZR_Rand(&seed), A);
     if (!wins) continue;
     copy_colour(s, row.dst[i]);
     if (!keep_alpha) row.dst[i].alpha = store<T>(M::white);

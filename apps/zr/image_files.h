@@ -1,0 +1,46 @@
+// Image files in and out of worlds.
+//
+// Colour management there is none: values go in and out as they are. Worlds hold straight alpha. PNG
+// and TIFF are written with straight alpha (TIFF marked "unassociated"), OpenEXR with associated
+// (premultiplied) alpha, as those formats are read elsewhere.
+#pragma once
+
+#include <ZR/zr.h>
+
+#include <string>
+#include <vector>
+
+#include "owned_world.h"
+
+namespace zr::tool {
+
+struct OutputFormat {
+  const char* name;  // also the name that the image library knows it by
+  std::vector<std::string> extensions;
+  std::vector<i32> depths;
+  bool associated;    // alpha, and the format also knows half
+  const char* alpha;  // how alpha is stored, for listings
+};
+const std::vector<OutputFormat>& output_formats();
+// By the extension of a file name; throws ToolError naming those that there are.
+const OutputFormat& output_format_of(const std::string& file);
+// Throws ToolError, naming what fits, when the format cannot hold the depth.
+void require_depth(const OutputFormat& format, i32 depth, const std::string& file);
+// Names of the formats that can be read.
+std::vector<std::string> readable_formats();
+
+struct ImageInfo {
+  i32 width = 0, height = 0;
+  u64 decoded_bytes = 0;  // what reading it takes besides the world
+};
+// Opens the file and reads its header; `where` ("scene.json: layers[0].image") begins messages.
+ImageInfo probe_image(const std::string& file, const std::string& where);
+// Grey, grey with alpha, RGB or RGBA of 8 or 16 bits, half or float, as a world of `depth`.
+OwnedWorld load_image(const std::string& file, i32 depth, const std::string& where);
+// Writes a world at its depth; `half` stores 16-bit floats in OpenEXR. The file is the caller's to
+// remove when this throws.
+void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, const std::string& file);
+
+void set_image_threads(int threads);
+
+}  // namespace zr::tool

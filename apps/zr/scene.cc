@@ -1,0 +1,213 @@
+// Reading a scene file: JSON into a Scene, with every value checked.
+#include "scene.h"
+
+#include <cmath>
+#include <filesystem>
+#include <fstream>
+#include <set>
+
+#include "mode_names.h"
+#include "nearest_name.h"
+#include "scene_keys.h"
+#include "scene_node.h"
+#include "tool_error.h"
+
+namespace zr::tool {
+namespace {
+
+constexpr f64 kFarthest = 1e6;  // pixels from the origin; keeps sums of coordinates inside 32 bits
+const std::vector<std::string> kFields = {"all", "even", "odd"};
+const std::vector<std::string> kMatteKinds = {"alpha", "inverted-alpha", "luma", "inverted-luma"};
+
+f64 hex_pair(const std::string& text, size_t at) {
+  return static_cast<f64>(std::stoi(text.substr(at, 2), nullptr, 16)) / 255.0;
+}
+
+ZR_PixelFloat read_colour(const SceneNode& node) {
+  static const char* const expected =
+      "[red, green, blue] or [red, green, blue, alpha], each 0 to 1, or \"#rrggbb[aa]\"";
+  const nlohmann::json& json = node.json();
+  if (json.is_string()) {
+    const std::string& text = json.get_ref<const std::string&>();
+    const bool valid = (text.size() == 7 || text.size() == 9) && text[0] == '#' &&
+                       text.find_first_not_of("0123456789abcdefABCDEF", 1) == std::string::npos;
+    if (!valid) node.refuse(expected);
+    const f64 alpha = text.size() == 9 ? hex_pair(text, 7) : 1.0;
+    return {static_cast<f32>(alpha), static_cast<f32>(hex_pair(text, 1)), static_cast<f32>(hex_pair(text, 3)),
+            static_cast<f32>(hex_pair(text, 5))};
+  }
+  if (!json.is_array() || (json.size() != 3 && json.size() != 4)) node.refuse(expected);
+  const auto channel = [&](size_t i) { return static_cast<f32>(node.at(i).number(0, 1)); };
+  return {json.size() == 4 ? channel(3) : 1.0f, channel(0), channel(1), channel(2)};
+}
+
+Point read_point(const SceneNode& node) {
+  node.require_array(2, "[x, y] in pixels");
+  return {node.at(size_t{0}).number(-kFarthest, kFarthest), node.at(1).number(-kFarthest, kFarthest)};
+}
+
+f64 read_opacity(const SceneNode& node) { return node.number(0, 1); }
+
+// A plain value, or a list of {"frame": ..., "value": ...}.
+template <class Value>
+Keyed<Value> read_keyed(const SceneNode& node, Value (*read)(const SceneNode&)) {
+  const nlohmann::json& json = node.json();
+  if (!json.is_array() || json.empty() || !json.front().is_object()) return Keyed<Value>(read(node));
+  std::vector<typename Keyed<Value>::Key> keys;
+  for (size_t i = 0; i < node.size(); ++i) {
+    const SceneNode key = node.at(i);
+    key.require_keys(key_names(kKeyframeKeys));
+    for (const char* name : {"frame", "value"})
+      if (!key.has(name)) key.fail(std::string("lacks \"") + name + "\"");
+    const i32 frame = key.at("frame").integer(-kLastFrame, kLastFrame);
+    if (!keys.empty() && frame <= keys.back().frame)
+      key.at("frame").refuse("above the frame before it, " + std::to_string(keys.back().frame));
+    keys.push_back({frame, read(key.at("value"))});
+  }
+  return Keyed<Value>(std::move(keys));
+}
+
+void read_size(const SceneNode& node, i32& width, i32& height) {
+  node.require_array(2, "[width, height], each 1 to " + std::to_string(kLargestSide) + " pixels");
+  width = node.at(size_t{0}).integer(1, kLargestSide);
+  height = node.at(1).integer(1, kLargestSide);
+}
+
+std::string read_image_path(const SceneNode& node, const std::string& scene_file) {
+  const std::filesystem::path path = node.string("the name of an image file");
+  if (path.is_absolute()) return path.string();
+  return (std::filesystem::path(scene_file).parent_path() / path).lexically_normal().string();
+}
+
+i32 read_mode(const SceneNode& node) {
+  const std::string name = node.string("the name of a transfer mode, such as \"screen\"; see zr list modes");
+  const std::optional<i32> mode = find_mode(name);
+  if (!mode)
+    node.fail("is an unknown transfer mode " + quoted_list({name.substr(0, 60)}) + "; the nearest are " +
+              quoted_list(suggest_modes(name), " and ") + " (zr list modes shows all)");
+  return *mode;
+}
+
+TrackMatte read_matte(const SceneNode& node, const std::string& scene_file) {
+  node.require_keys(key_names(kMatteKeys));
+  if (!node.has("image")) node.fail("lacks \"image\"");
+  TrackMatte matte;
+  matte.image = read_image_path(node.at("image"), scene_file);
+  if (node.has("kind")) matte.kind = static_cast<u32>(node.at("kind").one_of(kMatteKinds));
+  if (node.has("position")) matte.position = read_keyed(node.at("position"), &read_point);
+  return matte;
+}
+
+Layer read_layer(const SceneNode& node, const Scene& scene) {
+  node.require_keys(key_names(kLayerKeys));
+  Layer layer;
+  layer.place = node.path();
+  if (node.has("image") == node.has("colour")) node.fail("must have either \"image\" or \"colour\"");
+  if (node.has("image")) {
+    if (node.has("size")) node.at("size").fail("is for solids; an image has its own size");
+    layer.image = read_image_path(node.at("image"), scene.file);
+  } else {
+    layer.colour = read_colour(node.at("colour"));
+    layer.width = scene.width;
+    layer.height = scene.height;
+    if (node.has("size")) read_size(node.at("size"), layer.width, layer.height);
+  }
+  if (node.has("name")) node.at("name").string("a text");
+  if (node.has("position")) layer.position = read_keyed(node.at("position"), &read_point);
+  if (node.has("opacity")) layer.opacity = read_keyed(node.at("opacity"), &read_opacity);
+  if (node.has("mode")) layer.mode = read_mode(node.at("mode"));
+  if (node.has("keep_alpha")) layer.keep_alpha = node.at("keep_alpha").boolean();
+  if (node.has("field")) layer.field = static_cast<i32>(node.at("field").one_of(kFields));
+  if (node.has("seed")) layer.seed = node.at("seed").integer(INT32_MIN, INT32_MAX);
+  if (node.has("matte")) layer.matte = read_matte(node.at("matte"), scene.file);
+  return layer;
+}
+
+FrameRange read_frames(const SceneNode& node) {
+  if (node.json().is_string()) {
+    try {
+      return parse_frame_range(node.json().get<std::string>(), "");
+    } catch (const ToolError& error) {
+      node.fail(std::string(error.what()).substr(1));
+    }
+  }
+  node.require_array(2, "[first, last] or \"first-last\"");
+  const FrameRange frames{node.at(size_t{0}).integer(0, kLastFrame), node.at(1).integer(0, kLastFrame)};
+  if (frames.first > frames.last) node.fail("runs backwards; the first frame comes first");
+  return frames;
+}
+
+[[noreturn]] void fail_in_text(const SceneText& source, size_t byte, const std::string& what) {
+  const TextPlace place = place_of_byte(source.text, byte);
+  throw bad_input(source.file + ':' + std::to_string(place.line) + ':' + std::to_string(place.column) + ": " + what);
+}
+
+nlohmann::json parse_json(const SceneText& source) {
+  // A key that stands twice would silently lose its first value.
+  std::vector<std::set<std::string>> open;
+  std::optional<std::string> twice;
+  const auto watch = [&](int, nlohmann::json::parse_event_t event, nlohmann::json& parsed) {
+    using Event = nlohmann::json::parse_event_t;
+    if (event == Event::object_start) open.emplace_back();
+    if (event == Event::object_end && !open.empty()) open.pop_back();
+    if (event == Event::key && !open.empty() && !open.back().insert(parsed.get<std::string>()).second && !twice)
+      twice = parsed.get<std::string>();
+    return true;
+  };
+  try {
+    nlohmann::json json = nlohmann::json::parse(source.text, watch);
+    if (twice) throw bad_input(source.file + ": the key " + quoted_list({*twice}) + " stands twice in one object");
+    return json;
+  } catch (const nlohmann::json::parse_error& error) {
+    // What follows "column N: " in the parser's text is the part for people.
+    std::string what = error.what();
+    const size_t column = what.find("column ");
+    const size_t begin = column == std::string::npos ? std::string::npos : what.find(": ", column);
+    if (begin != std::string::npos) what = what.substr(begin + 2);
+    fail_in_text(source, error.byte > 0 ? error.byte - 1 : 0, "not valid JSON: " + what);
+  } catch (const nlohmann::json::out_of_range& error) {
+    const std::string what = error.what();
+    const size_t quote = what.find('\'');
+    const std::string number = quote == std::string::npos ? "" : what.substr(quote + 1, what.rfind('\'') - quote - 1);
+    const size_t byte = source.text.find(number);
+    fail_in_text(source, byte == std::string::npos ? 0 : byte, "a number is too large: " + number.substr(0, 60));
+  }
+}
+
+}  // namespace
+
+Scene parse_scene(const std::string& text, const std::string& file) {
+  const SceneText source{file, text};
+  const nlohmann::json json = parse_json(source);
+  const SceneNode top(source, json, {});
+  top.require_keys(key_names(kSceneKeys));
+  Scene scene;
+  scene.file = file;
+  if (!top.has("size")) top.fail("lacks \"size\": [width, height]");
+  read_size(top.at("size"), scene.width, scene.height);
+  if (top.has("background")) scene.background = read_colour(top.at("background"));
+  if (top.has("frames")) scene.frames = read_frames(top.at("frames"));
+  if (top.has("depth")) {
+    const SceneNode depth = top.at("depth");
+    const std::string name = depth.json().is_string() ? depth.json().get<std::string>() : depth.json().dump();
+    if (name != "8" && name != "16" && name != "float") depth.refuse("8, 16 or \"float\"");
+    scene.depth = parse_depth(name, "");
+  }
+  if (!top.has("layers")) top.fail("lacks \"layers\": [ ... ], from bottom to top");
+  const SceneNode layers = top.at("layers");
+  if (!layers.json().is_array()) layers.refuse("a list [ ... ] of layers, from bottom to top");
+  for (size_t i = 0; i < layers.size(); ++i) scene.layers.push_back(read_layer(layers.at(i), scene));
+  return scene;
+}
+
+Scene read_scene(const std::string& file) {
+  std::error_code error;
+  if (!std::filesystem::exists(file, error)) throw file_error("scene file " + file + " does not exist");
+  if (std::filesystem::is_directory(file, error)) throw file_error("scene file " + file + " is a folder");
+  std::ifstream stream(file, std::ios::binary);
+  std::string text((std::istreambuf_iterator<char>(stream)), std::istreambuf_iterator<char>());
+  if (!stream) throw file_error("scene file " + file + " cannot be read");
+  return parse_scene(text, file);
+}
+
+}  // namespace zr::tool

@@ -1,0 +1,54 @@
+// A scene: what is composited, from bottom to top, and how it changes from frame to frame.
+#pragma once
+
+#include <ZR/zr.h>
+
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "depths.h"
+#include "frame_names.h"
+#include "keyframes.h"
+
+namespace zr::tool {
+
+struct TrackMatte {
+  std::string image;  // path
+  u32 kind = 0;       // ZR_MaskWorld.kind
+  Keyed<Point> position{Point{}};
+};
+
+struct Layer {
+  std::string place;  // "layers[2]", for messages
+  std::string image;  // path; empty for a solid
+  ZR_PixelFloat colour{1, 0, 0, 0};
+  i32 width = 0, height = 0;  // of a solid
+  Keyed<Point> position{Point{}};
+  Keyed<f64> opacity{1.0};
+  i32 mode = 2;
+  bool keep_alpha = false;
+  i32 field = 0;
+  i32 seed = 0;
+  std::optional<TrackMatte> matte;
+};
+
+struct Scene {
+  std::string file;
+  i32 width = 0, height = 0;
+  ZR_PixelFloat background{0, 0, 0, 0};
+  FrameRange frames;
+  i32 depth = 8;  // bits of a channel: 8, 16 or 32
+  std::vector<Layer> layers;
+};
+
+// Reads and checks a scene file; image paths come out relative to the working folder. Throws ToolError
+// naming file, line, column, value and what would be right.
+Scene read_scene(const std::string& file);
+// The same on a text that is at hand; `file` is for messages and for the folder of images.
+Scene parse_scene(const std::string& text, const std::string& file);
+
+// What each key means, its values and its default: the text of `zr help scene`.
+std::string scene_help();
+
+}  // namespace zr::tool

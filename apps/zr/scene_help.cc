@@ -1,0 +1,42 @@
+// The text of `zr help scene`, from the table of keys.
+#include <algorithm>
+
+#include "scene.h"
+#include "scene_keys.h"
+
+namespace zr::tool {
+namespace {
+
+template <class Keys>
+std::string section(const char* title, const Keys& keys) {
+  std::string text = std::string("\n") + title + '\n';
+  for (const SceneKey& key : keys) {
+    std::string line = std::string("  ") + key.name;
+    line.resize(std::max<size_t>(line.size() + 1, 14), ' ');
+    line += key.values;
+    if (*key.standard != '\0') line += std::string(" (default ") + key.standard + ')';
+    text += line + '\n';
+    if (*key.meaning != '\0') text += std::string(14, ' ') + key.meaning + '\n';
+  }
+  return text;
+}
+
+}  // namespace
+
+std::string scene_help() {
+  return std::string(
+             "A scene is a JSON file (UTF-8). Example:\n"
+             "\n"
+             "  { \"size\": [960, 540], \"background\": \"#102030\", \"frames\": [1, 48],\n"
+             "    \"layers\": [\n"
+             "      { \"image\": \"media/street.jpg\" },\n"
+             "      { \"image\": \"media/balloon.png\", \"mode\": \"screen\", \"opacity\": 0.8,\n"
+             "        \"position\": [ { \"frame\": 1, \"value\": [0, 300] },\n"
+             "                      { \"frame\": 48, \"value\": [700, 40] } ] } ] }\n") +
+         section("The scene", kSceneKeys) + section("A layer", kLayerKeys) + section("A matte", kMatteKeys) +
+         section("A keyframe, in a list of rising frames", kKeyframeKeys) +
+         "\nA colour is [red, green, blue], [red, green, blue, alpha], each 0..1, \"#rrggbb\" or \"#rrggbbaa\".\n"
+         "An unknown key is an error.\n";
+}
+
+}  // namespace zr::tool

@@ -1,0 +1,93 @@
+// Fill, clear, copies, depth conversion and premultiply, beside memset and memcpy over the same bytes.
+#include "workloads.h"
+
+namespace bench {
+namespace {
+
+template <class To, class From>
+void add_conversion(Size size, bool dither) {
+  add(std::string(dither ? "convert-dither/" : "convert/") + depth_name<From>() + "-to-" + depth_name<To>(), size,
+      [dither](benchmark::State& state, Size s) {
+        const auto src = make_world<From>(s, Layer::translucent);
+        const auto dst = make_world<To>(s, Layer::opaque);
+        for (auto _ : state)
+          dst->CopyRectPossiblyDifferentBitdepth(src.get(), {0, 0, s.width, s.height}, dither, 0, 0, nullptr);
+        state.SetBytesProcessed(static_cast<i64>(state.iterations()) * s.width * s.height *
+                                static_cast<i64>(sizeof(From) + sizeof(To)));
+      });
+}
+
+const bool registered = [] {
+  for (const Size size : sizes) {
+    each_depth([&]<class T>() {
+      const std::string depth = depth_name<T>();
+      add("memset/" + depth, size, [](benchmark::State& state, Size s) {
+        const auto dst = make_world<T>(s, Layer::opaque);
+        for (auto _ : state) {
+          std::memset(dst->data, 0, static_cast<size_t>(s.width) * static_cast<size_t>(s.height) * sizeof(T));
+          benchmark::ClobberMemory();
+        }
+        count_bytes<T>(state, s, 1);
+      });
+      add("memcpy/" + depth, size, [](benchmark::State& state, Size s) {
+        const auto src = make_world<T>(s, Layer::opaque);
+        const auto dst = make_world<T>(s, Layer::opaque);
+        for (auto _ : state) {
+          std::memcpy(dst->data, src->data, static_cast<size_t>(s.width) * static_cast<size_t>(s.height) * sizeof(T));
+          benchmark::ClobberMemory();
+        }
+        count_bytes<T>(state, s, 2);
+      });
+      add("copy/" + depth, size, [](benchmark::State& state, Size s) {
+        const auto src = make_world<T>(s, Layer::opaque);
+        const auto dst = make_world<T>(s, Layer::opaque);
+        for (auto _ : state) dst->CopyWorld(src.get());
+        count_bytes<T>(state, s, 2);
+      });
+      add("fill/" + depth, size, [](benchmark::State& state, Size s) {
+        const auto dst = make_world<T>(s, Layer::opaque);
+        const ZR_Pixel8 colour{200, 10, 20, 30};
+        for (auto _ : state) ZR_Fill(nullptr, &colour, nullptr, dst.get());
+        count_bytes<T>(state, s, 1);
+      });
+      add("clear/" + depth, size, [](benchmark::State& state, Size s) {
+        const auto dst = make_world<T>(s, Layer::opaque);
+        for (auto _ : state) dst->Clear(nullptr);
+        count_bytes<T>(state, s, 1);
+      });
+      add("premul/" + depth, size, [](benchmark::State& state, Size s) {
+        const auto dst = make_world<T>(s, Layer::translucent);
+        for (auto _ : state) ZR_Premul(nullptr, 1, dst.get());
+        count_bytes<T>(state, s, 2);
+      });
+      add("unmul/" + depth, size, [](benchmark::State& state, Size s) {
+        const auto dst = make_world<T>(s, Layer::translucent);
+        for (auto _ : state) ZR_Premul(nullptr, 0, dst.get());
+        count_bytes<T>(state, s, 2);
+      });
+      add("allocate/" + depth, size, [](benchmark::State& state, Size s) {
+        for (auto _ : state) {
+          ZR_LayerDef layer;
+          if (ZR_NewEffectWorld(nullptr, s.width, s.height, zr::Depth<T>::bits, true, false, &layer) != 0) {
+            state.SkipWithError("no memory");
+            break;
+          }
+          ZR_DisposeEffectWorld(nullptr, &layer);
+        }
+        count_bytes<T>(state, s, 1);
+      });
+    });
+    add_conversion<ZR_Pixel16, ZR_Pixel8>(size, false);
+    add_conversion<ZR_PixelFloat, ZR_Pixel8>(size, false);
+    add_conversion<ZR_PixelFloat, ZR_Pixel16>(size, false);
+    add_conversion<ZR_Pixel8, ZR_Pixel16>(size, false);
+    add_conversion<ZR_Pixel8, ZR_PixelFloat>(size, false);
+    add_conversion<ZR_Pixel16, ZR_PixelFloat>(size, false);
+    add_conversion<ZR_Pixel8, ZR_Pixel16>(size, true);
+    add_conversion<ZR_Pixel8, ZR_PixelFloat>(size, true);
+  }
+  return true;
+}();
+
+}  // namespace
+}  // namespace bench
