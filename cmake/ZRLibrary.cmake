@@ -28,7 +28,10 @@ target_link_libraries(zr_internal INTERFACE zr_objects $<TARGET_OBJECTS:zr_objec
 
 add_library(zr SHARED)
 add_library(zr_static STATIC)
-target_link_options(zr PRIVATE -Wl,--version-script=${PROJECT_SOURCE_DIR}/cmake/zr.map -Wl,--no-undefined)
+target_link_options(zr PRIVATE -Wl,--version-script=${PROJECT_SOURCE_DIR}/cmake/zr.map)
+if(NOT ZR_SANITIZE)  # clang leaves the sanitizer's names to the program
+  target_link_options(zr PRIVATE -Wl,--no-undefined)
+endif()
 set_target_properties(zr PROPERTIES LINK_DEPENDS ${PROJECT_SOURCE_DIR}/cmake/zr.map)
 set_target_properties(zr PROPERTIES VERSION ${PROJECT_VERSION} SOVERSION ${PROJECT_VERSION_MAJOR})
 set_target_properties(zr_static PROPERTIES OUTPUT_NAME zr EXPORT_NAME zr_static)

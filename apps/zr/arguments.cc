@@ -38,7 +38,7 @@ class Parser {
     for (const Command* command : all_commands()) {
       CLI::App* verb = app_.add_subcommand(command->name, command->summary);
       runs_.emplace_back(verb, command->declare(*verb));
-      verb->footer([footer = verb->get_footer()] { return footer + "\n\n" + exit_code_help(); });
+      verb->footer(verb->get_footer() + "\n\n" + exit_code_help());
     }
     CLI::App* help = app_.add_subcommand("help", "Print the help of a command, or of: " + topic_list());
     help->add_option("topic", topic_, "Command or topic")->type_name("NAME");
@@ -55,7 +55,7 @@ class Parser {
     try {
       app_.parse(argc, argv);
     } catch (const CLI::CallForHelp&) {
-      std::fputs(chosen().help().c_str(), stdout);
+      print_help_of(chosen());
       return;
     } catch (const CLI::CallForVersion&) {
       std::puts(kVersion);
@@ -65,7 +65,7 @@ class Parser {
     }
     for (const auto& [verb, run] : runs_)
       if (verb->parsed()) return run();
-    std::fputs(app_.help().c_str(), stdout);
+    print_help_of(app_);
   }
 
  private:
@@ -99,16 +99,22 @@ class Parser {
     throw bad_input(name + text + " (see zr help" + (&verb == &app_ ? "" : ' ' + verb.get_name()) + ')');
   }
 
+  // Not App::help, which would turn to the verb that was parsed: to "help" itself.
+  void print_help_of(const CLI::App& app) const {
+    const std::string name = &app == &app_ ? "zr" : "zr " + app.get_name();
+    std::fputs(app.get_formatter()->make_help(&app, name, CLI::AppFormatMode::Normal).c_str(), stdout);
+  }
+
   void print_help() const {
     if (topic_.empty()) {
-      std::fputs(app_.help().c_str(), stdout);
+      print_help_of(app_);
       return;
     }
     std::vector<std::string> known;
     for (const auto& [verb, run] : runs_) {
       known.push_back(verb->get_name());
       if (topic_ != verb->get_name()) continue;
-      std::fputs(verb->help("zr " + verb->get_name()).c_str(), stdout);
+      print_help_of(*verb);
       return;
     }
     for (const HelpTopic& topic : help_topics()) {

@@ -53,7 +53,7 @@ Run declare(CLI::App& verb) {
   const auto what = std::make_shared<std::string>();
   verb.add_option("what", *what, "What to list")
       ->required()
-      ->check(CLI::IsMember({"modes", "formats", "cpu"}))
+      ->check(CLI::IsMember({"modes", "formats", "cpu"}).description(""))
       ->type_name("modes|formats|cpu");
   verb.footer(
       "Examples:\n"

@@ -154,7 +154,7 @@ Run declare(CLI::App& verb) {
   verb.add_option("--depth", options->depth, "Channels of the composite and of the file (default: the scene's)")
       ->type_name("8|16|float");
   verb.add_option("--exr", options->exr, "Channels of OpenEXR files; half holds up to 65504")
-      ->check(CLI::IsMember({"float", "half"}))
+      ->check(CLI::IsMember({"float", "half"}).description(""))
       ->type_name("float|half")
       ->capture_default_str();
   add_threads(verb, options->threads);
@@ -164,7 +164,7 @@ Run declare(CLI::App& verb) {
   add_force(verb, options->force);
   verb.add_option("--progress", options->progress,
                   "auto: a line with the time left on a terminal; json: one object a frame on stdout")
-      ->check(CLI::IsMember({"auto", "json", "off"}))
+      ->check(CLI::IsMember({"auto", "json", "off"}).description(""))
       ->type_name("auto|json|off")
       ->capture_default_str();
   verb.add_flag("--stats", options->stats, "Print times and memory at the end");

@@ -16,7 +16,7 @@ inline void add_force(CLI::App& verb, bool& force) {
 
 inline void add_threads(CLI::App& verb, int& threads) {
   verb.add_option("--threads", threads, "Threads for row-parallel work; 0 takes the machine's count")
-      ->check(CLI::Range(0, 1024))
+      ->check(CLI::Range(0, 1024).description(""))
       ->type_name("NUMBER 0..1024")
       ->capture_default_str();
 }

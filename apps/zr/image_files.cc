@@ -6,10 +6,12 @@
 #include <algorithm>
 #include <filesystem>
 
+#include "checked_file.h"
 #include "depths.h"
 #include "file_values.h"
 #include "interrupt_state.h"
 #include "nearest_name.h"
+#include "quiet_stderr.h"
 #include "tool_error.h"
 
 namespace zr::tool {
@@ -59,6 +61,7 @@ OpenImage open_image(const std::string& file, const std::string& where) {
   if (std::filesystem::is_directory(file, error)) throw file_error(where + ": " + file + " is a folder");
   OIIO::ImageSpec wish;
   wish.attribute("oiio:UnassociatedAlpha", 1);
+  const QuietStderr quiet;
   OpenImage image;
   image.input = OIIO::ImageInput::open(file, &wish);
   if (!image.input) throw file_error(where + ": " + file + " is no readable image: " + first_line(OIIO::geterror()));
@@ -195,11 +198,13 @@ OwnedWorld load_image(const std::string& file, i32 depth, const std::string& whe
   OpenImage image = open_image(file, where);
   std::vector<char> decoded(decoded_bytes(image));
   const auto stop = [](void*, float) { return interrupted(); };
+  const QuietStderr quiet;
   const bool read = image.input->read_image(0, 0, 0, image.plan.used(), image.type, decoded.data(), OIIO::AutoStride,
                                             OIIO::AutoStride, OIIO::AutoStride, stop);
   const std::string reason = image.input->geterror();
   stop_if_interrupted();
-  if (!read) throw file_error(where + ": " + file + " cannot be read: " + first_line(reason));
+  // A picture that breaks off is read with its rest grey, and told only as a reason.
+  if (!read || !reason.empty()) throw file_error(where + ": " + file + " cannot be read: " + first_line(reason));
   OwnedWorld world(image.width, image.height, depth);
   with_pixel_of(depth, [&]<class Pixel>() {
     if (image.type == OIIO::TypeUInt8)
@@ -213,6 +218,8 @@ OwnedWorld load_image(const std::string& file, i32 depth, const std::string& whe
 }
 
 void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, const std::string& file) {
+  const QuietStderr quiet;
+  CheckedFile checked(file);  // outlives the writer, which may still write when it goes
   const std::unique_ptr<OIIO::ImageOutput> output = OIIO::ImageOutput::create(format.name);
   if (!output) throw file_error("the image library here cannot write " + std::string(format.name));
   OIIO::ImageSpec spec(world.width(), world.height(), 4, half ? OIIO::TypeHalf : file_type(world.depth()));
@@ -221,8 +228,12 @@ void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, 
   spec.attribute("compression", "zip");
   spec.attribute("png:compressionLevel", 4);  // half the time of the usual 6, a twentieth larger
   spec.attribute("Software", "zr");
-  const auto fail = [&] { throw file_error(file + " cannot be written: " + first_line(output->geterror())); };
-  if (!output->open(file, spec)) fail();
+  const auto fail = [&] {
+    const std::string reason = output->geterror();
+    throw file_error(file +
+                     " cannot be written: " + (checked.failure().empty() ? first_line(reason) : checked.failure()));
+  };
+  if (!checked.failure().empty() || !output->set_ioproxy(&checked) || !output->open(file, spec)) fail();
   static constexpr i32 kStrip = 256;  // rows between two looks at the interrupt flag
   with_pixel_of(world.depth(), [&]<class Pixel>() {
     const size_t row_values = static_cast<size_t>(world.width()) * 4;
@@ -237,7 +248,9 @@ void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, 
       if (!output->write_scanlines(top, top + rows, 0, file_type(world.depth()), strip.data())) fail();
     }
   });
-  if (!output->close()) fail();
+  const bool written = output->close();
+  checked.close();
+  if (!written || !checked.failure().empty()) fail();
 }
 
 void set_image_threads(int threads) {

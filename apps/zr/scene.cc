@@ -82,9 +82,11 @@ std::string read_image_path(const SceneNode& node, const std::string& scene_file
 i32 read_mode(const SceneNode& node) {
   const std::string name = node.string("the name of a transfer mode, such as \"screen\"; see zr list modes");
   const std::optional<i32> mode = find_mode(name);
-  if (!mode)
-    node.fail("is an unknown transfer mode " + quoted_list({name.substr(0, 60)}) + "; the nearest are " +
-              quoted_list(suggest_modes(name), " and ") + " (zr list modes shows all)");
+  if (!mode) {
+    const std::vector<std::string> nearest = suggest_modes(name);
+    node.fail("is an unknown transfer mode " + quoted_list({name.substr(0, 60)}) + "; the nearest " +
+              (nearest.size() == 1 ? "is " : "are ") + quoted_list(nearest, " and ") + " (zr list modes shows all)");
+  }
   return *mode;
 }
 

@@ -213,6 +213,13 @@ template <class Pixel>
 constexpr Channel<Pixel> premultiply(Channel<Pixel> c, Channel<Pixel> a) {
   return static_cast<Channel<Pixel>>(Depth<Pixel>::mul(c, a));
 }
+// The same product as Depth::mul, kept to 16 bits, which it never leaves: rows of it vectorise twice as wide.
+template <>
+constexpr u8 premultiply<ZR_Pixel8>(u8 c, u8 a) {
+  const u16 t = static_cast<u16>(c * a);
+  const u16 carry = static_cast<u16>(static_cast<u16>(t + 128) >> 8);
+  return static_cast<u8>(static_cast<u16>(t + carry + 128) >> 8);
+}
 // Colour over alpha: white where c >= a at the integer depths (so everywhere under alpha 0), white
 // under a zero or denormal float alpha.
 template <class Pixel>

@@ -43,8 +43,8 @@ struct ZR_API ZR_World : public ZR_AnyPixelContainer, public ZR_LayerDef {
 
   virtual bool IsReference() const = 0;          // owns no pixels
   virtual void Clear(const GX_LRect* rect) = 0;  // zeroes a rectangle, clipped; null: all.
-  // Clear of full rows in a world without row padding zeroes width * height pixels from row `top` on,
-  // whatever the rectangle's bottom: callers clear whole worlds that way.
+  // Clear of full rows in a world without row padding zeroes every row from `top` on, whatever the
+  // rectangle's bottom: callers clear whole worlds that way.
   virtual void ClearExceptRect(const GX_LRect& rect) = 0;  // zeroes what lies outside; empty: all
   virtual void Fill(const ZR_PixelFloat& colour, const GX_LRect* rect) = 0;
   virtual void Fill(const ZR_Pixel16& colour, const GX_LRect* rect) = 0;

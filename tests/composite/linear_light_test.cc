@@ -30,6 +30,10 @@ void operator delete(void* block) noexcept {
   std::free(block);
 }
 void operator delete(void* block, std::size_t) noexcept { operator delete(block); }
+// Sanitizers bring array forms that do not come by the plain ones.
+void* operator new[](std::size_t bytes) { return operator new(bytes); }
+void operator delete[](void* block) noexcept { operator delete(block); }
+void operator delete[](void* block, std::size_t) noexcept { operator delete(block); }
 
 namespace {
 

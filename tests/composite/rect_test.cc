@@ -14,6 +14,7 @@
 #include "support/born_library.h"
 #include "support/mask_model.h"
 #include "support/worlds.h"
+#include "world/slot_table.h"
 
 namespace {
 
@@ -263,7 +264,8 @@ TYPED_TEST(Rect, RowsGoThroughTheirSlot) {
                                                                 : ZR_Slot_transfer_rowsFloat;
   TestWorld<T> src(3, 3), dst(3, 3);
   const Call call = {{0, 0, 3, 3}, 0, 0};
-  SlotOverride replacement(slot, reinterpret_cast<void*>(+[]() -> i32 { return 123; }));
+  zr::TransferRowsFunc<T>* const refuse = [](auto...) -> i32 { return 123; };
+  SlotOverride replacement(slot, reinterpret_cast<void*>(refuse));
   EXPECT_EQ(call.run(src, dst), 123);
   SlotOverride empty(slot, nullptr);
   EXPECT_EQ(call.run(src, dst), 3);

@@ -70,7 +70,8 @@ class Complaints {
 
 // ---------------------------------------------------------------------------------- random
 
-enum class Range { legal, wild };  // wild: floats below 0, above 1, tiny ones
+// wild: floats below 0, above 1, tiny ones; broken: infinities, NaN and denormals as well
+enum class Range { legal, wild, broken };
 
 class Random {
  public:
@@ -85,7 +86,9 @@ class Random {
     if constexpr (is_float<D>) {
       static constexpr f32 edges[] = {0, 1, 0.5f, 0x1.fffffep-2f, 0x1.000002p-1f, 0x1.fffffep-1f, 0.25f, 0.75f};
       static constexpr f32 wild[] = {-0.0f, -0.3f, 1.5f, 0x1.000002p+0f, 2, -4, 1e-12f, 60000, 1e-6f};
-      if (range == Range::wild && one_in(3)) return wild[word() % std::size(wild)];
+      static constexpr f32 broken[] = {INFINITY, -INFINITY, NAN, 1e-40f, -1e-42f, 3e38f};
+      if (range == Range::broken && one_in(8)) return broken[word() % std::size(broken)];
+      if (range != Range::legal && one_in(3)) return wild[word() % std::size(wild)];
       if (one_in(3)) return edges[word() % std::size(edges)];
       return static_cast<f32>(word() >> 8) * 0x1p-24f;
     } else {
@@ -169,9 +172,16 @@ struct ToldProgress {
   }
 };
 
-inline const ZR_LinearBlendingTables& test_tables() {
-  static const ZR_LinearBlendingTables tables = gamma_tables(2.2);
-  return tables;
+// Tables of a bright and a dark curve, and one of no curve at all, in which every neighbour differs.
+inline const ZR_LinearBlendingTables* test_tables(u32 which) {
+  static const std::array<ZR_LinearBlendingTables, 3> tables = [] {
+    std::array<ZR_LinearBlendingTables, 3> made{gamma_tables(2.2), gamma_tables(0.45), gamma_tables(1.8)};
+    Random random(7);
+    for (u16& v : made[2].to_linear) v = random.channel<Sixteen>();
+    for (u16& v : made[2].from_linear) v = random.channel<Sixteen>();
+    return made;
+  }();
+  return &tables[which % tables.size()];
 }
 
 }  // namespace model

@@ -35,13 +35,14 @@ inline constexpr ModeEntry modes[] = {  // from -3 on
 // clang-format on
 inline Kind kind_of(i32 mode) { return mode >= copy_fast && mode <= key_protect ? modes[mode + 3].kind : Kind::none; }
 
+// Equal values and NaN give the second.
 template <class V>
 V least(V a, V b) {
-  return b < a ? b : a;
+  return a < b ? a : b;
 }
 template <class V>
 V most(V a, V b) {
-  return a < b ? b : a;
+  return a > b ? a : b;
 }
 template <class D>
 typename D::V combined_alpha(typename D::V a, typename D::V d) {
@@ -131,7 +132,7 @@ typename D::V weighted(i32 mode, typename D::V s, typename D::V d) {
     case color_dodge_w: return d == 0 ? 0 : is_float<D> && D::inv(s) == 0 ? W : full_at<D>(d, D::inv(s));
     case color_burn_w: return s == 0 && d == W ? W : D::inv(d) >= s ? 0 : D::inv(D::div(D::inv(d), s));
     case linear_dodge: return is_float<D> ? s + d : least<V>(s + d, W);
-    case linear_burn: return most<V>(s + d - W, 0);
+    case linear_burn: return s + d - W < 0 ? 0 : s + d - W;
     case linear_light:
       if constexpr (is_float<D>)
         return 2 * s - 1 + d;

@@ -61,7 +61,7 @@ Px<D> mix_straight(const Px<D>& p, const Px<D>& q, i32 ratio) {
   Px<D> out{};
   if constexpr (is_float<D>) {
     const i32 i1 = truncate(p.a * static_cast<f32>(0x10000 - ratio)), i2 = truncate(q.a * static_cast<f32>(ratio));
-    const f32 t = static_cast<f32>(i1 + i2);
+    const f32 t = static_cast<f32>(static_cast<i32>(static_cast<u32>(i1) + static_cast<u32>(i2)));
     for (int c = 0; c < 3; ++c)
       out.c[c] = i1 == 0   ? q.c[c]
                  : i2 == 0 ? p.c[c]

@@ -88,7 +88,8 @@ void blends(u32 seed, Range range) {
   }
 }
 TEST(ModelBlend, AllDepths) {
-  blends<Eight>(71, Range::legal), blends<Sixteen>(72, Range::legal), blends<Float>(73, Range::legal);
+  blends<Eight>(71, Range::legal), blends<Sixteen>(72, Range::legal), blends<Float>(73, Range::legal),
+      blends<Float>(75, Range::wild), blends<Float>(76, Range::broken);
 }
 
 TEST(ModelBlend, DifferentSizesAreRefused) {
@@ -149,7 +150,8 @@ void premultiplications(u32 seed, Range range) {
 TEST(ModelPremultiply, Eight) { premultiplications<Eight>(81, Range::legal); }
 TEST(ModelPremultiply, Sixteen) { premultiplications<Sixteen>(82, Range::legal); }
 TEST(ModelPremultiply, Float) {
-  premultiplications<Float>(83, Range::legal), premultiplications<Float>(84, Range::wild);
+  premultiplications<Float>(83, Range::legal), premultiplications<Float>(84, Range::wild),
+      premultiplications<Float>(86, Range::broken);
 }
 
 // The abort function is asked before anything is written.

@@ -70,13 +70,13 @@ TYPED_TEST(Fills, MembersTakeARectangleAsItIs) {
   this->check([&](TestWorld<T>&, ZR_World* world) { world->Clear(nullptr); }, all(zero), {});
 }
 
-TYPED_TEST(Fills, ClearingFullRowsWithoutPaddingReachesAWorldsLengthFromItsTop) {
+TYPED_TEST(Fills, ClearingFullRowsWithoutPaddingReachesTheWorldsEnd) {
   using T = TypeParam;
   std::vector<T> pixels(5 * 8, T{1, 1, 1, 1});
   ZR_WorldX<T> world(pixels.data(), 5, 4, static_cast<i32>(5 * sizeof(T)));
   const GX_LRect lower = {0, 2, 5, 3};
   world.Clear(&lower);
-  for (i32 i = 0; i < 40; ++i) EXPECT_EQ(pixels[static_cast<size_t>(i)].alpha, i >= 10 && i < 30 ? 0 : 1) << i;
+  for (i32 i = 0; i < 40; ++i) EXPECT_EQ(pixels[static_cast<size_t>(i)].alpha, i >= 10 && i < 20 ? 0 : 1) << i;
 }
 
 TYPED_TEST(Fills, AlphaIsFilledAndInvertedAlone) {

@@ -159,7 +159,7 @@ struct AlphaAdd : Mode<XferAlphaAdd, ModeKind::special, RowClass::self_contained
 struct BlueThreshold : Mode<XferBlueThreshold, ModeKind::special> {
   template <class T>
   static void pixel(const T& s, Wide<T> A, T& d) {
-    if (A < ModeMath<T>::half) return;
+    if (!(A >= ModeMath<T>::half)) return;  // NaN too
     d.blue = s.blue;
     d.alpha = store<T>(ModeMath<T>::white);
   }

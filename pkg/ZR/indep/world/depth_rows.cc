@@ -4,18 +4,15 @@
 #include <ZR/depth.h>
 #include <ZR/platform.h>
 
-#include <algorithm>
 #include <cstdint>
 #include <type_traits>
-#include <utility>
 
 #include "world/dither_state.h"
 
 namespace zr {
 namespace {
 
-constexpr i32 block_pixels = 16;  // pixels that are converted together
-constexpr i32 block_channels = 4 * block_pixels;
+constexpr i32 block_channels = 256;  // dither words drawn together
 
 // Runs rule(channel value, index of the channel in its pixel) over n pixels.
 template <class To, class From, class Rule>
@@ -28,23 +25,41 @@ void each_channel(i32 n, const From* src, To* dst, Rule rule) {
   for (i32 k = 0; k < 4 * left; ++k) out[k] = rule(in[k], k);
 }
 
-// The same with a dither word for every channel, in the order in which the words are drawn.
-template <class To, class From, class Rule>
-void each_channel_with_words(i32 n, const From* src, To* dst, Rule rule) {
-  DitherRow dither;
+// The same with something drawn for every channel: draw(count, drawn) fills a block, or less at the end.
+template <class Drawn, class To, class From, class Draw, class Rule>
+void each_channel_with_drawn(i32 n, const From* src, To* dst, Draw draw, Rule rule) {
   const auto* __restrict in = reinterpret_cast<const Channel<From>*>(src);
   auto* __restrict out = reinterpret_cast<Channel<To>*>(dst);
-  for (i32 left = n; left > 0; left -= block_pixels, in += block_channels, out += block_channels) {
-    const i32 channels = 4 * std::min(left, block_pixels);
-    u32 words[block_channels];
-    dither.draw(static_cast<std::size_t>(channels), words);
-    if constexpr (std::is_same_v<From, ZR_PixelFloat>)  // drawn for alpha, red, blue, green
-      for (i32 k = 0; k < channels; k += 4) std::swap(words[k + 2], words[k + 3]);
-    if (channels == block_channels)
-      for (i32 k = 0; k < block_channels; ++k) out[k] = rule(in[k], words[k]);
-    else
-      for (i32 k = 0; k < channels; ++k) out[k] = rule(in[k], words[k]);
+  Drawn drawn[block_channels];
+  i32 left = 4 * n;
+  for (; left >= block_channels; left -= block_channels, in += block_channels, out += block_channels) {
+    draw(block_channels, drawn);
+    for (i32 k = 0; k < block_channels; ++k) out[k] = rule(in[k], drawn[k]);
   }
+  draw(left, drawn);
+  for (i32 k = 0; k < left; ++k) out[k] = rule(in[k], drawn[k]);
+}
+
+void narrow_16_dithered(i32 n, const ZR_Pixel16* src, ZR_Pixel8* dst) {
+  DitherRow dither;
+  const auto draw = [&](i32 count, u32* words) { dither.draw(static_cast<std::size_t>(count), words); };
+  each_channel_with_drawn<u32>(n, src, dst, draw, [](u16 v, u32 word) { return narrow_16_to_8_dither(v, word); });
+}
+
+template <class Rule>
+void narrow_float_dithered(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst, Rule rule) {
+  DitherRow dither;
+  const auto draw = [&](i32 count, f32* offsets) {
+    u32 words[block_channels];
+    dither.draw(static_cast<std::size_t>(count), words);
+    for (i32 k = 0; k < count; k += 4) {  // drawn for alpha, red, blue, green
+      offsets[k] = dither_offset(words[k]);
+      offsets[k + 1] = dither_offset(words[k + 1]);
+      offsets[k + 2] = dither_offset(words[k + 3]);
+      offsets[k + 3] = dither_offset(words[k + 2]);
+    }
+  };
+  each_channel_with_drawn<f32>(n, src, dst, draw, [rule](f32 c, f32 offset) { return rule(c + offset); });
 }
 
 template <class To>
@@ -75,7 +90,7 @@ void convert_row(i32 n, const From* src, To* dst, bool dither) {
     each_channel(n, src, dst, [](u8 v, i32) { return widen_8_to_float(v); });
   } else if constexpr (from16 && to8) {
     if (dither)
-      each_channel_with_words(n, src, dst, [](u16 v, u32 word) { return narrow_16_to_8_dither(v, word); });
+      narrow_16_dithered(n, src, dst);
     else
       each_channel(n, src, dst, [](u16 v, i32) { return narrow_16_to_8(v); });
   } else if constexpr (from16) {
@@ -84,11 +99,9 @@ void convert_row(i32 n, const From* src, To* dst, bool dither) {
     narrow_scalar(n, src, dst);
   } else if (dither) {
     if (takes_vector_rule(src))
-      each_channel_with_words(n, src, dst,
-                              [](f32 c, u32 word) { return narrow_float_to_8_nearest(c + dither_offset(word)); });
+      narrow_float_dithered(n, src, dst, [](f32 c) { return narrow_float_to_8_nearest(c); });
     else  // with dither the scalar rule clamps alpha too
-      each_channel_with_words(n, src, dst,
-                              [](f32 c, u32 word) { return narrow_float_colour<To>(c + dither_offset(word)); });
+      narrow_float_dithered(n, src, dst, [](f32 c) { return narrow_float_colour<To>(c); });
   } else if (takes_vector_rule(src)) {
     each_channel(n, src, dst, [](f32 c, i32) { return narrow_float_to_8_nearest(c); });
   } else {

@@ -16,7 +16,7 @@ void fill_row(T* row, std::ptrdiff_t n, const T& pixel) {
   for (T& each : pattern) each = pixel;
   std::ptrdiff_t i = 0;
   for (; i <= n - block; i += block) std::memcpy(row + i, pattern, sizeof pattern);
-  for (; i < n; ++i) row[i] = pixel;
+  if (n > i) std::memcpy(row + i, pattern, static_cast<std::size_t>(n - i) * sizeof(T));
 }
 
 template <class T>

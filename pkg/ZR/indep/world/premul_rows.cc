@@ -3,6 +3,7 @@
 
 #include <ZR/depth.h>
 
+#include <bit>
 #include <cstring>
 #include <type_traits>
 
@@ -35,15 +36,39 @@ i32 in_blocks(i32 n, const T* src, T* dst, Block block) {
   return 0;
 }
 
-// Every channel of a block by rule(channel, alpha of its pixel), in one flat loop; alpha itself is put back.
-template <class T, class Rule>
+// What the channels of a block are multiplied or divided by: white for alpha, else the pixel's alpha. Worked
+// out in 32-bit words, of which alpha is the low part of a pixel's first.
+template <class T>
+void spread_alpha(const T* in, Channel<T>* factor) {
+  constexpr u32 white = static_cast<u32>(Depth<T>::white);
+  constexpr i32 words = sizeof(T) / sizeof(u32);
+  u32 pixel[block_pixels * words], spread[block_pixels * words];
+  std::memcpy(pixel, in, sizeof pixel);
+  for (i32 i = 0; i < block_pixels; ++i) {
+    if constexpr (words == 1) {
+      const u32 alpha = pixel[i] & 0xffu;
+      spread[i] = white | alpha << 8 | alpha << 16 | alpha << 24;
+    } else {
+      const u32 alpha = pixel[2 * i] & 0xffffu;
+      spread[2 * i] = white | alpha << 16;
+      spread[2 * i + 1] = alpha | alpha << 16;
+    }
+  }
+  std::memcpy(factor, spread, sizeof spread);
+}
+static_assert(std::endian::native == std::endian::little);
+
+// Every channel of a block of an integer depth by rule(channel, factor), in one flat loop. Alpha over white
+// is alpha again, except for an illegal one: `keep_alpha` puts that back.
+template <class T, bool keep_alpha, class Rule>
 void by_channel(const T* in, T* out, Rule rule) {
   constexpr i32 channels = 4 * block_pixels;
-  Channel<T> value[channels], alpha[channels];
-  for (i32 k = 0; k < channels; k += 4) alpha[k] = alpha[k + 1] = alpha[k + 2] = alpha[k + 3] = in[k / 4].alpha;
+  Channel<T> value[channels], factor[channels];
+  spread_alpha(in, factor);
   std::memcpy(value, in, sizeof value);
-  for (i32 k = 0; k < channels; ++k) value[k] = rule(value[k], alpha[k]);
-  for (i32 k = 0; k < channels; k += 4) value[k] = alpha[k];
+  for (i32 k = 0; k < channels; ++k) value[k] = rule(value[k], factor[k]);
+  if constexpr (keep_alpha)
+    for (i32 k = 0; k < channels; k += 4) value[k] = in[k / 4].alpha;
   std::memcpy(out, value, sizeof value);
 }
 
@@ -63,7 +88,7 @@ i32 premul_row(i32 n, const T* src, T* dst) {
     if constexpr (std::is_same_v<T, ZR_PixelFloat>)
       by_pixel(in, out, premultiply<T>);
     else
-      by_channel(in, out, premultiply<T>);
+      by_channel<T, false>(in, out, premultiply<T>);
   });
 }
 
@@ -71,7 +96,7 @@ template <class T>
 i32 unmul_row(i32 n, const T* src, T* dst) {
   return in_blocks(n, src, dst, [](const T* in, T* out) {
     if constexpr (std::is_same_v<T, ZR_Pixel16>)
-      by_channel(in, out, unmultiply<T>);
+      by_channel<T, true>(in, out, unmultiply<T>);
     else
       by_pixel(in, out, unmultiply<T>);
   });

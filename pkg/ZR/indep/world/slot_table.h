@@ -34,7 +34,7 @@ using IterateLutFunc = i32(ZR_InData*, i32 progress_base, i32 progress_final, ZR
 using IterateGenericFunc = i32(i32 iterations, void* refcon, ZR_GenericFunc);
 using PremulRectFunc = i32(const ZR_ProgressInfo*, i32 forward, const GX_LRect*, ZR_LayerDef*);
 using OpenDestinationFunc = i32(void* first, void* record);  // a record of 32 bytes
-using ModuleOwnFunc = i32(void*, void*);  // called by nobody here
+using ModuleOwnFunc = i32(void*, void*);                     // called by nobody here
 template <class T>
 using RowFunc = i32(i32 n, const T* src, T* dst);
 template <class T>

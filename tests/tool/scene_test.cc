@@ -1,0 +1,144 @@
+// Scene files: what is read, and what is said about mistakes.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "scene.h"
+#include "tool_error.h"
+
+namespace zr::tool {
+namespace {
+
+using testing::HasSubstr;
+
+TEST(Scene, IsReadWhole) {
+  const Scene scene = parse_scene(R"({
+    "size": [960, 540], "background": [0.25, 0.5, 1, 0.5], "frames": "3-9", "depth": "float",
+    "layers": [
+      { "name": "solid", "colour": "#ff800080", "size": [20, 10], "mode": "Screen", "keep_alpha": true,
+        "field": "odd", "seed": -7 },
+      { "image": "media/a.png", "opacity": 0.25,
+        "position": [ { "frame": 2, "value": [0, -1.5] }, { "frame": 4, "value": [10, 0] } ],
+        "matte": { "image": "/b.png", "kind": "inverted-luma", "position": [3, 4] } } ] })",
+                                  "folder/scene.json");
+  EXPECT_EQ(scene.width, 960);
+  EXPECT_EQ(scene.height, 540);
+  EXPECT_EQ(scene.background.alpha, 0.5f);
+  EXPECT_EQ(scene.background.red, 0.25f);
+  EXPECT_EQ(scene.background.blue, 1.0f);
+  EXPECT_EQ(scene.frames.first, 3);
+  EXPECT_EQ(scene.frames.last, 9);
+  EXPECT_EQ(scene.depth, 32);
+  ASSERT_EQ(scene.layers.size(), 2u);
+  const Layer &solid = scene.layers[0], &image = scene.layers[1];
+  EXPECT_EQ(solid.image, "");
+  EXPECT_EQ(solid.colour.red, 1.0f);
+  EXPECT_FLOAT_EQ(solid.colour.alpha, 128.0f / 255.0f);
+  EXPECT_EQ(solid.width, 20);
+  EXPECT_EQ(solid.mode, 6);
+  EXPECT_TRUE(solid.keep_alpha);
+  EXPECT_EQ(solid.field, 2);
+  EXPECT_EQ(solid.seed, -7);
+  EXPECT_EQ(image.image, "folder/media/a.png") << "relative to the scene";
+  EXPECT_EQ(image.opacity.at(1), 0.25);
+  EXPECT_EQ(image.position.at(3).x, 5.0);
+  EXPECT_EQ(image.position.at(3).y, -0.75);
+  ASSERT_TRUE(image.matte.has_value());
+  EXPECT_EQ(image.matte->image, "/b.png");
+  EXPECT_EQ(image.matte->kind, 3u);
+  EXPECT_EQ(image.matte->position.at(1).y, 4.0);
+}
+
+TEST(Scene, HasDefaults) {
+  const Scene scene = parse_scene(R"({"size":[8,4],"layers":[{"colour":[1,1,1]}]})", "s.json");
+  EXPECT_EQ(scene.depth, 8);
+  EXPECT_EQ(scene.frames.count(), 1);
+  EXPECT_EQ(scene.background.alpha, 0.0f);
+  const Layer& solid = scene.layers.at(0);
+  EXPECT_EQ(solid.mode, 2);
+  EXPECT_EQ(solid.width, 8);
+  EXPECT_EQ(solid.height, 4);
+  EXPECT_EQ(solid.opacity.at(5), 1.0);
+  EXPECT_EQ(solid.colour.alpha, 1.0f);
+}
+
+struct Mistake {
+  const char* text;
+  const char* message;  // a part of it, with line and column where the text has them
+};
+class SceneMistake : public testing::TestWithParam<Mistake> {};
+TEST_P(SceneMistake, IsToldWithItsPlace) {
+  try {
+    parse_scene(GetParam().text, "s.json");
+    FAIL() << "accepted: " << GetParam().text;
+  } catch (const ToolError& error) {
+    EXPECT_EQ(error.code(), kExitBadInput);
+    EXPECT_THAT(error.what(), HasSubstr(GetParam().message));
+    EXPECT_THAT(error.what(), testing::Not(HasSubstr("\n")));
+  }
+}
+#define LAYER(text) "{\"size\":[8,8],\n \"layers\":[ {" text "} ]}"
+INSTANTIATE_TEST_SUITE_P(
+    ByHand, SceneMistake,
+    testing::Values(
+        Mistake{"", "s.json:1:1: not valid JSON"}, Mistake{"{\n\"size\": [1,\n  oops] }", "s.json:3:3: not valid JSON"},
+        Mistake{"{\"size\":[8,8],\"layers\":[],}", "s.json:1:27: not valid JSON"},
+        Mistake{"{\"size\":[8,8],\"layers\":[]", "not valid JSON"},
+        Mistake{"[]", "s.json:1:1: the scene is a list of 0"},
+        Mistake{"{\n \"size\":[1e999,8]}", "s.json:2:10: a number is too large"},
+        Mistake{"{\"layers\":[]}", "the scene lacks \"size\""},
+        Mistake{"{\"size\":[8,8]}", "the scene lacks \"layers\""},
+        Mistake{"{\"size\":[8,8],\"size\":[8,8],\"layers\":[]}", "\"size\" stands twice"},
+        Mistake{"{\"size\":[0,8],\"layers\":[]}", "s.json:1:10: size[0] is 0; it must be a whole number 1 to 30000"},
+        Mistake{"{\"size\":[8,30001],\"layers\":[]}", "s.json:1:12: size[1] is 30001"},
+        Mistake{"{\"size\":[8,-5],\"layers\":[]}", "size[1] is -5"},
+        Mistake{"{\"size\":8,\"layers\":[]}", "s.json:1:9: size is 8"},
+        Mistake{"{\"size\":[8,1e300],\"layers\":[]}", "size[1] is 1e+300"},
+        Mistake{"{\"size\":[8,8],\"layers\":{}}", "layers is an object"},
+        Mistake{"{\"size\":[8,8],\"layers\":[],\"frames\":[5,2]}", "frames runs backwards"},
+        Mistake{"{\"size\":[8,8],\"layers\":[],\"frames\":\"5-2\"}",
+                "s.json:1:36: frames is \"5-2\", which runs backwards"},
+        Mistake{"{\"size\":[8,8],\"layers\":[],\"depth\":12}", "depth is 12; it must be 8, 16 or \"float\""},
+        Mistake{"{\"size\":[8,8],\"layers\":[],\"depht\":8}",
+                "s.json:1:27: the scene has an unknown key \"depht\"; the nearest is \"depth\""},
+        Mistake{LAYER(""), "layers[0] must have either"},
+        Mistake{LAYER("\"colour\":[1,1,1],\"image\":\"a.png\""), "layers[0] must have either"},
+        Mistake{LAYER("\"image\":\"a.png\",\"size\":[1,1]"), "layers[0].size is for solids"},
+        Mistake{LAYER("\"image\":5"), "s.json:2:22: layers[0].image is 5"},
+        Mistake{LAYER("\"image\":\"\""), "the name of an image file"},
+        Mistake{LAYER("\"colour\":\"#12345\""), "layers[0].colour is \"#12345\""},
+        Mistake{LAYER("\"colour\":[0,2,0]"), "layers[0].colour[1] is 2; it must be a number 0 to 1"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"opacity\": 1.5"),
+                "s.json:2:45: layers[0].opacity is 1.5; it must be a number 0 to 1"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"opacity\": -0.1"), "layers[0].opacity is -0.1"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"opacity\": \"1\""), "layers[0].opacity is \"1\""},
+        Mistake{LAYER("\"colour\":\"#000000\", \"opacity\": []"), "layers[0].opacity is a list of 0"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"opacity\": [{\"frame\":1,\"value\":2}]"),
+                "layers[0].opacity[0].value is 2"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"opacity\": [{\"frame\":1}]"), "layers[0].opacity[0] lacks \"value\""},
+        Mistake{LAYER("\"colour\":\"#000000\", \"opacity\": [{\"frame\":5,\"value\":0},{\"frame\":5,\"value\":1}]"),
+                "layers[0].opacity[1].frame is 5; it must be above the frame before it, 5"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"position\": [1,2,3]"), "layers[0].position is a list of 3"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"position\": [1,1e9]"), "layers[0].position[1] is 1000000000"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"mode\": \"sceen\""),
+                "unknown transfer mode \"sceen\"; the nearest is \"screen\""},
+        Mistake{LAYER("\"colour\":\"#000000\", \"mode\": 6"), "layers[0].mode is 6"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"keep_alpha\": 1"),
+                "layers[0].keep_alpha is 1; it must be true or false"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"field\": \"upper\""), "must be \"all\", \"even\" or \"odd\""},
+        Mistake{LAYER("\"colour\":\"#000000\", \"seed\": 2147483648"), "layers[0].seed is 2147483648"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"matte\": {}"), "layers[0].matte lacks \"image\""},
+        Mistake{LAYER("\"colour\":\"#000000\", \"matte\": {\"image\":\"a\",\"kind\":\"lumma\"}"),
+                "layers[0].matte.kind is \"lumma\""},
+        // Places count characters, not bytes, and texts that hold quotes and brackets do not lead astray.
+        Mistake{LAYER("\"name\":\"\xC3\xA4\xC3\xB6 ]}\\\"{\", \"colour\":\"#000000\", \"seed\": 0.5"),
+                "s.json:2:61: layers[0].seed is 0.5"}));
+#undef LAYER
+
+TEST(SceneHelp, NamesEveryKeyThatIsAccepted) {
+  const std::string help = scene_help();
+  for (const char* key : {"background", "keep_alpha", "position", "opacity", "field", "seed", "matte", "kind"})
+    EXPECT_THAT(help, HasSubstr(key));
+}
+
+}  // namespace
+}  // namespace zr::tool
