@@ -12,26 +12,52 @@ struct DisplayOptions : PictureOptions {
   std::string profile, working = "srgb", simulate;
 };
 
+TON_PRISMA_Transform display_transform(const Profile& space, const Profile& screen) {
+  return with_engine("display",
+                     [&] { return ZR_NewDisplayTransform(*space, *screen, nullptr, nullptr, false, false); });
+}
+
+// Ink goes through in one piece. Of an RGB device the values must be had in between: what it cannot show is
+// cut off there, which a transform in one piece would carry through.
+void simulate(OwnedWorld& world, const Profile& space, const Profile& device, const Profile& screen,
+              const std::string& name) {
+  const bool ink = with_engine("display", [&] { return device->GetColourSpace(); }) == PRISMA_Word("CMYK");
+  const std::string useless = "display: --simulate: " + name +
+                              " cannot be simulated; it tells what the device's values look like, but not how "
+                              "colours are put into them";
+  try {
+    const TON_PRISMA_Transform transform =
+        ink ? ZR_NewDisplayTransform(*space, *screen, device.get(), device.get(), true, false)
+            : TON_PRISMA_Transform(*space, *device, PRISMA_Intent_RelativeColorimetric, TON_GetFastPRISMAOptions());
+    // The engine may find out only with the first pixel.
+    ZR_PixelFloat pixel{1, 0, 0, 0};
+    TON_PRISMA_ETX(
+        TON_PRISMA_Apply(transform.Get(), PRISMA_Layout_RGBFloat, &pixel, PRISMA_Layout_RGBFloat, &pixel, 1, nullptr));
+    convert_world(world, transform, "display");
+  } catch (const i32 status) {
+    if (status == PRISMA_Err_BadProfile) throw file_error(useless);
+    check(status, "display");
+  }
+  if (!ink) convert_world(world, display_transform(device, screen), "display");
+}
+
 void show(const DisplayOptions& options) {
   const SpaceChoice monitor = parse_space(options.profile, "display: --profile");
   const SpaceChoice working = parse_space(options.working, "display: --working");
   SpaceChoice simulated;
   if (!options.simulate.empty()) simulated = parse_space(options.simulate, "display: --simulate");
-  turn_picture(
-      options, "display", {monitor.file, working.file, simulated.file}, [&](Picture picture, i32 depth) -> Finished {
-        const Profile screen = load_space(monitor, Device::kRgb, "display: --profile");
-        const Profile space = load_space(working, Device::kRgb, "display: --working");
-        const Profile device =
-            options.simulate.empty() ? Profile() : load_space(simulated, Device::kRgbOrInk, "display: --simulate");
-        OwnedWorld world = world_in_space(std::move(picture), {}, space, depth, PRISMA_Intent_RelativeColorimetric,
-                                          options.input, "display");
-        // What the device makes of the picture is taken for its own output.
-        const TON_PRISMA_Transform transform = with_engine("display", [&] {
-          return ZR_NewDisplayTransform(*space, *screen, device.get(), device.get(), true, false);
-        });
-        convert_world(world, transform, "display");
-        return {std::move(world), icc_data(*screen)};
-      });
+  const auto work = [&](Picture picture, i32 depth) -> Finished {
+    const Profile screen = load_space(monitor, Device::kRgb, "display: --profile");
+    const Profile space = load_space(working, Device::kRgb, "display: --working");
+    OwnedWorld world = world_in_space(std::move(picture), {}, space, depth, PRISMA_Intent_RelativeColorimetric,
+                                      options.input, "display");
+    if (options.simulate.empty())
+      convert_world(world, display_transform(space, screen), "display");
+    else
+      simulate(world, space, load_space(simulated, Device::kRgbOrInk, "display: --simulate"), screen, options.simulate);
+    return {std::move(world), icc_data(*screen)};
+  };
+  turn_picture(options, "display", {monitor.file, working.file, simulated.file}, work);
 }
 
 Run declare(CLI::App& verb) {

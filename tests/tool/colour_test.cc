@@ -102,6 +102,8 @@ TEST_F(Colour, MistakesAreOneLine) {
       {"convert grey.png -o o.png --to srgb", 3, "carries a grey profile"},
       {"convert red.png -o o.png --to srgb --from " + icc("CGATS001Compat-v2-micro"), 2, "is not CMYK"},
       {"display red.png -o o.png --profile bad.icc", 3, "no usable ICC profile"},
+      {"display red.png -o o.png --profile srgb --simulate " + icc("CGATS001Compat-v2-micro"), 3,
+       "cannot be simulated"},
       {"info bad.icc", 3, "bad.icc is no readable image"},
   };
   for (const auto& one : cases) {
@@ -112,12 +114,38 @@ TEST_F(Colour, MistakesAreOneLine) {
   }
 }
 
-TEST_F(Colour, DisplaySimulatesInk) {
-  picture("green.png", {0, 255, 0});
-  ASSERT_EQ(run("display green.png -o plain.png --profile srgb"), 0) << err;
-  ASSERT_EQ(run("display green.png -o ink.png --profile srgb --simulate " + icc("CGATS001Compat-v2-micro")), 0) << err;
-  EXPECT_NEAR(pixel("plain.png")[1], 255, 1);
-  EXPECT_LT(pixel("ink.png")[1], 220) << "no press prints that green";
+TEST_F(Colour, DisplayCutsOffWhatTheSimulatedDeviceCannotShow) {
+  picture("green.png", {0, 255, 0}, slurp(icc("DisplayP3-v4")));
+  const std::string line = "display green.png --profile display-p3 --working display-p3 -o ";
+  ASSERT_EQ(run(line + "plain.png"), 0) << err;
+  EXPECT_NEAR(pixel("plain.png")[0], 0, 1);
+  for (const std::string depth : {"8", "float"}) {
+    const std::string name = depth + ".tif";
+    ASSERT_EQ(run(line + name + " --simulate srgb --depth " + depth), 0) << err;
+    const std::array<int, 3> got = pixel(name);  // sRGB's green: 0.4584, 0.9852, 0.2983
+    EXPECT_NEAR(got[0], 117, 1);
+    EXPECT_NEAR(got[1], 251, 1);
+    EXPECT_NEAR(got[2], 76, 1);
+  }
+}
+
+TEST_F(Colour, InkComesInThroughItsProfile) {
+  const std::string profile = slurp(icc("CGATS001Compat-v2-micro"));
+  OIIO::ImageSpec spec(1, 1, 4, OIIO::TypeUInt8);
+  spec.channelnames = {"C", "M", "Y", "K"};
+  spec.alpha_channel = -1;
+  spec.attribute("oiio:ColorSpace", "CMYK");
+  spec.attribute("tiff:ColorSpace", "CMYK");
+  spec.attribute("ICCProfile", OIIO::TypeDesc(OIIO::TypeDesc::UINT8, static_cast<int>(profile.size())), profile.data());
+  const u8 cyan[4] = {255, 0, 0, 0};
+  const auto output = OIIO::ImageOutput::create(folder / "ink.tif");
+  ASSERT_TRUE(output->open(folder / "ink.tif", spec) && output->write_image(OIIO::TypeUInt8, cyan) && output->close());
+  folder.write("s.json", R"({"size":[1,1],"working_space":"srgb","layers":[{"image":"ink.tif"}]})");
+  ASSERT_EQ(run("render s.json -o s.png"), 0) << err;
+  const std::array<int, 3> got = pixel("s.png");  // printed cyan, not the 0, 255, 255 of a screen
+  EXPECT_LT(got[0], 20);
+  EXPECT_NEAR(got[1], 174, 3);
+  EXPECT_NEAR(got[2], 239, 3);
 }
 
 }  // namespace
