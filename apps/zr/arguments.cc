@@ -12,7 +12,8 @@
 namespace zr::tool {
 namespace {
 
-constexpr const Command* kCommands[] = {&kRenderCommand, &kGalleryCommand, &kListCommand};
+constexpr const Command* kCommands[] = {&kRenderCommand, &kConvertCommand, &kDisplayCommand,
+                                        &kInfoCommand,   &kGalleryCommand, &kListCommand};
 constexpr const char* kVersion = "zr " ZR_TOOL_VERSION;
 
 std::string exit_code_help() {

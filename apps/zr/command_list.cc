@@ -7,6 +7,7 @@
 #include <memory>
 
 #include "commands.h"
+#include "colour_space.h"
 #include "depths.h"
 #include "image_files.h"
 #include "mode_names.h"
@@ -35,6 +36,10 @@ void list_formats() {
   std::printf("\nread:%s\n", read.c_str());
 }
 
+void list_spaces() {
+  for (const SpaceName& space : all_spaces()) std::puts(space.name);
+}
+
 void list_cpu() {
   struct Word {
     int index;
@@ -53,18 +58,21 @@ Run declare(CLI::App& verb) {
   const auto what = std::make_shared<std::string>();
   verb.add_option("what", *what, "What to list")
       ->required()
-      ->check(CLI::IsMember({"modes", "formats", "cpu"}).description(""))
-      ->type_name("modes|formats|cpu");
+      ->check(CLI::IsMember({"modes", "formats", "spaces", "cpu"}).description(""))
+      ->type_name("modes|formats|spaces|cpu");
   verb.footer(
       "Examples:\n"
       "  zr list modes      transfer modes by number and name, as scenes use them\n"
       "  zr list formats    picture files that are written and read\n"
+      "  zr list spaces     colour spaces by name\n"
       "  zr list cpu        what the processor has and what the library sees");
   return [what] {
     if (*what == "modes")
       list_modes();
     else if (*what == "formats")
       list_formats();
+    else if (*what == "spaces")
+      list_spaces();
     else
       list_cpu();
   };
@@ -72,6 +80,7 @@ Run declare(CLI::App& verb) {
 
 }  // namespace
 
-const Command kListCommand = {"list", "List transfer modes, file formats or processor features", &declare};
+const Command kListCommand = {"list", "List transfer modes, file formats, colour spaces or processor features",
+                              &declare};
 
 }  // namespace zr::tool

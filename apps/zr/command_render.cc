@@ -39,7 +39,13 @@ constexpr const char* kFooter =
     "What the files hold:\n"
     "  .png .tif   depth 8 or 16 (0..65535), straight alpha; TIFF also float\n"
     "  .exr        float or half, associated (premultiplied) alpha\n"
-    "  There is no colour management: values are read and written as they are.\n"
+    "  Without a working_space in the scene, values are read and written as they are. With one:\n"
+    "    - an image is converted from the ICC profile in its file; without one, files of 8 or 16\n"
+    "      bits are sRGB and float files linear sRGB\n"
+    "    - CMYK TIFF and JPEG files are converted by their profile, which they must carry; without a\n"
+    "      working_space they become RGB as 1 - ink, times 1 - black; grey profiles are refused\n"
+    "    - PNG and TIFF carry the profile of the output_space; OpenEXR has no place for one, so\n"
+    "      choose \"srgb-linear\" for what readers of OpenEXR take it to be\n"
     "  16-bit files and the 0..32768 of the composite: v * 65535 / 32768, rounded, and back; white\n"
     "  stays white and every value of the composite survives the way out and in again.\n"
     "  Colour under alpha 0 is kept in PNG and TIFF; in OpenEXR it becomes 0.\n"
@@ -130,7 +136,7 @@ void render(const RenderOptions& options) {
     timings.draw += drawing.seconds();
     const Stopwatch writing;
     write_then_rename(files[i], [&](const std::string& part) {
-      save_image(picture, format, options.exr == "half" && format.associated, part);
+      save_image(picture, format, options.exr == "half" && format.associated, part, renderer.output_icc());
     });
     timings.write += writing.seconds();
     progress.frame_done(frame, files[i]);

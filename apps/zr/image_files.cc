@@ -9,6 +9,7 @@
 #include "checked_file.h"
 #include "depths.h"
 #include "file_values.h"
+#include "ink_jpeg.h"
 #include "interrupt_state.h"
 #include "nearest_name.h"
 #include "quiet_stderr.h"
@@ -30,6 +31,9 @@ struct ChannelPlan {
   int used() const { return std::max({red, green, blue, alpha}) + 1; }
 };
 
+// Ink stands in a pixel where alpha and colours are otherwise.
+constexpr ChannelPlan kInkPlan = {1, 2, 3, 0, false};
+
 ChannelPlan plan_channels(const OIIO::ImageSpec& spec, const std::string& format) {
   ChannelPlan plan;
   const auto find = [&](const char* name) { return spec.channelindex(name); };
@@ -50,12 +54,20 @@ struct OpenImage {
   std::unique_ptr<OIIO::ImageInput> input;
   OIIO::ImageSpec spec;
   ChannelPlan plan;
+  bool ink = false;     // the file holds cyan, magenta, yellow and black
   OIIO::TypeDesc type;  // that pixels are read as
   // The picture's place: for OpenEXR the display window, of which the data may fill a part.
   i32 width = 0, height = 0, left = 0, top = 0;
 };
 
-OpenImage open_image(const std::string& file, const std::string& where) {
+enum class Ink { kAsRgb, kAsItIs };
+
+bool is_ink(const OIIO::ImageSpec& spec, const std::string& format) {
+  const auto is = [&](const char* attribute) { return spec.get_string_attribute(attribute) == "CMYK"; };
+  return (format == "tiff" && is("tiff:ColorSpace")) || (format == "jpeg" && is("jpeg:ColorSpace"));
+}
+
+OpenImage open_image(const std::string& file, const std::string& where, Ink ink = Ink::kAsRgb) {
   std::error_code error;
   if (!std::filesystem::exists(file, error)) throw file_error(where + ": " + file + " does not exist");
   if (std::filesystem::is_directory(file, error)) throw file_error(where + ": " + file + " is a folder");
@@ -65,9 +77,16 @@ OpenImage open_image(const std::string& file, const std::string& where) {
   OpenImage image;
   image.input = OIIO::ImageInput::open(file, &wish);
   if (!image.input) throw file_error(where + ": " + file + " is no readable image: " + first_line(OIIO::geterror()));
+  const std::string format = image.input->format_name();
+  image.ink = is_ink(image.input->spec(), format);
+  const bool raw = image.ink && ink == Ink::kAsItIs && format == "tiff";
+  if (raw) {
+    wish.attribute("oiio:RawColor", 1);
+    image.input = OIIO::ImageInput::open(file, &wish);
+    if (!image.input) throw file_error(where + ": " + file + " is no readable image: " + first_line(OIIO::geterror()));
+  }
   image.spec = image.input->spec();
   const OIIO::ImageSpec& spec = image.spec;
-  const std::string format = image.input->format_name();
   const bool windowed = format == "openexr" && spec.full_width > 0 && spec.full_height > 0;
   image.width = windowed ? spec.full_width : spec.width;
   image.height = windowed ? spec.full_height : spec.height;
@@ -78,7 +97,8 @@ OpenImage open_image(const std::string& file, const std::string& where) {
     throw file_error(where + ": " + file + " has " + std::to_string(image.width) + " x " +
                      std::to_string(image.height) + " pixels; a side must be 1 to " + std::to_string(kLargestSide));
   if (spec.depth > 1 || spec.deep || spec.nchannels < 1) throw file_error(where + ": " + file + " is no flat picture");
-  image.plan = plan_channels(spec, format);
+  if (raw && spec.nchannels < 4) throw file_error(where + ": " + file + " is CMYK with fewer than four channels");
+  image.plan = raw ? kInkPlan : plan_channels(spec, format);
   image.type = spec.format == OIIO::TypeUInt8 || spec.format == OIIO::TypeUInt16 ? spec.format : OIIO::TypeFloat;
   return image;
 }
@@ -86,6 +106,28 @@ OpenImage open_image(const std::string& file, const std::string& where) {
 u64 decoded_bytes(const OpenImage& image) {
   return static_cast<u64>(image.spec.width) * static_cast<u64>(image.spec.height) *
          static_cast<u64>(image.plan.used()) * image.type.size();
+}
+
+PictureColour colour_of(const OpenImage& image) {
+  PictureColour colour;
+  colour.ink = image.ink;
+  colour.floats = image.spec.format.is_floating_point();
+  if (const OIIO::ParamValue* icc = image.spec.find_attribute("ICCProfile")) {
+    const u8* const data = static_cast<const u8*>(icc->data());
+    colour.icc.assign(data, data + icc->datasize());
+  }
+  return colour;
+}
+
+OwnedWorld world_of(const InkImage& image) {
+  OwnedWorld world(image.width, image.height, 16);
+  for_each_row(image.height, [&](i32 y) {
+    const u8* from = image.values.data() + static_cast<size_t>(y) * static_cast<size_t>(image.width) * 4;
+    ZR_Pixel16* const to = world.row<ZR_Pixel16>(y);
+    for (i32 x = 0; x < image.width; ++x, from += 4)
+      to[x] = {widen_8_to_16(from[0]), widen_8_to_16(from[1]), widen_8_to_16(from[2]), widen_8_to_16(from[3])};
+  });
+  return world;
 }
 
 template <class Pixel, class File>
@@ -191,11 +233,30 @@ std::vector<std::string> readable_formats() {
 
 ImageInfo probe_image(const std::string& file, const std::string& where) {
   const OpenImage image = open_image(file, where);
-  return {image.width, image.height, decoded_bytes(image)};
+  const u64 pixels = static_cast<u64>(image.spec.width) * static_cast<u64>(image.spec.height);
+  return {image.width, image.height, decoded_bytes(image) + (image.ink ? pixels * (sizeof(ZR_Pixel16) + 4) : 0)};
 }
 
-OwnedWorld load_image(const std::string& file, i32 depth, const std::string& where) {
-  OpenImage image = open_image(file, where);
+FileFacts read_facts(const std::string& file, const std::string& where) {
+  const OpenImage image = open_image(file, where, Ink::kAsItIs);
+  FileFacts facts;
+  facts.format = image.input->format_name();
+  facts.width = image.width;
+  facts.height = image.height;
+  const bool ink_jpeg = image.ink && facts.format == "jpeg";
+  facts.channel_count = ink_jpeg ? 4 : image.spec.nchannels;
+  for (const std::string& name : image.spec.channelnames) facts.channels += (facts.channels.empty() ? "" : ", ") + name;
+  if (ink_jpeg) facts.channels = "C, M, Y, K";
+  const OIIO::TypeDesc type = image.spec.format;
+  facts.depth = type == OIIO::TypeUInt8 ? "8" : type == OIIO::TypeUInt16 ? "16" : type.c_str();
+  facts.alpha = image.ink || image.plan.alpha < 0 ? "none" : image.plan.associated ? "associated" : "straight";
+  facts.colour = colour_of(image);
+  return facts;
+}
+
+namespace {
+
+OwnedWorld read_world(OpenImage& image, i32 depth, const std::string& file, const std::string& where) {
   std::vector<char> decoded(decoded_bytes(image));
   const auto stop = [](void*, float) { return interrupted(); };
   const QuietStderr quiet;
@@ -217,7 +278,37 @@ OwnedWorld load_image(const std::string& file, i32 depth, const std::string& whe
   return world;
 }
 
-void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, const std::string& file) {
+}  // namespace
+
+OwnedWorld load_image(const std::string& file, i32 depth, const std::string& where) {
+  OpenImage image = open_image(file, where);
+  return read_world(image, depth, file, where);
+}
+
+Picture load_picture(const std::string& file, i32 depth, const std::string& where) {
+  OpenImage image = open_image(file, where, Ink::kAsItIs);
+  PictureColour colour = colour_of(image);
+  if (image.ink && std::string(image.input->format_name()) == "jpeg")
+    return {world_of(read_ink_jpeg(file, where)), std::move(colour)};
+  return {read_world(image, image.ink ? 16 : depth, file, where), std::move(colour)};
+}
+
+OwnedWorld world_in_space(Picture picture, Profile from, const Profile& to, i32 depth, i32 intent,
+                          const std::string& file, const std::string& where) {
+  if (!from) from = profile_of(picture.colour, file, where);
+  const bool ink_profile = with_engine(where, [&] { return from->GetColourSpace(); }) == PRISMA_Word("CMYK");
+  if (ink_profile != picture.colour.ink)
+    throw bad_input(where + ": " + file + (picture.colour.ink ? " is CMYK, but not" : " is not CMYK, as is") +
+                    " the profile that is given for it");
+  if (same_space(from, to)) return std::move(picture.world);
+  const TON_PRISMA_Transform transform = make_transform(from, to, intent, where + ": " + file);
+  if (picture.colour.ink) return world_from_ink(picture.world, depth, transform, where + ": " + file);
+  convert_world(picture.world, transform, where + ": " + file);
+  return std::move(picture.world);
+}
+
+void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, const std::string& file,
+                const std::vector<u8>& icc) {
   const QuietStderr quiet;
   CheckedFile checked(file);  // outlives the writer, which may still write when it goes
   const std::unique_ptr<OIIO::ImageOutput> output = OIIO::ImageOutput::create(format.name);
@@ -228,6 +319,8 @@ void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, 
   spec.attribute("compression", "zip");
   spec.attribute("png:compressionLevel", 4);  // half the time of the usual 6, a twentieth larger
   spec.attribute("Software", "zr");
+  if (!icc.empty())
+    spec.attribute("ICCProfile", OIIO::TypeDesc(OIIO::TypeDesc::UINT8, static_cast<int>(icc.size())), icc.data());
   const auto fail = [&] {
     const std::string reason = output->geterror();
     throw file_error(file +

@@ -1,7 +1,7 @@
 // Image files in and out of worlds.
 //
-// Colour management there is none: values go in and out as they are. Worlds hold straight alpha. PNG
-// and TIFF are written with straight alpha (TIFF marked "unassociated"), OpenEXR with associated
+// Values go in and out as they are, with what the file says about them beside. Worlds hold straight
+// alpha. PNG and TIFF are written with straight alpha (TIFF marked "unassociated"), OpenEXR with associated
 // (premultiplied) alpha, as those formats are read elsewhere.
 #pragma once
 
@@ -10,6 +10,7 @@
 #include <string>
 #include <vector>
 
+#include "colour_space.h"
 #include "owned_world.h"
 
 namespace zr::tool {
@@ -35,11 +36,32 @@ struct ImageInfo {
 };
 // Opens the file and reads its header; `where` ("scene.json: layers[0].image") begins messages.
 ImageInfo probe_image(const std::string& file, const std::string& where);
+// What a file's header says, for people.
+struct FileFacts {
+  std::string format, channels;  // "png", "R, G, B, A"
+  i32 width = 0, height = 0, channel_count = 0;
+  std::string depth;  // "8", "16", "half", "float" or the name of another type
+  std::string alpha;  // "none", "straight" or "associated"
+  PictureColour colour;
+};
+FileFacts read_facts(const std::string& file, const std::string& where);
 // Grey, grey with alpha, RGB or RGBA of 8 or 16 bits, half or float, as a world of `depth`.
 OwnedWorld load_image(const std::string& file, i32 depth, const std::string& where);
-// Writes a world at its depth; `half` stores 16-bit floats in OpenEXR. The file is the caller's to
-// remove when this throws.
-void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, const std::string& file);
+// The same with its colours' meaning. CMYK TIFF and JPEG files are not turned to RGB as load_image does it:
+// their world is one of ink at 16 bits, cyan, magenta, yellow and black in place of alpha, red, green, blue.
+struct Picture {
+  OwnedWorld world;
+  PictureColour colour;
+};
+Picture load_picture(const std::string& file, i32 depth, const std::string& where);
+// The picture in the space `to`, at `depth`, which is that it was loaded at; `from` stands in for the
+// file's own profile unless it is empty.
+OwnedWorld world_in_space(Picture picture, Profile from, const Profile& to, i32 depth, i32 intent,
+                          const std::string& file, const std::string& where);
+// Writes a world at its depth; `half` stores 16-bit floats in OpenEXR. A profile goes into the file where
+// it is not empty; OpenEXR has no place for one. The file is the caller's to remove when this throws.
+void save_image(const OwnedWorld& world, const OutputFormat& format, bool half, const std::string& file,
+                const std::vector<u8>& icc = {});
 
 void set_image_threads(int threads);
 

@@ -1,6 +1,8 @@
 // Draws the frames of a scene through the library's transfer rectangle.
 #include "render.h"
 
+#include <ZR/linear_tables.h>
+
 #include <algorithm>
 #include <cmath>
 #include <set>
@@ -55,9 +57,10 @@ u64 memory_needed(const Scene& scene) {
 }
 
 Renderer::Renderer(const Scene& scene) : scene_(scene), canvas_(scene.width, scene.height, scene.depth) {
+  choose_spaces();
   for (const SceneImage& image : images_of(scene)) {
     stop_if_interrupted();
-    images_.emplace(image.file, load_image(image.file, scene.depth, image.where));
+    images_.emplace(image.file, load(image));
   }
   for (const Layer& layer : scene.layers) {
     if (!layer.image.empty()) continue;
@@ -72,7 +75,29 @@ const OwnedWorld& Renderer::draw(i32 frame) {
     stop_if_interrupted();
     composite(layer, layer.image.empty() ? solids_.at(&layer) : images_.at(layer.image), frame);
   }
+  if (to_output_.Get() != nullptr) convert_world(canvas_, to_output_, "converting to the output space");
   return canvas_;
+}
+
+void Renderer::choose_spaces() {
+  if (scene_.working_space) {
+    working_ = load_space(*scene_.working_space, Device::kRgb, scene_.file + ": working_space");
+    output_ =
+        scene_.output_space ? load_space(*scene_.output_space, Device::kRgb, scene_.file + ": output_space") : working_;
+    output_icc_ = icc_data(*output_);
+    if (!same_space(working_, output_))
+      to_output_ =
+          make_transform(working_, output_, PRISMA_Intent_RelativeColorimetric, scene_.file + ": output_space");
+  }
+  // Values of a linear space are linear light already.
+  if (scene_.linear_light && !(working_ && TON_PRISMA_Profile_IsOverRange(*working_)))
+    tables_ = with_engine(scene_.file + ": linear_light", [&] { return ZR_MakeLinearizationTables(working_); });
+}
+
+OwnedWorld Renderer::load(const SceneImage& image) const {
+  if (!working_) return load_image(image.file, scene_.depth, image.where);
+  return world_in_space(load_picture(image.file, scene_.depth, image.where), {}, working_, scene_.depth,
+                        PRISMA_Intent_RelativeColorimetric, image.file, image.where);
 }
 
 void Renderer::composite(const Layer& layer, OwnedWorld& source, i32 frame) {
@@ -88,7 +113,7 @@ void Renderer::composite(const Layer& layer, OwnedWorld& source, i32 frame) {
     mask.kind = layer.matte->kind;
   }
   const GX_LRect all = source.bounds();
-  check(ZR_TransferRect(&abort_on_interrupt(), 1, 0, layer.field, &all, source.layer(), &mode, nullptr,
+  check(ZR_TransferRect(&abort_on_interrupt(), 1, 0, layer.field, &all, source.layer(), &mode, tables_.get(),
                         layer.matte ? &mask : nullptr, place.x, place.y, canvas_.layer()),
         layer.place);
 }

@@ -24,16 +24,24 @@ u64 memory_needed(const Scene& scene);
 // Lives while the host lives.
 class Renderer {
  public:
-  // Loads every image and makes every solid.
+  // Loads every image, takes it to the working space, and makes every solid.
   explicit Renderer(const Scene& scene);
   // The picture of a frame; valid until the next call.
   const OwnedWorld& draw(i32 frame);
+  // ICC data for the files, empty without a working space.
+  const std::vector<u8>& output_icc() const { return output_icc_; }
   size_t image_count() const { return images_.size(); }
 
  private:
+  void choose_spaces();
+  OwnedWorld load(const SceneImage& image) const;
   void composite(const Layer& layer, OwnedWorld& source, i32 frame);
 
   const Scene& scene_;
+  Profile working_, output_;  // empty: values are taken as they are
+  boost::shared_ptr<ZR_LinearBlendingTables> tables_;
+  TON_PRISMA_Transform to_output_;  // empty: nothing to convert
+  std::vector<u8> output_icc_;
   OwnedWorld canvas_;
   std::map<std::string, OwnedWorld> images_;  // by file name
   std::map<const Layer*, OwnedWorld> solids_;

@@ -79,6 +79,14 @@ std::string read_image_path(const SceneNode& node, const std::string& scene_file
   return (std::filesystem::path(scene_file).parent_path() / path).lexically_normal().string();
 }
 
+SpaceChoice read_space(const SceneNode& node, const std::string& scene_file) {
+  const std::string text = node.string("the name of a colour space, such as \"display-p3\", or an ICC file");
+  std::optional<SpaceChoice> space = find_space(text);
+  if (!space) node.fail(unknown_space(text));
+  if (space->named == nullptr) space->file = read_image_path(node, scene_file);
+  return *space;
+}
+
 i32 read_mode(const SceneNode& node) {
   const std::string name = node.string("the name of a transfer mode, such as \"screen\"; see zr list modes");
   const std::optional<i32> mode = find_mode(name);
@@ -195,6 +203,12 @@ Scene parse_scene(const std::string& text, const std::string& file) {
     if (name != "8" && name != "16" && name != "float") depth.refuse("8, 16 or \"float\"");
     scene.depth = parse_depth(name, "");
   }
+  if (top.has("working_space")) scene.working_space = read_space(top.at("working_space"), file);
+  if (top.has("output_space")) {
+    if (!scene.working_space) top.at("output_space").fail("needs \"working_space\" beside it");
+    scene.output_space = read_space(top.at("output_space"), file);
+  }
+  if (top.has("linear_light")) scene.linear_light = top.at("linear_light").boolean();
   if (!top.has("layers")) top.fail("lacks \"layers\": [ ... ], from bottom to top");
   const SceneNode layers = top.at("layers");
   if (!layers.json().is_array()) layers.refuse("a list [ ... ] of layers, from bottom to top");

@@ -7,6 +7,7 @@
 #include <string>
 #include <vector>
 
+#include "colour_space.h"
 #include "depths.h"
 #include "frame_names.h"
 #include "keyframes.h"
@@ -38,7 +39,9 @@ struct Scene {
   i32 width = 0, height = 0;
   ZR_PixelFloat background{0, 0, 0, 0};
   FrameRange frames;
-  i32 depth = 8;  // bits of a channel: 8, 16 or 32
+  i32 depth = 8;                                           // bits of a channel: 8, 16 or 32
+  std::optional<SpaceChoice> working_space, output_space;  // an output space only with a working space
+  bool linear_light = false;
   std::vector<Layer> layers;
 };
 

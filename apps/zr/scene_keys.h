@@ -19,6 +19,11 @@ inline constexpr std::array kSceneKeys = {
     SceneKey{"background", "colour", "[0, 0, 0, 0]", "what the frame is filled with first"},
     SceneKey{"frames", "[first, last] or \"first-last\"", "[1, 1]", "frames to render; --frames overrides it"},
     SceneKey{"depth", "8, 16 or \"float\"", "8", "channels of the composite; --depth overrides it"},
+    SceneKey{"working_space", "name, see zr list spaces, or ICC file", "none: values as they are",
+             "images are converted to it by their profile; colours are its values"},
+    SceneKey{"output_space", "the same", "the working space", "of the files that are written"},
+    SceneKey{"linear_light", "true or false", "false",
+             "layers are blended in linear light of the working space, or sRGB"},
     SceneKey{"layers", "list of layers", "", "from bottom to top"},
 };
 inline constexpr std::array kLayerKeys = {

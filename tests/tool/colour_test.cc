@@ -1,0 +1,152 @@
+// The program and colour: profiles in files, conversions, linear light, mistakes in one line.
+#include <ZR/hostkit.h>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <OpenImageIO/imageio.h>
+
+#include <array>
+#include <cstdlib>
+#include <nlohmann/json.hpp>
+
+#include "image_files.h"
+#include "temporary_folder.h"
+
+namespace zr::tool {
+namespace {
+
+using testing::HasSubstr;
+
+std::string slurp(const std::string& file) {
+  std::ifstream stream(file, std::ios::binary);
+  return {std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
+}
+std::string icc(const std::string& name) { return ZR_TEST_DATA "/icc/" + name + ".icc"; }
+
+class Colour : public testing::Test {
+ protected:
+  // A line of arguments without blanks inside of them; the exit code.
+  int run(const std::string& arguments) {
+    const std::string line = "cd " + folder.path() + " && " ZR_TOOL_PROGRAM " " + arguments + " >" + (streams / "out") +
+                             " 2>" + (streams / "err");
+    const int status = std::system(line.c_str());
+    out = slurp(streams / "out");
+    err = slurp(streams / "err");
+    return WEXITSTATUS(status);
+  }
+  // A picture of one pixel.
+  void picture(const std::string& name, const std::vector<u8>& pixel, const std::string& profile = "") {
+    OIIO::ImageSpec spec(1, 1, static_cast<int>(pixel.size()), OIIO::TypeUInt8);
+    if (!profile.empty())
+      spec.attribute("ICCProfile", OIIO::TypeDesc(OIIO::TypeDesc::UINT8, static_cast<int>(profile.size())),
+                     profile.data());
+    const auto output = OIIO::ImageOutput::create(folder / name);
+    ASSERT_TRUE(output->open(folder / name, spec) && output->write_image(OIIO::TypeUInt8, pixel.data()));
+    output->close();
+  }
+  std::array<int, 3> pixel(const std::string& name) {
+    const Hostkit host;
+    const OwnedWorld world = load_image(folder / name, 8, "test");
+    const ZR_Pixel8 p = world.row<ZR_Pixel8>(0)[0];
+    return {p.red, p.green, p.blue};
+  }
+  TemporaryFolder folder, streams;
+  std::string out, err;
+};
+
+TEST_F(Colour, KnownValueAndProfileComeOutInEveryFormatThatHoldsOne) {
+  picture("red.png", {255, 0, 0});
+  for (const std::string name : {"p3.png", "p3.tif"}) {
+    ASSERT_EQ(run("convert red.png -o " + name + " --to display-p3"), 0) << err;
+    const std::array<int, 3> got = pixel(name);  // of sRGB's red: 0.9176, 0.2003, 0.1386
+    EXPECT_NEAR(got[0], 234, 1);
+    EXPECT_NEAR(got[1], 51, 1);
+    EXPECT_NEAR(got[2], 35, 1);
+    ASSERT_EQ(run("info " + name + " --json"), 0) << err;
+    EXPECT_EQ(nlohmann::json::parse(out).at(0).at("profile"), "Display P3");
+    // The profile that was written is believed when the file is read.
+    ASSERT_EQ(run("convert " + name + " -o back.png --to srgb --force"), 0) << err;
+    EXPECT_NEAR(pixel("back.png")[0], 255, 1);
+    EXPECT_NEAR(pixel("back.png")[1], 0, 3);
+  }
+}
+
+TEST_F(Colour, SceneConvertsImagesAndBlendsInLinearLight) {
+  picture("p3.png", {234, 51, 35}, slurp(icc("DisplayP3-v4")));
+  folder.write("image.json", R"({"size":[1,1],"working_space":"srgb","layers":[{"image":"p3.png"}]})");
+  ASSERT_EQ(run("render image.json -o image.png"), 0) << err;
+  EXPECT_NEAR(pixel("image.png")[0], 255, 1);
+  EXPECT_NEAR(pixel("image.png")[1], 0, 4);
+  // Half of white over black: 128 stored, and the value whose light is a half, 188.
+  for (const auto& [linear, grey] : {std::pair{"false", 128}, {"true", 188}}) {
+    folder.write("s.json",
+                 std::string(R"({"size":[1,1],"background":"#000000","working_space":"srgb","linear_light":)") +
+                     linear + R"(,"layers":[{"colour":"#ffffff","opacity":0.5}]})");
+    ASSERT_EQ(run("render s.json -o s.png --force"), 0) << err;
+    EXPECT_NEAR(pixel("s.png")[1], grey, 1) << linear;
+  }
+}
+
+TEST_F(Colour, MistakesAreOneLine) {
+  picture("red.png", {255, 0, 0});
+  picture("grey.png", {99}, slurp(icc("sGrey-v4")));
+  folder.write("bad.icc", "no profile");
+  const struct {
+    std::string arguments;
+    int code;
+    const char* message;
+  } cases[] = {
+      {"convert red.png -o o.png --to srbg", 2, "the nearest is \"srgb\""},
+      {"convert red.png -o o.png --to bad.icc", 3, "bad.icc is no usable ICC profile"},
+      {"convert red.png -o o.png --to none.icc", 3, "none.icc does not exist"},
+      {"convert red.png -o o.png --to " + icc("sGrey-v4"), 3, "is a grey profile; an RGB one is needed"},
+      {"convert grey.png -o o.png --to srgb", 3, "carries a grey profile"},
+      {"convert red.png -o o.png --to srgb --from " + icc("CGATS001Compat-v2-micro"), 2, "is not CMYK"},
+      {"display red.png -o o.png --profile bad.icc", 3, "no usable ICC profile"},
+      {"display red.png -o o.png --profile srgb --simulate " + icc("CGATS001Compat-v2-micro"), 3,
+       "cannot be simulated"},
+      {"info bad.icc", 3, "bad.icc is no readable image"},
+  };
+  for (const auto& one : cases) {
+    EXPECT_EQ(run(one.arguments), one.code) << one.arguments;
+    EXPECT_THAT(err, HasSubstr(one.message));
+    EXPECT_EQ(std::count(err.begin(), err.end(), '\n'), 1) << err;
+    EXPECT_FALSE(std::filesystem::exists(folder / "o.png"));
+  }
+}
+
+TEST_F(Colour, DisplayCutsOffWhatTheSimulatedDeviceCannotShow) {
+  picture("green.png", {0, 255, 0}, slurp(icc("DisplayP3-v4")));
+  const std::string line = "display green.png --profile display-p3 --working display-p3 -o ";
+  ASSERT_EQ(run(line + "plain.png"), 0) << err;
+  EXPECT_NEAR(pixel("plain.png")[0], 0, 1);
+  for (const std::string depth : {"8", "float"}) {
+    const std::string name = depth + ".tif";
+    ASSERT_EQ(run(line + name + " --simulate srgb --depth " + depth), 0) << err;
+    const std::array<int, 3> got = pixel(name);  // sRGB's green: 0.4584, 0.9852, 0.2983
+    EXPECT_NEAR(got[0], 117, 1);
+    EXPECT_NEAR(got[1], 251, 1);
+    EXPECT_NEAR(got[2], 76, 1);
+  }
+}
+
+TEST_F(Colour, InkComesInThroughItsProfile) {
+  const std::string profile = slurp(icc("CGATS001Compat-v2-micro"));
+  OIIO::ImageSpec spec(1, 1, 4, OIIO::TypeUInt8);
+  spec.channelnames = {"C", "M", "Y", "K"};
+  spec.alpha_channel = -1;
+  spec.attribute("oiio:ColorSpace", "CMYK");
+  spec.attribute("tiff:ColorSpace", "CMYK");
+  spec.attribute("ICCProfile", OIIO::TypeDesc(OIIO::TypeDesc::UINT8, static_cast<int>(profile.size())), profile.data());
+  const u8 cyan[4] = {255, 0, 0, 0};
+  const auto output = OIIO::ImageOutput::create(folder / "ink.tif");
+  ASSERT_TRUE(output->open(folder / "ink.tif", spec) && output->write_image(OIIO::TypeUInt8, cyan) && output->close());
+  folder.write("s.json", R"({"size":[1,1],"working_space":"srgb","layers":[{"image":"ink.tif"}]})");
+  ASSERT_EQ(run("render s.json -o s.png"), 0) << err;
+  const std::array<int, 3> got = pixel("s.png");  // printed cyan, not the 0, 255, 255 of a screen
+  EXPECT_LT(got[0], 20);
+  EXPECT_NEAR(got[1], 174, 3);
+  EXPECT_NEAR(got[2], 239, 3);
+}
+
+}  // namespace
+}  // namespace zr::tool
