@@ -6,6 +6,8 @@
 #include <ZR/slots.h>
 #include <ZR/zr.h>
 
+#include <type_traits>
+
 namespace zr {
 
 using CompositeRectFunc = i32(const ZR_ProgressInfo*, const GX_LRect*, u8 opacity, ZR_LayerDef* src, i32 dest_x,
@@ -24,6 +26,29 @@ template <class T>
 using TransferRowsFunc = i32(const ZR_ProgressInfo*, i32 quality, i32 field, const GX_LRect*, const ZR_WorldX<T>* src,
                              const ZR_BlendingMode<T>*, const ZR_LinearBlendingTables*, const ZR_MaskWorld*,
                              void* const scratch[10], i32 dest_x, i32 dest_y, ZR_WorldX<T>* dst);
+// Walks the rows of a layer placed by matrices; the worlds have one depth.
+template <class T>
+using TransformRowsFunc = i32(const ZR_ProgressInfo*, i32 quality, i32 field, const ZR_WorldX<T>* src,
+                              const ZR_BlendingMode<T>*, const ZR_LinearBlendingTables*, const ZR_MaskWorld*,
+                              const GX_Matrix3*, i32 count, bool src2dst, void* const scratch[10], const GX_LRect*,
+                              ZR_WorldX<T>* dst);
+template <class T>
+using SampleFunc = i32(const ZR_ProgressInfo*, i32 x, i32 y, const ZR_SampPB*, T* dst);
+template <class T>
+using SamplePlusFunc = i32(const ZR_ProgressInfo*, i32 x, i32 y, const ZR_SampPB*, u8* all_in, T* dst);
+template <class T>
+using SampleTranslateFunc = i32(const ZR_ProgressInfo*, i32 x, i32 y, const f64* w, const ZR_SampPB*, T* dst);
+template <class T>
+using AlphaSum = std::conditional_t<std::is_same_v<T, ZR_PixelFloat>, f32, u32>;
+template <class T>
+using SampleSpanFunc = i32(const ZR_ProgressInfo*, i32 count, i32 x, i32 y, const ZR_SampPB*, AlphaSum<T>* sum_alpha,
+                           T* dst);
+using SampleFourFunc = i32(const ZR_ProgressInfo*, const i32* xy, const ZR_SampPB*, ZR_Pixel8* dst);
+using SampleFourTranslateFunc = i32(const ZR_ProgressInfo*, const i32* xy, const f64* w, const ZR_SampPB*,
+                                    ZR_Pixel8* dst);
+using SampleWeightFunc = i32(u16 fx, u16 fy, f64* w);
+using CopyBitsFunc = i32(const ZR_ProgressInfo*, ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect,
+                         const GX_LRect* dst_rect);
 using CompositeBehindRowFunc = void(i32 n, u8 opacity, const ZR_Pixel8* src, ZR_Pixel8* dst);
 using IterateFunc = i32(ZR_InData*, i32 progress_base, i32 progress_final, ZR_LayerDef* src, const GX_LRect*,
                         void* refcon, ZR_PixelFunc, ZR_LayerDef* dst);
@@ -45,143 +70,74 @@ using InnerBlendGetter = i32(i32 mode, ZR_InnerBlendingFunc<T>* out);
 template <ZR_SlotIndex>
 struct Slot;  // slot number -> type of its routine; a slot without one belongs to no code of ours
 
-template <>
-struct Slot<ZR_Slot_composite_rect_draft_straight> {
-  using type = CompositeRectFunc;
-};
-template <>
-struct Slot<ZR_Slot_composite_rect_draft_premul> {
-  using type = CompositeRectFunc;
-};
-template <>
-struct Slot<ZR_Slot_composite_rect_best_straight> {
-  using type = CompositeRectFunc;
-};
-template <>
-struct Slot<ZR_Slot_composite_rect_best_premul> {
-  using type = CompositeRectFunc;
-};
-template <>
-struct Slot<ZR_Slot_transfer_rows8> {
-  using type = TransferRowsFunc<ZR_Pixel8>;
-};
-template <>
-struct Slot<ZR_Slot_transfer_rows16> {
-  using type = TransferRowsFunc<ZR_Pixel16>;
-};
-template <>
-struct Slot<ZR_Slot_transfer_rowsFloat> {
-  using type = TransferRowsFunc<ZR_PixelFloat>;
-};
-template <>
-struct Slot<ZR_Slot_transfer_rect_plus> {
-  using type = TransferRectPlusFunc;
-};
-template <>
-struct Slot<ZR_Slot_composite_behind_row_straight> {
-  using type = CompositeBehindRowFunc;
-};
-template <>
-struct Slot<ZR_Slot_composite_behind_row_premul> {
-  using type = CompositeBehindRowFunc;
-};
-template <>
-struct Slot<ZR_Slot_transfer_rect> {
-  using type = TransferRectFunc;
-};
-template <>
-struct Slot<ZR_Slot_transform_world> {
-  using type = TransformWorldFunc;
-};
-template <>
-struct Slot<ZR_Slot_iterate> {
-  using type = IterateFunc;
-};
-template <>
-struct Slot<ZR_Slot_iterate_origin> {
-  using type = IterateOriginFunc;
-};
-template <>
-struct Slot<ZR_Slot_iterate_origin_no_clip> {
-  using type = IterateOriginFunc;
-};
-template <>
-struct Slot<ZR_Slot_iterate_lut> {
-  using type = IterateLutFunc;
-};
-template <>
-struct Slot<ZR_Slot_iterate_generic> {
-  using type = IterateGenericFunc;
-};
-template <>
-struct Slot<ZR_Slot_premul_rect> {
-  using type = PremulRectFunc;
-};
-template <>
-struct Slot<ZR_Slot_open_destination> {
-  using type = OpenDestinationFunc;
-};
-template <>
-struct Slot<ZR_Slot_close_destination> {
-  using type = OpenDestinationFunc;
-};
-template <>
-struct Slot<ZR_Slot_module47> {
-  using type = ModuleOwnFunc;
-};
-template <>
-struct Slot<ZR_Slot_module48> {
-  using type = ModuleOwnFunc;
-};
+#define ZR_SLOT(name, Function) \
+  template <>                   \
+  struct Slot<ZR_Slot_##name> { \
+    using type = Function;      \
+  };
+ZR_SLOT(composite_rect_draft_straight, CompositeRectFunc)
+ZR_SLOT(composite_rect_draft_premul, CompositeRectFunc)
+ZR_SLOT(composite_rect_best_straight, CompositeRectFunc)
+ZR_SLOT(composite_rect_best_premul, CompositeRectFunc)
+ZR_SLOT(transfer_rows8, TransferRowsFunc<ZR_Pixel8>)
+ZR_SLOT(transfer_rows16, TransferRowsFunc<ZR_Pixel16>)
+ZR_SLOT(transfer_rowsFloat, TransferRowsFunc<ZR_PixelFloat>)
+ZR_SLOT(transfer_rect_plus, TransferRectPlusFunc)
+ZR_SLOT(composite_behind_row_straight, CompositeBehindRowFunc)
+ZR_SLOT(composite_behind_row_premul, CompositeBehindRowFunc)
+ZR_SLOT(transfer_rect, TransferRectFunc)
+ZR_SLOT(transform_world, TransformWorldFunc)
+ZR_SLOT(iterate, IterateFunc)
+ZR_SLOT(iterate_origin, IterateOriginFunc)
+ZR_SLOT(iterate_origin_no_clip, IterateOriginFunc)
+ZR_SLOT(iterate_lut, IterateLutFunc)
+ZR_SLOT(iterate_generic, IterateGenericFunc)
+ZR_SLOT(premul_rect, PremulRectFunc)
+ZR_SLOT(open_destination, OpenDestinationFunc)
+ZR_SLOT(close_destination, OpenDestinationFunc)
+ZR_SLOT(module47, ModuleOwnFunc)
+ZR_SLOT(module48, ModuleOwnFunc)
+ZR_SLOT(copy_bits_draft, CopyBitsFunc)
+ZR_SLOT(copy_bits_hq_straight, CopyBitsFunc)
+ZR_SLOT(copy_bits_hq_premul, CopyBitsFunc)
+ZR_SLOT(nn_sample8, SampleFunc<ZR_Pixel8>)
+ZR_SLOT(nn_sample16, SampleFunc<ZR_Pixel16>)
+ZR_SLOT(bilinear_straight8, SampleFunc<ZR_Pixel8>)
+ZR_SLOT(bilinear_straight16, SampleFunc<ZR_Pixel16>)
+ZR_SLOT(bilinear_premul8, SampleFunc<ZR_Pixel8>)
+ZR_SLOT(area_straight8, SampleFunc<ZR_Pixel8>)
+ZR_SLOT(area_straight16, SampleFunc<ZR_Pixel16>)
+ZR_SLOT(area_premul8, SampleFunc<ZR_Pixel8>)
+ZR_SLOT(bilinear_plus8, SamplePlusFunc<ZR_Pixel8>)
+ZR_SLOT(bilinear_plus16, SamplePlusFunc<ZR_Pixel16>)
+ZR_SLOT(bilinear_no_clip8, SampleFunc<ZR_Pixel8>)
+ZR_SLOT(bilinear_no_clip16, SampleFunc<ZR_Pixel16>)
+ZR_SLOT(bilinear_translate_no_clip8, SampleTranslateFunc<ZR_Pixel8>)
+ZR_SLOT(bilinear_translate_no_clip16, SampleTranslateFunc<ZR_Pixel16>)
+ZR_SLOT(bilinear_span8, SampleSpanFunc<ZR_Pixel8>)
+ZR_SLOT(bilinear_span16, SampleSpanFunc<ZR_Pixel16>)
+ZR_SLOT(bilinear_no_clip8_x4, SampleFourFunc)
+ZR_SLOT(bilinear_translate_no_clip8_x4, SampleFourTranslateFunc)
+ZR_SLOT(sample_compute_weight, SampleWeightFunc)
+ZR_SLOT(transform_row8, TransformRowsFunc<ZR_Pixel8>)
+ZR_SLOT(transform_row16, TransformRowsFunc<ZR_Pixel16>)
+ZR_SLOT(transform_rowFloat, TransformRowsFunc<ZR_PixelFloat>)
 
 // The slots of rows that exist once for each depth.
 template <class T>
 struct DepthSlots;
 #define ZR_DEPTH_SLOTS(Pixel, suffix)                                                                                 \
-  template <>                                                                                                         \
-  struct Slot<ZR_Slot_premul_row##suffix> {                                                                           \
-    using type = RowFunc<Pixel>;                                                                                      \
-  };                                                                                                                  \
-  template <>                                                                                                         \
-  struct Slot<ZR_Slot_unmul_row##suffix> {                                                                            \
-    using type = RowFunc<Pixel>;                                                                                      \
-  };                                                                                                                  \
-  template <>                                                                                                         \
-  struct Slot<ZR_Slot_white_fade_row##suffix> {                                                                       \
-    using type = RowFunc<Pixel>;                                                                                      \
-  };                                                                                                                  \
-  template <>                                                                                                         \
-  struct Slot<ZR_Slot_white_unfade_row##suffix> {                                                                     \
-    using type = RowFunc<Pixel>;                                                                                      \
-  };                                                                                                                  \
-  template <>                                                                                                         \
-  struct Slot<ZR_Slot_grey_fade_row##suffix> {                                                                        \
-    using type = RowFunc<Pixel>;                                                                                      \
-  };                                                                                                                  \
-  template <>                                                                                                         \
-  struct Slot<ZR_Slot_grey_unfade_row##suffix> {                                                                      \
-    using type = RowFunc<Pixel>;                                                                                      \
-  };                                                                                                                  \
-  template <>                                                                                                         \
-  struct Slot<ZR_Slot_union_alpha_row##suffix> {                                                                      \
-    using type = UnionAlphaFunc<Pixel>;                                                                               \
-  };                                                                                                                  \
-  template <>                                                                                                         \
-  struct Slot<ZR_Slot_inner_blend##suffix> {                                                                          \
-    using type = InnerBlendGetter<Pixel>;                                                                             \
-  };                                                                                                                  \
-  template <>                                                                                                         \
-  struct Slot<ZR_Slot_inner_blend_mask##suffix> {                                                                     \
-    using type = InnerBlendGetter<Pixel>;                                                                             \
-  };                                                                                                                  \
-  template <>                                                                                                         \
-  struct Slot<ZR_Slot_inner_blend_linear##suffix> {                                                                   \
-    using type = InnerBlendGetter<Pixel>;                                                                             \
-  };                                                                                                                  \
-  template <>                                                                                                         \
-  struct Slot<ZR_Slot_inner_blend_mask_linear##suffix> {                                                              \
-    using type = InnerBlendGetter<Pixel>;                                                                             \
-  };                                                                                                                  \
+  ZR_SLOT(premul_row##suffix, RowFunc<Pixel>)                                                                         \
+  ZR_SLOT(unmul_row##suffix, RowFunc<Pixel>)                                                                          \
+  ZR_SLOT(white_fade_row##suffix, RowFunc<Pixel>)                                                                     \
+  ZR_SLOT(white_unfade_row##suffix, RowFunc<Pixel>)                                                                   \
+  ZR_SLOT(grey_fade_row##suffix, RowFunc<Pixel>)                                                                      \
+  ZR_SLOT(grey_unfade_row##suffix, RowFunc<Pixel>)                                                                    \
+  ZR_SLOT(union_alpha_row##suffix, UnionAlphaFunc<Pixel>)                                                             \
+  ZR_SLOT(inner_blend##suffix, InnerBlendGetter<Pixel>)                                                               \
+  ZR_SLOT(inner_blend_mask##suffix, InnerBlendGetter<Pixel>)                                                          \
+  ZR_SLOT(inner_blend_linear##suffix, InnerBlendGetter<Pixel>)                                                        \
+  ZR_SLOT(inner_blend_mask_linear##suffix, InnerBlendGetter<Pixel>)                                                   \
   template <>                                                                                                         \
   struct DepthSlots<Pixel> {                                                                                          \
     static constexpr ZR_SlotIndex premul = ZR_Slot_premul_row##suffix, unmul = ZR_Slot_unmul_row##suffix,             \
@@ -193,12 +149,14 @@ struct DepthSlots;
                                   inner_mask = ZR_Slot_inner_blend_mask##suffix,                                      \
                                   inner_linear = ZR_Slot_inner_blend_linear##suffix,                                  \
                                   inner_mask_linear = ZR_Slot_inner_blend_mask_linear##suffix,                        \
-                                  transfer_rows = ZR_Slot_transfer_rows##suffix;                                      \
+                                  transfer_rows = ZR_Slot_transfer_rows##suffix,                                      \
+                                  transform_rows = ZR_Slot_transform_row##suffix;                                     \
   };
 ZR_DEPTH_SLOTS(ZR_Pixel8, 8)
 ZR_DEPTH_SLOTS(ZR_Pixel16, 16)
 ZR_DEPTH_SLOTS(ZR_PixelFloat, Float)
 #undef ZR_DEPTH_SLOTS
+#undef ZR_SLOT
 
 template <ZR_SlotIndex S>
 void set_slot(typename Slot<S>::type* routine) {

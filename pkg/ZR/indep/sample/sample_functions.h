@@ -1,0 +1,26 @@
+// The six samplers of a depth and quality, with their types.
+#pragma once
+
+#include "world/slot_table.h"
+
+namespace zr {
+
+template <class T>
+struct SampleFunctions {
+  SamplePlusFunc<T>* inside_flag;
+  SampleFunc<T>* clipping;
+  SampleFunc<T>* area;
+  SampleFunc<T>* no_clipping;
+  SampleTranslateFunc<T>* translate;
+  SampleSpanFunc<T>* span;
+};
+
+// What ZR_GetSampleFunctionSet... gives: fetched once before the loops. Cannot fail.
+template <class T>
+SampleFunctions<T> sample_functions(i32 quality);
+
+// The box mean with bilinear (1) or bicubic (2) point samples where the box is thin.
+template <class T, i32 quality>
+i32 area_sample(const ZR_ProgressInfo* progress, i32 x, i32 y, const ZR_SampPB* params, T* dst);
+
+}  // namespace zr
