@@ -57,7 +57,7 @@ bool FormulaCurve::build(const cmsToneCurve* curve) {
 void SampledCurve::build(const cmsToneCurve* curve) {
   values_.resize(65536);
   for (u32 i = 0; i < 65536; ++i)
-    values_[i] = static_cast<f32>(cmsEvalToneCurve16(curve, static_cast<u16>(i))) / 65535.0f;
+    values_[i] = static_cast<f32>(cmsEvalToneCurve16(curve, static_cast<u16>(i)) / 65535.0);
 }
 
 }  // namespace zr::prisma

@@ -40,6 +40,8 @@ class FormulaCurve {
     const Parabola& p = parabolas_[static_cast<size_t>(piece)];
     return p.by_formula ? exact(x) : p.a + x * (p.b + x * p.c);
   }
+  // The formula itself, to the last place of lcms.
+  f32 exact(f32 x) const;
 
  private:
   struct Parabola {
@@ -52,7 +54,6 @@ class FormulaCurve {
   static constexpr i32 first_piece = ((127 + lowest_exponent) << mantissa_bits) - 1;
   static constexpr i32 pieces = ((beyond_exponent - lowest_exponent) << mantissa_bits) + 1;
 
-  f32 exact(f32 x) const;
   bool fit(i32 piece, f32 sign, f64* y0);
 
   const cmsToneCurve* curve_ = nullptr;
@@ -65,12 +66,18 @@ class SampledCurve {
   void build(const cmsToneCurve* curve);
   f32 operator()(f32 x) const {
     const f64 word = static_cast<f64>(x) * 65535.0 + 0.5;
-    const u32 index = !(word > 0.0) ? 0 : word >= 65535.0 ? 65535u : static_cast<u32>(word);
-    return values_[index];
+    return values_[!(word > 0.0) ? 0 : word >= 65535.0 ? 65535u : floor_of(word)];
   }
   f32 in_unit(f32 x) const { return (*this)(x); }
+  f32 exact(f32 x) const { return (*this)(x); }
 
  private:
+  // As lcms has it: of the nearest multiple of 1/65536, so that what is just below a whole number counts as it.
+  static u32 floor_of(f64 word) {
+    constexpr f64 to_fixed = 0x1.8p36;  // leaves the number in 16.16 in the low bits
+    const i32 fixed = static_cast<i32>(std::bit_cast<u64>(word - 32767.0 + to_fixed));
+    return static_cast<u32>((fixed >> 16) + 32767);
+  }
   CurveVector<f32> values_;
 };
 

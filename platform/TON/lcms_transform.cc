@@ -38,8 +38,8 @@ bool invert(f64 m[3][3]) {
   return true;
 }
 
-// The affine map between the linear light of two profiles, asked of lcms itself at black and the primaries.
-void affine_between(const ContextRef& context, const PRISMATransform::Leg& leg, f32 columns[3][3], f32 offset[3]) {
+// The map between the linear light of two profiles, asked of lcms itself at black and the primaries.
+LinearMap map_between(const ContextRef& context, const PRISMATransform::Leg& leg) {
   const TON_PRISMA_Ref<PRISMAProfile> from(linear_profile(*leg.from.get())), to(linear_profile(*leg.to.get()));
   const TransformPtr transform(obtained(
       cmsCreateTransformTHR(context.raw(), from.get()->handle.get(), TYPE_RGB_FLT, to.get()->handle.get(), TYPE_RGB_FLT,
@@ -47,22 +47,34 @@ void affine_between(const ContextRef& context, const PRISMATransform::Leg& leg, 
   constexpr f32 corners[4][3] = {{0, 0, 0}, {1, 0, 0}, {0, 1, 0}, {0, 0, 1}};
   f32 results[4][3];
   cmsDoTransform(transform.get(), corners, results, 4);
+  LinearMap map = {};
+  bool identity = true, no_offset = true;
   for (int i = 0; i < 3; ++i) {
-    offset[i] = results[0][i];
-    for (int c = 0; c < 3; ++c) columns[c][i] = results[c + 1][i] - results[0][i];
+    map.offset[i] = results[0][i];
+    no_offset = no_offset && map.offset[i] == 0.0f;
+    for (int c = 0; c < 3; ++c) {
+      map.product[i][c] = map.columns[c][i] = results[c + 1][i] - results[0][i];
+      identity = identity && map.columns[c][i] == (i == c ? 1.0f : 0.0f);
+    }
   }
+  map.exact = identity && no_offset;  // lcms drops a matrix that is next to nothing
 
-  // Where that is nothing but the product of both matrices, the product is taken at double precision.
-  f64 forth[3][3], back[3][3];
-  if (!matrix_of(*from.get(), forth) || !matrix_of(*to.get(), back) || !invert(back)) return;
-  f64 product[3][3];
+  // Where that is nothing but the product of both matrices, lcms has taken the product at double precision.
+  f64 forth[3][3], back[3][3], product[3][3];
+  if (map.exact || !no_offset || !matrix_of(*from.get(), forth) || !matrix_of(*to.get(), back) || !invert(back))
+    return map;
   for (int i = 0; i < 3; ++i)
     for (int c = 0; c < 3; ++c) {
       product[i][c] = back[i][0] * forth[0][c] + back[i][1] * forth[1][c] + back[i][2] * forth[2][c];
-      if (!(std::fabs(product[i][c] - columns[c][i]) < 3e-6) || offset[i] != 0.0f) return;
+      if (!(std::fabs(product[i][c] - map.columns[c][i]) < 3e-6)) return map;
     }
   for (int i = 0; i < 3; ++i)
-    for (int c = 0; c < 3; ++c) columns[c][i] = static_cast<f32>(product[i][c]);
+    for (int c = 0; c < 3; ++c) {
+      map.product[i][c] = product[i][c];
+      map.columns[c][i] = static_cast<f32>(product[i][c]);
+    }
+  map.exact = true;
+  return map;
 }
 
 // False: this leg is not made of curves and a matrix that can be run here.
@@ -80,10 +92,9 @@ bool prepare_shaper(const ContextRef& context, const PRISMATransform::Leg& leg, 
     inverse[c].reset(cmsReverseToneCurve(back));
     if (inverse[c] == nullptr) return false;
   }
-  f32 columns[3][3], offset[3];
-  affine_between(context, leg, columns, offset);
+  const LinearMap map = map_between(context, leg);
   cmsToneCurve* const taken[3] = {inverse[0].release(), inverse[1].release(), inverse[2].release()};
-  return shaper.prepare(forward, taken, columns, offset);
+  return shaper.prepare(forward, taken, map);
 }
 
 // Pixels of a band: enough to hide the call, few enough to stay in a cache.
@@ -165,7 +176,10 @@ const PRISMATransform::Plan& PRISMATransform::plan(Layout src, Layout dst) {
 
   Plan next;
   if (!info(src).cmyk && !info(dst).cmyk) prepare_shapers();
-  if (!info(src).cmyk && !info(dst).cmyk && !shapers_.empty()) {
+  const auto shapers_reach = [&] {
+    return shapers_.size() == 1 ? shapers_[0].reaches(dst) : !shapers_.empty() && !shapers_.back().by_steps(dst);
+  };
+  if (!info(src).cmyk && !info(dst).cmyk && shapers_reach()) {
     next.by_shapers = true;
     if (shapers_.size() == 1) {
       shapers_[0].prepare_pair(src, dst);

@@ -54,19 +54,29 @@ MatrixShaper::~MatrixShaper() {
     if (curve != nullptr) cmsFreeToneCurve(curve);
 }
 
-bool MatrixShaper::prepare(const cmsToneCurve* const forward[3], cmsToneCurve* const inverse[3],
-                           const f32 columns[3][3], const f32 offset[3]) {
+bool MatrixShaper::prepare(const cmsToneCurve* const forward[3], cmsToneCurve* const inverse[3], const LinearMap& map) {
   std::copy(inverse, inverse + 3, inverse_curves_);
-  for (int i = 0; i < 3; ++i) {
-    offset_[i] = offset[i];
-    for (int c = 0; c < 3; ++c) columns_[c][i] = columns[c][i];
-  }
   same_light_ = true;
-  for (int i = 0; i < 3; ++i)
-    for (int c = 0; c < 3; ++c)
-      same_light_ = same_light_ && std::fabs(columns[c][i] - (i == c ? 1.0f : 0.0f)) < 2e-6f && offset[i] == 0.0f;
-  ready_ = forward_.prepare(forward) && inverse_.prepare(inverse);
-  return ready_;
+  map_is_exact_ = map.exact;
+  for (int i = 0; i < 3; ++i) {
+    offset_[i] = map.offset[i];
+    for (int c = 0; c < 3; ++c) {
+      columns_[c][i] = map.columns[c][i];
+      product_[c][i] = map.product[i][c];
+      same_light_ =
+          same_light_ && std::fabs(map.columns[c][i] - (i == c ? 1.0f : 0.0f)) < 2e-6f && map.offset[i] == 0.0f;
+    }
+  }
+  return forward_.prepare(forward) && inverse_.prepare(inverse);
+}
+
+void MatrixShaper::prepare_exact_source8() {
+  for (int c = 0; c < 3; ++c) {
+    if (forward_.distinct(c) != c || !linear8_[c].empty()) continue;
+    CurveVector<f32> linear(256);
+    for (u32 v = 0; v < 256; ++v) linear[v] = forward_.exact(c, unit(static_cast<u8>(v)));
+    linear8_[c].swap(linear);
+  }
 }
 
 void MatrixShaper::prepare_source8() {
@@ -86,7 +96,7 @@ void MatrixShaper::prepare_source16() {
   for (int c = 0; c < 3; ++c) {
     if (forward_.distinct(c) != c || !linear16_[c].empty()) continue;
     CurveVector<f32> linear(32769);
-    for (u32 v = 0; v <= 32768; ++v) linear[v] = forward_(c, unit(static_cast<u16>(v)));
+    for (u32 v = 0; v <= 32768; ++v) linear[v] = forward_.exact(c, unit(static_cast<u16>(v)));
     linear16_[c].swap(linear);
   }
 }
@@ -140,7 +150,7 @@ void MatrixShaper::prepare_pair(Layout src, Layout dst) {
       dst == Layout::rgb8 ? prepare_codes<u16, u8>() : prepare_codes<u16, u16>();
     return;
   }
-  if (src == Layout::rgb8) prepare_source8();
+  if (src == Layout::rgb8) by_steps(dst) ? prepare_exact_source8() : prepare_source8();
   if (src == Layout::rgb16) prepare_source16();
   if (dst == Layout::rgb8) prepare_result8();
 }
@@ -189,6 +199,32 @@ struct MatrixShaper::Kernels {
         return matrix(red(clamp_unit(p.red)), green(clamp_unit(p.green)), blue(clamp_unit(p.blue)));
       else
         return matrix(red(p.red), green(p.green), blue(p.blue));
+    }
+  };
+
+  // The road of by_steps(): every rounding is that of lcms.
+  template <class P>
+  struct Exact {
+    using Pixel = P;
+    const MatrixShaper& s;
+    const Wide red = s.product_[0], green = s.product_[1], blue = s.product_[2];
+    const bool clip;
+    const f32* tables[3] = {};
+    Exact(const MatrixShaper& shaper, bool clip_src) : s(shaper), clip(clip_src) {
+      if constexpr (!std::is_same_v<P, ZR_PixelFloat>)
+        for (int c = 0; c < 3; ++c)
+          tables[c] = (sizeof(P) == 4 ? s.linear8_ : s.linear16_)[s.forward_.distinct(c)].data();
+    }
+    f64 linear(int c, Channel<P> v) const {
+      if constexpr (std::is_same_v<P, ZR_PixelFloat>)
+        return s.forward_.exact(c, clip ? clamp_unit(v) : v);
+      else
+        return tables[c][v < Depth<P>::white ? v : Depth<P>::white];
+    }
+    Vector operator()(const Pixel& p) const {
+      const f64 r = linear(0, p.red), g = linear(1, p.green), b = linear(2, p.blue);
+      return __builtin_convertvector(red * Wide{r, r, r, r} + green * Wide{g, g, g, g} + blue * Wide{b, b, b, b},
+                                     Vector);
     }
   };
 
@@ -244,7 +280,7 @@ struct MatrixShaper::Kernels {
   };
 
   template <class Source, class Result>
-  static void loop(const Source source, const Result result, const void* from, void* to, size_t count) {
+  static void loop(const Source& source, const Result& result, const void* from, void* to, size_t count) {
     const auto* src = static_cast<const typename Source::Pixel*>(from);
     auto* dst = static_cast<typename Result::Pixel*>(to);
     for (size_t i = 0; i < count; ++i) result(source(src[i]), dst[i]);
@@ -304,6 +340,11 @@ void MatrixShaper::run(Layout src, bool clip_src, const void* from, Layout dst, 
         K::loop(source, K::Floats<Curve, false>(r, g, b), from, to, count);
     });
   };
+  if (by_steps(dst)) {
+    if (src == Layout::rgb8) return to_result(K::Exact<ZR_Pixel8>(*this, clip_src));
+    if (src == Layout::rgb16) return to_result(K::Exact<ZR_Pixel16>(*this, clip_src));
+    return to_result(K::Exact<ZR_PixelFloat>(*this, clip_src));
+  }
   if (src == Layout::rgb8) return to_result(K::Source8(*this));
   if (src == Layout::rgb16) return to_result(K::Source16(*this));
   K::with_curves(forward_, [&]<class Curve>(const Curve& r, const Curve& g, const Curve& b) {

@@ -5,8 +5,11 @@
 #include <OpenImageIO/imageio.h>
 
 #include <array>
+#include <cstdio>
 #include <cstdlib>
 #include <nlohmann/json.hpp>
+
+#include <jpeglib.h>
 
 #include "image_files.h"
 #include "temporary_folder.h"
@@ -129,6 +132,30 @@ TEST_F(Colour, DisplayCutsOffWhatTheSimulatedDeviceCannotShow) {
   }
 }
 
+// 8 x 8 pixels of one ink; such files hold the absence of ink.
+void write_ink_jpeg(const std::string& file, const u8 (&ink)[4], const std::string& profile) {
+  jpeg_compress_struct state{};
+  jpeg_error_mgr errors{};
+  state.err = jpeg_std_error(&errors);
+  jpeg_create_compress(&state);
+  std::FILE* const stream = std::fopen(file.c_str(), "wb");
+  jpeg_stdio_dest(&state, stream);
+  state.image_width = state.image_height = 8;
+  state.input_components = 4;
+  state.in_color_space = JCS_CMYK;
+  jpeg_set_defaults(&state);
+  jpeg_set_quality(&state, 100, TRUE);
+  jpeg_start_compress(&state, TRUE);
+  jpeg_write_icc_profile(&state, reinterpret_cast<const JOCTET*>(profile.data()),
+                         static_cast<unsigned>(profile.size()));
+  u8 values[32];
+  for (size_t i = 0; i < sizeof values; ++i) values[i] = static_cast<u8>(255 - ink[i % 4]);
+  for (JSAMPROW row = values; state.next_scanline < 8;) jpeg_write_scanlines(&state, &row, 1);
+  jpeg_finish_compress(&state);
+  jpeg_destroy_compress(&state);
+  std::fclose(stream);
+}
+
 TEST_F(Colour, InkComesInThroughItsProfile) {
   const std::string profile = slurp(icc("CGATS001Compat-v2-micro"));
   OIIO::ImageSpec spec(1, 1, 4, OIIO::TypeUInt8);
@@ -140,12 +167,15 @@ TEST_F(Colour, InkComesInThroughItsProfile) {
   const u8 cyan[4] = {255, 0, 0, 0};
   const auto output = OIIO::ImageOutput::create(folder / "ink.tif");
   ASSERT_TRUE(output->open(folder / "ink.tif", spec) && output->write_image(OIIO::TypeUInt8, cyan) && output->close());
-  folder.write("s.json", R"({"size":[1,1],"working_space":"srgb","layers":[{"image":"ink.tif"}]})");
-  ASSERT_EQ(run("render s.json -o s.png"), 0) << err;
-  const std::array<int, 3> got = pixel("s.png");  // printed cyan, not the 0, 255, 255 of a screen
-  EXPECT_LT(got[0], 20);
-  EXPECT_NEAR(got[1], 174, 3);
-  EXPECT_NEAR(got[2], 239, 3);
+  write_ink_jpeg(folder / "ink.jpg", cyan, profile);
+  for (const std::string name : {"ink.tif", "ink.jpg"}) {
+    folder.write("s.json", R"({"size":[1,1],"working_space":"srgb","layers":[{"image":")" + name + R"("}]})");
+    ASSERT_EQ(run("render s.json -o s.png --force"), 0) << err;
+    const std::array<int, 3> got = pixel("s.png");  // printed cyan, not the 0, 255, 255 of a screen
+    EXPECT_LT(got[0], 20) << name;
+    EXPECT_NEAR(got[1], 174, 3) << name;
+    EXPECT_NEAR(got[2], 239, 3) << name;
+  }
 }
 
 }  // namespace
