@@ -48,6 +48,8 @@ void fill_default_slots() {
   set_slot<ZR_Slot_composite_behind_row_premul>(&composite_behind_row_premul);
   set_slot<ZR_Slot_transfer_rect>(&ZR_TransferRect_S);
   set_slot<ZR_Slot_copy_bits_draft>(&ZR_CopyBits_Draft_Static);
+  set_slot<ZR_Slot_copy_bits_hq_straight>(&ZR_CopyBits_HQ_Straight_Static);
+  set_slot<ZR_Slot_copy_bits_hq_premul>(&ZR_CopyBits_HQ_Premul_Static);
   set_slot<ZR_Slot_iterate>(&iterate_body);
   set_slot<ZR_Slot_iterate_origin>(&iterate_origin_body);
   set_slot<ZR_Slot_iterate_lut>(&iterate_lut_body);
