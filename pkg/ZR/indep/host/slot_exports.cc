@@ -87,4 +87,12 @@ i32 ZR_CopyBits_HQ_Premul(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_
   return call_slot<ZR_Slot_copy_bits_hq_premul>(progress, src, dst, src_rect, dst_rect);
 }
 
+i32 ZR_AreaSample_Straight(const ZR_ProgressInfo* progress, i32 x, i32 y, const ZR_SampPB* params, ZR_Pixel8* dst) {
+  return call_slot<ZR_Slot_area_straight8>(progress, x, y, params, dst);
+}
+
+i32 ZR_AreaSample_Straight16(const ZR_ProgressInfo* progress, i32 x, i32 y, const ZR_SampPB* params, ZR_Pixel16* dst) {
+  return call_slot<ZR_Slot_area_straight16>(progress, x, y, params, dst);
+}
+
 }  // extern "C"
