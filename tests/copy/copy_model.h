@@ -137,10 +137,8 @@ class Rects {
       case 3: return GX_LRect{-between(0, 70000), -between(0, 70000), between(1, 70000), between(1, 70000)};
       default: break;
     }
-    GX_LRect r = {between(-6, size.width + 1), between(-6, size.height + 1), 0, 0};
-    r.right = r.left + between(0, 15), r.bottom = r.top + between(0, 15);
-    if (between(0, 9) == 0) std::swap(r.left, r.right);
-    if (between(0, 9) == 0) std::swap(r.top, r.bottom);
+    GX_LRect r = {between(-5, size.width), between(-5, size.height), 0, 0};
+    r.right = r.left + between(-3, 15), r.bottom = r.top + between(-3, 15);
     return r;
   }
 
