@@ -4,6 +4,7 @@
 #include "composite/composite_rect.h"
 #include "composite/ground_rows.h"
 #include "composite/transfer_rect.h"
+#include "copy/transform_rows.h"
 #include "iterate/iterate.h"
 #include "world/effect_world.h"
 #include "world/premul_rows.h"
@@ -15,11 +16,13 @@ namespace {
 // Slots 47 and 48 have no caller in the library; a module that takes them calls something that does nothing.
 i32 do_nothing(void*, void*) { return ZR_Err_None; }
 
-// The slots that exist once for each depth: 17 to 19, 35 to 41, 72 to 78, 94 to 112.
+// The slots that exist once for each depth: 17 to 19, 35 to 41, 72 to 78, 94 to 112,
+// 115 to 117.
 template <class T>
 void fill_slots_of_depth() {
   using S = DepthSlots<T>;
   set_slot<S::transfer_rows>(&transfer_rows<T>);
+  set_slot<S::transform_rows>(&transform_rows<T>);
   set_slot<S::premul>(&premul_row<T>);
   set_slot<S::unmul>(&unmul_row<T>);
   set_slot<S::white_fade>(&white_fade_row<T>);
@@ -45,6 +48,7 @@ void fill_default_slots() {
   set_slot<ZR_Slot_composite_behind_row_straight>(&composite_behind_row_straight);
   set_slot<ZR_Slot_composite_behind_row_premul>(&composite_behind_row_premul);
   set_slot<ZR_Slot_transfer_rect>(&ZR_TransferRect_S);
+  set_slot<ZR_Slot_transform_world>(&ZR_TransformWorld_S);
   set_slot<ZR_Slot_iterate>(&iterate_body);
   set_slot<ZR_Slot_iterate_origin>(&iterate_origin_body);
   set_slot<ZR_Slot_iterate_lut>(&iterate_lut_body);
