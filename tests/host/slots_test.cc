@@ -13,7 +13,8 @@ struct Range {
   int first, last;
 };
 // Slots with a routine; every other one is null.
-constexpr Range filled[] = {{7, 10}, {17, 22}, {31, 31}, {35, 48}, {51, 53}, {72, 78}, {94, 112}};
+constexpr Range filled[] = {{2, 10},  {17, 22}, {31, 31}, {35, 48}, {51, 53}, {57, 58}, {60, 61},
+                            {63, 65}, {68, 68}, {70, 78}, {83, 84}, {86, 87}, {94, 112}};
 
 using Slots = BornLibrary;
 

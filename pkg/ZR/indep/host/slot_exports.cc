@@ -70,4 +70,12 @@ i32 ZR_PremulRect(const ZR_ProgressInfo* progress, i32 forward, const GX_LRect* 
   return call_slot<ZR_Slot_premul_rect>(progress, forward, rect, dst);
 }
 
+i32 ZR_AreaSample_Straight(const ZR_ProgressInfo* progress, i32 x, i32 y, const ZR_SampPB* params, ZR_Pixel8* dst) {
+  return call_slot<ZR_Slot_area_straight8>(progress, x, y, params, dst);
+}
+
+i32 ZR_AreaSample_Straight16(const ZR_ProgressInfo* progress, i32 x, i32 y, const ZR_SampPB* params, ZR_Pixel16* dst) {
+  return call_slot<ZR_Slot_area_straight16>(progress, x, y, params, dst);
+}
+
 }  // extern "C"
