@@ -54,6 +54,7 @@ enum ZR_CallSite : u32 {
   ZR_Site_ColourSettings = 0x85,
   ZR_Site_ColourTransform = 0x86,
   ZR_Site_DepthConvert = 0x87,
+  ZR_Site_TransformWorld = 0x88,
   ZR_Site_UnknownDepth = 0x3e7,
 };
 
