@@ -12,8 +12,8 @@
 namespace zr::tool {
 namespace {
 
-constexpr const Command* kCommands[] = {&kRenderCommand, &kConvertCommand, &kDisplayCommand,
-                                        &kInfoCommand,   &kGalleryCommand, &kListCommand};
+constexpr const Command* kCommands[] = {&kRenderCommand,  &kSheetCommand, &kTransformCommand, &kConvertCommand,
+                                        &kDisplayCommand, &kInfoCommand,  &kGalleryCommand,   &kListCommand};
 constexpr const char* kVersion = "zr " ZR_TOOL_VERSION;
 
 std::string exit_code_help() {
@@ -47,6 +47,7 @@ class Parser {
     app_.footer(
         "Examples:\n"
         "  zr render examples/scenes/demo.json -o out/frame.####.png\n"
+        "  zr sheet out/frame.*.png -o out/sheet.png\n"
         "  zr help render\n"
         "  zr list modes\n\n" +
         exit_code_help());
