@@ -221,7 +221,7 @@ class TransformModel {
       const GX_LPoint p = k < exit ? ahead(k) : back_from_end(k);
       if (draft) {
         taken.push_back(nearest(p));
-      } else if (k > entry && k < exit && unit(front) && unit(back)) {
+      } else if (k > entry && k < exit && !front.shrinks() && unit(front) && unit(back)) {
         f64 weights[4];
         ZR_SubpixelSampleComputeWeight(static_cast<u16>(p.x), static_cast<u16>(p.y), weights);
         ZR_SampPB params{};
