@@ -100,7 +100,7 @@ OwnedWorld with_border(OwnedWorld& picture) {
 // In bands of rows on the host's threads. A band is a world of its own, of which the whole result reaches out
 // above and below: so every band samples where the result in one piece would.
 void sample_bands(OwnedWorld& from, const GX_LRect& in, OwnedWorld& to) {
-  constexpr i32 band_rows = 64;
+  static constexpr i32 band_rows = 64;
   struct Work {
     OwnedWorld &from, &to;
     const GX_LRect& in;
