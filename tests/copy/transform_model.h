@@ -34,7 +34,7 @@ struct TransformCall {
   }
 };
 
-inline i32 fixed_point(f64 v) { return static_cast<i32>(65536 * v + (v < 0 ? -0.5 : 0.5)); }
+inline i32 fixed_point(f64 v) { return zr::truncate_i32(65536 * v + (v < 0 ? -0.5 : 0.5)); }
 inline f64 limited(f64 v) { return std::fmin(std::fmax(v, -32767), 32766); }
 
 // One matrix, both ways.
