@@ -27,7 +27,9 @@ class Dice {
   f64 real(f64 low, f64 high) { return low + (high - low) * static_cast<f64>(random_()) / 4294967296.0; }
   GX_Matrix3 matrix() {
     const GX_Matrix3 away = moved(real(-9, 9), real(-9, 9));
-    switch (whole(0, 11)) {
+    switch (whole(0, 12)) {
+      case 12:
+        return product(scaled(whole(12, 40), -whole(20, 40)), moved(-real(20, 90), real(60, 90)));  // all covered
       case 0: return moved(whole(-9, 9), whole(-9, 9));
       case 1: return away;
       case 2: return product(scaled(real(0.1, 1), real(0.1, 1)), away);
@@ -46,21 +48,20 @@ class Dice {
       return product(product(product(turned(angle), scaled(size, size)), start), moved(x, y));
     };
     std::vector<GX_Matrix3> list = {start};
-    const f64 x = real(-8, 8), y = whole(-8, 8);
+    const f64 x = real(-3, 3), y = whole(-3, 3), drift = whole(0, 1) == 0 ? 0 : real(0, 0.2);
     const i32 count = whole(3, 7);
     switch (whole(0, 7)) {
       case 0: return {start, start};
       case 1: return {start, later(x, y, 0, 1)};
       case 2: return {start, later(x, y, real(-1, 1), real(0.5, 2))};
-      case 3:  // a straight line of many
-        for (i32 i = 1; i < count; ++i) list.push_back(later(x * i, y * i, 0, 1));
+      case 3:  // a line of even pace, or nearly
+      case 4:
+        for (i32 i = 1; i < count; ++i) list.push_back(later(x * i + drift * i * (i - 1), y * i, 0, 1));
+        if (whole(0, 2) == 0) list[1].m[0][0] = list[1].m[1][0] = list[1].m[2][0] = 0;  // singular, in its place
+        if (whole(0, 2) == 0) list.back().m[0][2] += real(0.6, 1.4);
         return list;
-      case 4:  // turning
+      case 5:
         for (i32 i = 1; i < count; ++i) list.push_back(later(x * i, y, 0.1 * i, 1 - 0.05 * i));
-        return list;
-      case 5:  // of uneven pace, with a gap
-        for (i32 i = 1; i < count; ++i) list.push_back(later(x * i * i, y, 0, 1));
-        list[1] = scaled(0, 1);
         return list;
       default: return list;
     }
