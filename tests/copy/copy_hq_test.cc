@@ -54,6 +54,12 @@ void model(TestWorld<T>& src, const GX_LRect& s, const GX_LRect& d, bool premul,
 }
 
 template <class T>
+bool touches(const GX_LRect& r, const TestWorld<T>& world) {
+  return r.left != r.right && r.top != r.bottom && r.left < world.width() && r.top < world.height() && r.right >= 1 &&
+         r.bottom >= 1;
+}
+
+template <class T>
 class HighQualityCopy : public BornLibrary {};
 using Depths = testing::Types<ZR_Pixel8, ZR_Pixel16, ZR_PixelFloat>;
 TYPED_TEST_SUITE(HighQualityCopy, Depths);
@@ -70,25 +76,18 @@ TYPED_TEST(HighQualityCopy, RandomRectangles) {
     if (round % 10 == 0) to = from;
     const GX_LRect s = from.value_or(GX_LRect{0, 0, src.width(), src.height()});
     const GX_LRect d = to.value_or(GX_LRect{0, 0, dst.width(), dst.height()});
-    const auto misses = [](const GX_LRect& r, const TestWorld<T>& w) {
-      return r.left == r.right || r.top == r.bottom || r.left >= w.width() || r.top >= w.height() || r.right < 1 ||
-             r.bottom < 1;
+    const auto extents = [](const GX_LRect& r) {
+      return std::pair(u32(r.right) - u32(r.left), u32(r.bottom) - u32(r.top));
     };
-    const i64 dw = i64{s.right} - s.left - d.right + d.left, dh = i64{s.bottom} - s.top - d.bottom + d.top;
-    const bool unscaled = dw % (i64{1} << 32) == 0 && dh % (i64{1} << 32) == 0;
+    const bool whole = src.width() == dst.width() && src.height() == dst.height() &&
+                       std::memcmp(&s, &d, sizeof s) == 0 && s.left == 0 && s.top == 0 && s.right == dst.width() &&
+                       s.bottom == dst.height();
     TestWorld<T> expected = dst;
     i32 code = 0;
-    if (unscaled && !premul) {
+    if (whole || (!premul && extents(s) == extents(d)))  // nothing to scale
       code = ZR_CopyBits_Draft(nullptr, src, expected, address(from), address(to));
-    } else if (!misses(s, src) && !misses(d, dst)) {
-      const GX_LRect all = {0, 0, dst.width(), dst.height()};
-      const bool whole = std::memcmp(&s, &all, sizeof s) == 0 && std::memcmp(&d, &all, sizeof d) == 0 &&
-                         src.width() == dst.width() && src.height() == dst.height();
-      if (whole)
-        ZR_CopyBits_Draft(nullptr, src, expected, nullptr, nullptr);
-      else
-        model(src, s, d, premul, expected);
-    }
+    else if (touches(s, src) && touches(d, dst))
+      model(src, s, d, premul, expected);
     const auto copy = premul ? &ZR_CopyBits_HQ_Premul : &ZR_CopyBits_HQ_Straight;
     ASSERT_EQ(copy(nullptr, src, dst, address(from), address(to)), code);
     ASSERT_TRUE(dst == expected && dst.guards_intact() && src.guards_intact())
@@ -115,34 +114,29 @@ TEST_F(BornLibrary, HighQualityCopyOfLongRows) {
     }
 }
 
-TEST_F(BornLibrary, HighQualityCopyTakesTheSamplersOfTheSlots) {
-  static i32 calls;
-  const auto counting = [](const ZR_ProgressInfo*, i32, i32, const ZR_SampPB*, void*) -> i32 { return ++calls, 0; };
-  const auto routine = reinterpret_cast<void*>(+counting);
-  const struct {
-    ZR_SlotIndex slot;
-    decltype(&ZR_CopyBits_Draft) copy;
-    i32 depth, dst_width, dst_height;  // from 4 x 4 pixels
-  } rows[] = {{ZR_Slot_bilinear_straight8, &ZR_CopyBits_HQ_Straight, 8, 5, 5},
-              {ZR_Slot_area_straight8, &ZR_CopyBits_HQ_Straight, 8, 5, 3},
-              {ZR_Slot_bilinear_straight16, &ZR_CopyBits_HQ_Straight, 16, 4, 5},
-              {ZR_Slot_area_straight16, &ZR_CopyBits_HQ_Straight, 16, 3, 9},
-              {ZR_Slot_bilinear_premul8, &ZR_CopyBits_HQ_Premul, 8, 4, 5},
-              {ZR_Slot_area_premul8, &ZR_CopyBits_HQ_Premul, 8, 3, 4}};
-  for (const auto& row : rows) {
-    TestWorld<ZR_Pixel8> src8(4, 4), dst8(row.dst_width, row.dst_height);
-    TestWorld<ZR_Pixel16> src16(4, 4), dst16(row.dst_width, row.dst_height);
-    ZR_LayerDef* const src = row.depth == 8 ? src8.layer() : src16.layer();
-    ZR_LayerDef* const dst = row.depth == 8 ? dst8.layer() : dst16.layer();
-    calls = 0;
-    {
-      const SlotOverride here(row.slot, routine);
-      EXPECT_EQ(row.copy(nullptr, src, dst, nullptr, nullptr), 0);
-    }
-    EXPECT_EQ(calls, row.dst_width * row.dst_height) << "slot " << row.slot;
-    const SlotOverride empty(row.slot, nullptr);
-    EXPECT_EQ(row.copy(nullptr, src, dst, nullptr, nullptr), 3) << "slot " << row.slot;
+template <class T>
+i32 blue_sampler(const ZR_ProgressInfo*, i32, i32, const ZR_SampPB*, T* dst) {
+  return *dst = {1, 0, 0, 1}, 0;
+}
+
+template <class T>
+void takes_sampler(ZR_SlotIndex slot, decltype(&ZR_CopyBits_Draft) copy, i32 width, i32 height) {
+  TestWorld<T> src(4, 4), dst(width, height), blue(width, height);
+  blue.fill({1, 0, 0, 1});
+  for (const auto routine : {&blue_sampler<T>, static_cast<decltype(&blue_sampler<T>)>(nullptr)}) {
+    const SlotOverride here(slot, reinterpret_cast<void*>(routine));
+    EXPECT_EQ(copy(nullptr, src, dst, nullptr, nullptr), routine != nullptr ? 0 : 3) << "slot " << slot;
+    EXPECT_TRUE(dst == blue) << "slot " << slot;
   }
+}
+
+TEST_F(BornLibrary, HighQualityCopyTakesTheSamplersOfTheSlots) {
+  takes_sampler<ZR_Pixel8>(ZR_Slot_bilinear_straight8, &ZR_CopyBits_HQ_Straight, 5, 5);
+  takes_sampler<ZR_Pixel8>(ZR_Slot_area_straight8, &ZR_CopyBits_HQ_Straight, 5, 3);
+  takes_sampler<ZR_Pixel16>(ZR_Slot_bilinear_straight16, &ZR_CopyBits_HQ_Straight, 4, 5);
+  takes_sampler<ZR_Pixel16>(ZR_Slot_area_straight16, &ZR_CopyBits_HQ_Straight, 3, 9);
+  takes_sampler<ZR_Pixel8>(ZR_Slot_bilinear_premul8, &ZR_CopyBits_HQ_Premul, 4, 5);
+  takes_sampler<ZR_Pixel8>(ZR_Slot_area_premul8, &ZR_CopyBits_HQ_Premul, 3, 4);
 }
 
 TEST_F(BornLibrary, CopiesRefuseWithTheirTexts) {
@@ -156,55 +150,52 @@ TEST_F(BornLibrary, CopiesRefuseWithTheirTexts) {
   ASSERT_EQ(ZR_NewChunk(4, 4, 2, bytes, &wide), 0);
   unlocked = chunk, unlocked.data = nullptr;
   const GX_Matrix3 unit = {{{1, 0, 0}, {0, 1, 0}, {0, 0, 1}}};
-  const auto bits = [](decltype(&ZR_CopyBits_Draft) copy, ZR_LayerDef* from, ZR_LayerDef* to) {
-    return [=] { return copy(nullptr, from, to, nullptr, nullptr); };
+  const auto draft = [](ZR_LayerDef* from, ZR_LayerDef* to) {
+    return ZR_CopyBits_Draft(nullptr, from, to, nullptr, nullptr);
+  };
+  const auto straight = [](ZR_LayerDef* from, ZR_LayerDef* to) {
+    return ZR_CopyBits_HQ_Straight(nullptr, from, to, nullptr, nullptr);
+  };
+  const auto premul = [](ZR_LayerDef* from, ZR_LayerDef* to) {
+    return ZR_CopyBits_HQ_Premul(nullptr, from, to, nullptr, nullptr);
   };
   const auto channels = [](ZR_Chunk* from, ZR_Chunk* to) {
-    return [=] { return ZR_ChannelCopy(nullptr, from, to, nullptr, nullptr); };
+    return ZR_ChannelCopy(nullptr, from, to, nullptr, nullptr);
   };
   const auto matrix = [](ZR_LayerDef* from, const GX_Matrix3* by, ZR_LayerDef* to) {
-    return [=] { return ZR_CopyBits3_LO_Straight(nullptr, from, by, true, nullptr, to); };
+    return ZR_CopyBits3_LO_Straight(nullptr, from, by, true, nullptr, to);
   };
-  constexpr u32 verification = 0;
-  constexpr const char* depths = "ZR_CopyBits_HQ_Straight_Static requires src and dst worlds to have same bit depth";
-  const struct {
-    const char* name;
-    u32 site;  // of the message about a bad parameter; verification: another text
-    const char* text;
-    std::function<i32()> call;
-  } rows[] = {
-      {"draft, no source", 48, "", bits(&ZR_CopyBits_Draft, nullptr, small)},
-      {"draft, no destination", 48, "", bits(&ZR_CopyBits_Draft_Static, src, nullptr)},
-      {"draft, bare source", 48, "", bits(&ZR_CopyBits_Draft, &bare, small)},
-      {"draft, bare destination", 48, "", bits(&ZR_CopyBits_Draft, src, &bare_small)},
-      {"straight, no source", 49, "", bits(&ZR_CopyBits_HQ_Straight, nullptr, small)},
-      {"straight, bare source, scaled", 49, "", bits(&ZR_CopyBits_HQ_Straight, &bare, small)},
-      {"straight, bare destination, unscaled", 49, "", bits(&ZR_CopyBits_HQ_Straight_Static, deep, &bare)},
-      {"straight, depths", verification, depths, bits(&ZR_CopyBits_HQ_Straight, src, small_deep)},
-      {"straight, depths before pixels", verification, depths, bits(&ZR_CopyBits_HQ_Straight, deep, &bare_small)},
-      {"premul, no destination", 50, "", bits(&ZR_CopyBits_HQ_Premul, src, nullptr)},
-      {"premul, bare source", 50, "", bits(&ZR_CopyBits_HQ_Premul_Static, &bare, small)},
-      {"chunks, none", 72, "", channels(nullptr, &chunk)},
-      {"chunks, unlocked", 72, "", channels(&chunk, &unlocked)},
-      {"chunks, pixel sizes", 72, "", channels(&chunk, &wide)},
-      {"matrix, bare source", 101, "", matrix(&bare, &unit, small)},
-      {"matrix, no matrix", 101, "", matrix(src, nullptr, small)},
-      {"matrix, no destination", 101, "", matrix(src, &unit, nullptr)},
-      {"frames, none", 48, "", [] { return ZR_WorldCopy(nullptr, nullptr, nullptr, nullptr, nullptr); }},
-  };
-  for (const auto& row : rows) {
+  // The code, and the number of the place that reports a bad parameter; 0: the texts about depths.
+  const auto refused = [&](i32 code, u32 site, int line = __builtin_LINE()) {
+    const auto& reports = site != 0 ? caught.messages() : caught.verifications();
+    const std::string text = site != 0
+                                 ? "bad parameter passed to effect callback"
+                                 : "ZR_CopyBits_HQ_Straight_Static requires src and dst worlds to have same bit depth";
+    const bool as_told = code == 3 && reports.size() == 1 && reports[0].text == text &&
+                         (site == 0 || reports[0].code == (0x250000 | site)) &&
+                         caught.messages().size() + caught.verifications().size() == 1;
+    EXPECT_TRUE(as_told) << "line " << line << " code " << code;
     caught.clear();
-    EXPECT_EQ(row.call(), 3) << row.name;
-    const bool by_message = row.site != verification;
-    const auto& reports = by_message ? caught.messages() : caught.verifications();
-    ASSERT_EQ(reports.size(), 1u) << row.name;
-    EXPECT_EQ(caught.messages().size() + caught.verifications().size(), 1u) << row.name;
-    if (by_message) {
-      EXPECT_EQ(reports[0].code, 0x250000 | row.site) << row.name;
-    }
-    EXPECT_EQ(reports[0].text, by_message ? "bad parameter passed to effect callback" : row.text) << row.name;
-  }
-  EXPECT_EQ(bits(&ZR_CopyBits_HQ_Straight, src, deep)(), 0) << "one size needs no one depth";
+  };
+  refused(draft(nullptr, small), 48);
+  refused(draft(src, nullptr), 48);
+  refused(draft(&bare, small), 48);
+  refused(draft(src, &bare_small), 48);
+  refused(ZR_WorldCopy(nullptr, nullptr, nullptr, nullptr, nullptr), 48);
+  refused(straight(nullptr, small), 49);
+  refused(straight(&bare, small), 49);
+  refused(straight(deep, &bare), 49);  // sizes agree, so depths need not
+  refused(straight(src, small_deep), 0);
+  refused(straight(deep, &bare_small), 0);  // depths come before pixels
+  refused(premul(src, nullptr), 50);
+  refused(premul(&bare, small), 50);
+  refused(channels(nullptr, &chunk), 72);
+  refused(channels(&chunk, &unlocked), 72);
+  refused(channels(&chunk, &wide), 72);
+  refused(matrix(&bare, &unit, small), 101);
+  refused(matrix(src, nullptr, small), 101);
+  refused(matrix(src, &unit, nullptr), 101);
+  EXPECT_EQ(straight(src, deep), 0);
   EXPECT_EQ(ZR_DisposeChunk(&chunk), 0);
   EXPECT_EQ(ZR_DisposeChunk(&wide), 0);
 }
