@@ -53,7 +53,6 @@ void check(const Row& row, bool src2dst, const GX_LRect* clip, CaughtMessages& c
   const GX_LRect all = {0, 0, 12, 10};
   GX_LRect area = all;
   if (clip != nullptr) GX_SectLRect(&all, clip, &area);
-  i32 doubtful = 0;
   for (i32 y = 0; y < 10; ++y)
     for (i32 x = 0; x < 12; ++x) {
       const bool clipped = x < area.left || x >= area.right || y < area.top || y >= area.bottom;
@@ -64,28 +63,15 @@ void check(const Row& row, bool src2dst, const GX_LRect* clip, CaughtMessages& c
         return inverse.m[i][0] * (x + 0.5) + inverse.m[i][1] * (y + 0.5) + inverse.m[i][2];
       };
       const f64 sx = position(0), sy = position(1);  // pixel n is seen from n up to n + 1
-      constexpr f64 rounding = 12 * 2.0 / 65536;
-      const auto near_edge = [&](f64 v) { return std::abs(v - std::round(v)) < rounding; };
-      if (near_edge(sx) || near_edge(sy)) {
-        ++doubtful;
-        out = dst.at(x, y);  // either side will do: taken over below
-      } else if (sx >= 0 && sx < 8 && sy >= 0 && sy < 7) {
+      if (sx >= 0 && sx < 8 && sy >= 0 && sy < 7)
         out = copy_model::convert<To>(src.at(static_cast<i32>(sx), static_cast<i32>(sy)));
-      }
     }
-  const GX_Matrix3& given = src2dst ? row.forward : inverse;
-  ASSERT_EQ(ZR_CopyBits3_LO_Straight(nullptr, src, src2dst || row.result != Row::drawn ? &row.forward : &given,
-                                     src2dst || row.result != Row::drawn, clip, dst),
-            0)
-      << row.name;
-  ASSERT_TRUE(dst.guards_intact()) << row.name;
-  ASSERT_TRUE(caught.quiet()) << row.name;
-  if (row.result == Row::anything) return;
-  ASSERT_LT(doubtful, 2) << row.name;
-  i32 wrong = 0;
-  for (i32 y = 0; y < 10; ++y)
-    for (i32 x = 0; x < 12; ++x) wrong += std::memcmp(&dst.at(x, y), &expected.at(x, y), sizeof(To)) != 0;
-  ASSERT_LE(wrong, doubtful) << row.name << (src2dst ? " forward" : " inverse") << (clip != nullptr ? " clipped" : "");
+  // What cannot be inverted is given as it is in both directions.
+  const GX_Matrix3& given = src2dst || row.result != Row::drawn ? row.forward : inverse;
+  ASSERT_EQ(ZR_CopyBits3_LO_Straight(nullptr, src, &given, src2dst || row.result == Row::cleared, clip, dst), 0);
+  ASSERT_TRUE(dst.guards_intact() && caught.quiet()) << row.name;
+  ASSERT_TRUE(dst == expected || row.result == Row::anything)
+      << row.name << (src2dst ? " forward" : " inverse") << (clip != nullptr ? " clipped" : "");
 }
 
 TEST_F(BornLibrary, MatrixCopy) {
@@ -93,15 +79,14 @@ TEST_F(BornLibrary, MatrixCopy) {
   for (const Row& row : rows)
     for (const bool src2dst : {true, false})
       for (const GX_LRect* clip : {static_cast<const GX_LRect*>(nullptr), &full_rows, &part, &empty, &outside}) {
-        check<ZR_Pixel8, ZR_Pixel8>(row, src2dst, clip, caught);
-        check<ZR_Pixel8, ZR_Pixel16>(row, src2dst, clip, caught);
-        check<ZR_Pixel8, ZR_PixelFloat>(row, src2dst, clip, caught);
-        check<ZR_Pixel16, ZR_Pixel8>(row, src2dst, clip, caught);
-        check<ZR_Pixel16, ZR_Pixel16>(row, src2dst, clip, caught);
-        check<ZR_Pixel16, ZR_PixelFloat>(row, src2dst, clip, caught);
-        check<ZR_PixelFloat, ZR_Pixel8>(row, src2dst, clip, caught);
-        check<ZR_PixelFloat, ZR_Pixel16>(row, src2dst, clip, caught);
-        check<ZR_PixelFloat, ZR_PixelFloat>(row, src2dst, clip, caught);
+        const auto from = [&]<class From>() {
+          check<ZR_Pixel8, From>(row, src2dst, clip, caught);
+          check<ZR_Pixel16, From>(row, src2dst, clip, caught);
+          check<ZR_PixelFloat, From>(row, src2dst, clip, caught);
+        };
+        from.template operator()<ZR_Pixel8>();
+        from.template operator()<ZR_Pixel16>();
+        from.template operator()<ZR_PixelFloat>();
       }
 }
 
