@@ -37,7 +37,7 @@ Sampler<T> sampler(bool area, bool premul) {
 // Samples every pixel of the destination rectangle by itself.
 template <class T>
 void model(TestWorld<T>& src, const GX_LRect& s, const GX_LRect& d, bool premul, TestWorld<T>& out) {
-  const i32 dw = static_cast<i16>(d.right - d.left), dh = static_cast<i16>(d.bottom - d.top);
+  const i32 dw = static_cast<i16>(i64{d.right} - d.left), dh = static_cast<i16>(i64{d.bottom} - d.top);
   if (dw == 0 || dh == 0) return;
   const i32 xs = wrapped((i64{s.right} - s.left) * 65536) / dw, ys = wrapped((i64{s.bottom} - s.top) * 65536) / dh;
   ZR_SampPB params = {};
