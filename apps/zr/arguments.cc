@@ -12,7 +12,8 @@
 namespace zr::tool {
 namespace {
 
-constexpr const Command* kCommands[] = {&kRenderCommand, &kConvertCommand, &kDisplayCommand,
+constexpr const Command* kCommands[] = {&kRenderCommand, &kSheetCommand,   &kTransformCommand,
+                                        &kResizeCommand, &kConvertCommand, &kDisplayCommand,
                                         &kInfoCommand,   &kGalleryCommand, &kListCommand};
 constexpr const char* kVersion = "zr " ZR_TOOL_VERSION;
 
@@ -47,6 +48,7 @@ class Parser {
     app_.footer(
         "Examples:\n"
         "  zr render examples/scenes/demo.json -o out/frame.####.png\n"
+        "  zr sheet out/frame.*.png -o out/sheet.png\n"
         "  zr help render\n"
         "  zr list modes\n\n" +
         exit_code_help());

@@ -22,7 +22,7 @@ namespace zr::tool {
 namespace {
 
 struct RenderOptions {
-  std::string scene, output, frames, depth, exr = "float", memory, progress = "auto";
+  std::string scene, output, frames, depth, field, exr = "float", memory, progress = "auto";
   int threads = 0;
   bool force = false, stats = false;
 };
@@ -49,7 +49,7 @@ constexpr const char* kFooter =
     "  16-bit files and the 0..32768 of the composite: v * 65535 / 32768, rounded, and back; white\n"
     "  stays white and every value of the composite survives the way out and in again.\n"
     "  Colour under alpha 0 is kept in PNG and TIFF; in OpenEXR it becomes 0.\n"
-    "  Layers stand on whole pixels: positions are rounded.";
+    "  A layer that is moved by whole pixels and not turned is copied as it is, in every quality.";
 
 class Stopwatch {
  public:
@@ -62,6 +62,8 @@ class Stopwatch {
 struct Timings {
   f64 load = 0, draw = 0, write = 0;
 };
+
+i32 parse_field(const std::string& name) { return name == "upper" ? 1 : name == "lower" ? 2 : 0; }
 
 ProgressMode progress_mode(const std::string& name) {
   return name == "json" ? ProgressMode::kJson : name == "off" ? ProgressMode::kOff : ProgressMode::kAuto;
@@ -110,6 +112,7 @@ void render(const RenderOptions& options) {
   Scene scene = read_scene(options.scene);
   if (!options.frames.empty()) scene.frames = parse_frame_range(options.frames, "render: --frames");
   if (!options.depth.empty()) scene.depth = parse_depth(options.depth, "render: --depth");
+  if (!options.field.empty()) scene.field = parse_field(options.field);
   require_depth(format, scene.depth, options.output);
   names.require_for(scene.frames);
 
@@ -159,6 +162,10 @@ Run declare(CLI::App& verb) {
       ->type_name("RANGE");
   verb.add_option("--depth", options->depth, "Channels of the composite and of the file (default: the scene's)")
       ->type_name("8|16|float");
+  verb.add_option("--field", options->field,
+                  "Draw only rows 0, 2, 4.. (upper) or 1, 3, 5.. (lower) of the frames (default: the scene's)")
+      ->check(CLI::IsMember({"none", "upper", "lower"}).description(""))
+      ->type_name("none|upper|lower");
   verb.add_option("--exr", options->exr, "Channels of OpenEXR files; half holds up to 65504")
       ->check(CLI::IsMember({"float", "half"}).description(""))
       ->type_name("float|half")

@@ -19,7 +19,8 @@ struct Command {
   Run (*declare)(CLI::App& verb);  // adds options and help; the result runs after the line is parsed
 };
 
-extern const Command kRenderCommand, kListCommand, kGalleryCommand, kConvertCommand, kDisplayCommand, kInfoCommand;
+extern const Command kRenderCommand, kListCommand, kGalleryCommand, kConvertCommand, kDisplayCommand, kInfoCommand,
+    kSheetCommand, kTransformCommand, kResizeCommand;
 
 std::span<const Command* const> all_commands();
 // Help that belongs to no verb: {name, text}.

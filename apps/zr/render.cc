@@ -1,10 +1,11 @@
-// Draws the frames of a scene through the library's transfer rectangle.
+// Draws the frames of a scene through the library's layer transform.
 #include "render.h"
 
 #include <ZR/linear_tables.h>
+#include <ZR/transfer_mode.h>
+#include <ZR/transform_world.h>
 
 #include <algorithm>
-#include <cmath>
 #include <set>
 
 #include "image_files.h"
@@ -18,13 +19,18 @@ u64 world_bytes(i32 width, i32 height, i32 depth) {
   return static_cast<u64>(width) * static_cast<u64>(height) * static_cast<u64>(depth / 2);
 }
 
-// Halves go up, on both sides of 0: a steady move stays steady.
-GX_LPoint whole_pixels(const Point& point) {
-  return {static_cast<i32>(std::floor(point.x + 0.5)), static_cast<i32>(std::floor(point.y + 0.5))};
-}
-
 void fill(OwnedWorld& world, const ZR_PixelFloat& colour, const std::string& what) {
   check(ZR_FillFloat(nullptr, &colour, nullptr, world.layer()), what);
+}
+
+// The whole sequence of matrices goes into one call, which makes the motion blur.
+void transform(OwnedWorld& source, const std::vector<GX_Matrix3>& matrices, i32 quality, i32 field,
+               const ZR_CompositeModePlus& mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
+               OwnedWorld& target, const std::string& what) {
+  const GX_LRect all = target.bounds();
+  check(ZR_TransformWorld(&abort_on_interrupt(), quality, 0, field, source.layer(), &mode, tables, mask,
+                          matrices.data(), static_cast<i32>(matrices.size()), true, &all, target.layer()),
+        what);
 }
 
 }  // namespace
@@ -44,6 +50,9 @@ std::vector<SceneImage> images_of(const Scene& scene) {
 
 u64 memory_needed(const Scene& scene) {
   u64 worlds = world_bytes(scene.width, scene.height, scene.depth), decoding = 0;
+  const bool mattes =
+      std::any_of(scene.layers.begin(), scene.layers.end(), [](const Layer& layer) { return layer.matte.has_value(); });
+  if (mattes) worlds *= 2;  // one to draw mattes in
   for (const Layer& layer : scene.layers)
     if (layer.image.empty()) worlds += world_bytes(layer.width, layer.height, scene.depth);
   for (const SceneImage& image : images_of(scene)) {
@@ -100,22 +109,36 @@ OwnedWorld Renderer::load(const SceneImage& image) const {
                         PRISMA_Intent_RelativeColorimetric, image.file, image.where);
 }
 
+// Where no matrix is needed the mask is the image itself, else the image drawn into a world of the frame's size.
+ZR_MaskWorld Renderer::matte_of(const Layer& layer, i32 frame) {
+  const TrackMatte& matte = *layer.matte;
+  OwnedWorld& image = images_.at(matte.image);
+  const std::vector<GX_Matrix3> matrices = matte.placement.matrices_of(frame);
+  ZR_MaskWorld mask;
+  mask.kind = matte.kind;
+  if (matrices.size() == 1 && moves_whole_pixels(matrices[0])) {
+    mask.world = *image.layer();
+    mask.offset_x = static_cast<i32>(matrices[0].m[0][2]);
+    mask.offset_y = static_cast<i32>(matrices[0].m[1][2]);
+    return mask;
+  }
+  if (!matte_) matte_.emplace(scene_.width, scene_.height, scene_.depth);
+  fill(*matte_, {0, 0, 0, 0}, layer.place + ".matte");
+  transform(image, matrices, matte.placement.quality, 0, ZR_CompositeModePlus(XferCopy, 1.0f, nullptr, false, 0),
+            nullptr, nullptr, *matte_, layer.place + ".matte");
+  mask.world = *matte_->layer();
+  mask.offset_x = mask.offset_y = 0;
+  return mask;
+}
+
 void Renderer::composite(const Layer& layer, OwnedWorld& source, i32 frame) {
+  if (scene_.field != 0 && layer.field != 0 && scene_.field != layer.field) return;  // no row is left
   const ZR_CompositeModePlus mode(layer.mode, static_cast<f32>(layer.opacity.at(frame)), nullptr, layer.keep_alpha,
                                   layer.seed);
-  const GX_LPoint place = whole_pixels(layer.position.at(frame));
   ZR_MaskWorld mask;
-  if (layer.matte) {
-    const GX_LPoint offset = whole_pixels(layer.matte->position.at(frame));
-    mask.world = *images_.at(layer.matte->image).layer();
-    mask.offset_x = offset.x;
-    mask.offset_y = offset.y;
-    mask.kind = layer.matte->kind;
-  }
-  const GX_LRect all = source.bounds();
-  check(ZR_TransferRect(&abort_on_interrupt(), 1, 0, layer.field, &all, source.layer(), &mode, tables_.get(),
-                        layer.matte ? &mask : nullptr, place.x, place.y, canvas_.layer()),
-        layer.place);
+  if (layer.matte) mask = matte_of(layer, frame);
+  transform(source, layer.placement.matrices_of(frame), layer.placement.quality, scene_.field | layer.field, mode,
+            tables_.get(), layer.matte ? &mask : nullptr, canvas_, layer.place);
 }
 
 }  // namespace zr::tool

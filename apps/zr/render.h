@@ -1,7 +1,8 @@
-// Draws the frames of a scene through the library's transfer rectangle.
+// Draws the frames of a scene through the library's layer transform.
 #pragma once
 
 #include <map>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -35,6 +36,7 @@ class Renderer {
  private:
   void choose_spaces();
   OwnedWorld load(const SceneImage& image) const;
+  ZR_MaskWorld matte_of(const Layer& layer, i32 frame);
   void composite(const Layer& layer, OwnedWorld& source, i32 frame);
 
   const Scene& scene_;
@@ -43,6 +45,7 @@ class Renderer {
   TON_PRISMA_Transform to_output_;  // empty: nothing to convert
   std::vector<u8> output_icc_;
   OwnedWorld canvas_;
+  std::optional<OwnedWorld> matte_;           // of the frame's size, once a matte needs it
   std::map<std::string, OwnedWorld> images_;  // by file name
   std::map<const Layer*, OwnedWorld> solids_;
 };

@@ -1,7 +1,6 @@
 // Reading a scene file: JSON into a Scene, with every value checked.
 #include "scene.h"
 
-#include <cmath>
 #include <filesystem>
 #include <fstream>
 #include <set>
@@ -10,62 +9,17 @@
 #include "nearest_name.h"
 #include "scene_keys.h"
 #include "scene_node.h"
+#include "scene_values.h"
 #include "tool_error.h"
 
 namespace zr::tool {
 namespace {
 
-constexpr f64 kFarthest = 1e6;  // pixels from the origin; keeps sums of coordinates inside 32 bits
 const std::vector<std::string> kFields = {"all", "even", "odd"};
+const std::vector<std::string> kRenderFields = {"none", "upper", "lower"};
 const std::vector<std::string> kMatteKinds = {"alpha", "inverted-alpha", "luma", "inverted-luma"};
 
-f64 hex_pair(const std::string& text, size_t at) {
-  return static_cast<f64>(std::stoi(text.substr(at, 2), nullptr, 16)) / 255.0;
-}
-
-ZR_PixelFloat read_colour(const SceneNode& node) {
-  static const char* const expected =
-      "[red, green, blue] or [red, green, blue, alpha], each 0 to 1, or \"#rrggbb[aa]\"";
-  const nlohmann::json& json = node.json();
-  if (json.is_string()) {
-    const std::string& text = json.get_ref<const std::string&>();
-    const bool valid = (text.size() == 7 || text.size() == 9) && text[0] == '#' &&
-                       text.find_first_not_of("0123456789abcdefABCDEF", 1) == std::string::npos;
-    if (!valid) node.refuse(expected);
-    const f64 alpha = text.size() == 9 ? hex_pair(text, 7) : 1.0;
-    return {static_cast<f32>(alpha), static_cast<f32>(hex_pair(text, 1)), static_cast<f32>(hex_pair(text, 3)),
-            static_cast<f32>(hex_pair(text, 5))};
-  }
-  if (!json.is_array() || (json.size() != 3 && json.size() != 4)) node.refuse(expected);
-  const auto channel = [&](size_t i) { return static_cast<f32>(node.at(i).number(0, 1)); };
-  return {json.size() == 4 ? channel(3) : 1.0f, channel(0), channel(1), channel(2)};
-}
-
-Point read_point(const SceneNode& node) {
-  node.require_array(2, "[x, y] in pixels");
-  return {node.at(size_t{0}).number(-kFarthest, kFarthest), node.at(1).number(-kFarthest, kFarthest)};
-}
-
 f64 read_opacity(const SceneNode& node) { return node.number(0, 1); }
-
-// A plain value, or a list of {"frame": ..., "value": ...}.
-template <class Value>
-Keyed<Value> read_keyed(const SceneNode& node, Value (*read)(const SceneNode&)) {
-  const nlohmann::json& json = node.json();
-  if (!json.is_array() || json.empty() || !json.front().is_object()) return Keyed<Value>(read(node));
-  std::vector<typename Keyed<Value>::Key> keys;
-  for (size_t i = 0; i < node.size(); ++i) {
-    const SceneNode key = node.at(i);
-    key.require_keys(key_names(kKeyframeKeys));
-    for (const char* name : {"frame", "value"})
-      if (!key.has(name)) key.fail(std::string("lacks \"") + name + "\"");
-    const i32 frame = key.at("frame").integer(-kLastFrame, kLastFrame);
-    if (!keys.empty() && frame <= keys.back().frame)
-      key.at("frame").refuse("above the frame before it, " + std::to_string(keys.back().frame));
-    keys.push_back({frame, read(key.at("value"))});
-  }
-  return Keyed<Value>(std::move(keys));
-}
 
 void read_size(const SceneNode& node, i32& width, i32& height) {
   node.require_array(2, "[width, height], each 1 to " + std::to_string(kLargestSide) + " pixels");
@@ -98,18 +52,23 @@ i32 read_mode(const SceneNode& node) {
   return *mode;
 }
 
-TrackMatte read_matte(const SceneNode& node, const std::string& scene_file) {
-  node.require_keys(key_names(kMatteKeys));
+std::vector<std::string> joined(std::vector<std::string> names, const std::vector<std::string>& more) {
+  names.insert(names.end(), more.begin(), more.end());
+  return names;
+}
+
+TrackMatte read_matte(const SceneNode& node, const Scene& scene) {
+  node.require_keys(joined(key_names(kMatteKeys), key_names(kPlacementKeys)));
   if (!node.has("image")) node.fail("lacks \"image\"");
   TrackMatte matte;
-  matte.image = read_image_path(node.at("image"), scene_file);
+  matte.image = read_image_path(node.at("image"), scene.file);
   if (node.has("kind")) matte.kind = static_cast<u32>(node.at("kind").one_of(kMatteKinds));
-  if (node.has("position")) matte.position = read_keyed(node.at("position"), &read_point);
+  matte.placement = read_placement(node, scene.placement);
   return matte;
 }
 
 Layer read_layer(const SceneNode& node, const Scene& scene) {
-  node.require_keys(key_names(kLayerKeys));
+  node.require_keys(joined(key_names(kLayerKeys), key_names(kPlacementKeys)));
   Layer layer;
   layer.place = node.path();
   if (node.has("image") == node.has("colour")) node.fail("must have either \"image\" or \"colour\"");
@@ -123,13 +82,13 @@ Layer read_layer(const SceneNode& node, const Scene& scene) {
     if (node.has("size")) read_size(node.at("size"), layer.width, layer.height);
   }
   if (node.has("name")) node.at("name").string("a text");
-  if (node.has("position")) layer.position = read_keyed(node.at("position"), &read_point);
+  layer.placement = read_placement(node, scene.placement);
   if (node.has("opacity")) layer.opacity = read_keyed(node.at("opacity"), &read_opacity);
   if (node.has("mode")) layer.mode = read_mode(node.at("mode"));
   if (node.has("keep_alpha")) layer.keep_alpha = node.at("keep_alpha").boolean();
   if (node.has("field")) layer.field = static_cast<i32>(node.at("field").one_of(kFields));
   if (node.has("seed")) layer.seed = node.at("seed").integer(INT32_MIN, INT32_MAX);
-  if (node.has("matte")) layer.matte = read_matte(node.at("matte"), scene.file);
+  if (node.has("matte")) layer.matte = read_matte(node.at("matte"), scene);
   return layer;
 }
 
@@ -209,6 +168,9 @@ Scene parse_scene(const std::string& text, const std::string& file) {
     scene.output_space = read_space(top.at("output_space"), file);
   }
   if (top.has("linear_light")) scene.linear_light = top.at("linear_light").boolean();
+  if (top.has("field")) scene.field = static_cast<i32>(top.at("field").one_of(kRenderFields));
+  if (top.has("quality")) scene.placement.quality = read_quality(top.at("quality"));
+  if (top.has("motion_blur")) scene.placement.motion_blur = read_motion_blur(top.at("motion_blur"), {});
   if (!top.has("layers")) top.fail("lacks \"layers\": [ ... ], from bottom to top");
   const SceneNode layers = top.at("layers");
   if (!layers.json().is_array()) layers.refuse("a list [ ... ] of layers, from bottom to top");

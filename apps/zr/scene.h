@@ -10,14 +10,14 @@
 #include "colour_space.h"
 #include "depths.h"
 #include "frame_names.h"
-#include "keyframes.h"
+#include "placement.h"
 
 namespace zr::tool {
 
 struct TrackMatte {
   std::string image;  // path
   u32 kind = 0;       // ZR_MaskWorld.kind
-  Keyed<Point> position{Point{}};
+  Placement placement;
 };
 
 struct Layer {
@@ -25,7 +25,7 @@ struct Layer {
   std::string image;  // path; empty for a solid
   ZR_PixelFloat colour{1, 0, 0, 0};
   i32 width = 0, height = 0;  // of a solid
-  Keyed<Point> position{Point{}};
+  Placement placement;
   Keyed<f64> opacity{1.0};
   i32 mode = 2;
   bool keep_alpha = false;
@@ -42,6 +42,8 @@ struct Scene {
   i32 depth = 8;                                           // bits of a channel: 8, 16 or 32
   std::optional<SpaceChoice> working_space, output_space;  // an output space only with a working space
   bool linear_light = false;
+  i32 field = 0;        // rows that are drawn: 0 all, 1 those of the upper field (0, 2, ...), 2 those of the lower
+  Placement placement;  // its quality and motion blur are those of layers that do not say otherwise
   std::vector<Layer> layers;
 };
 

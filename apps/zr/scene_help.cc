@@ -30,10 +30,14 @@ std::string scene_help() {
              "  { \"size\": [960, 540], \"background\": \"#102030\", \"frames\": [1, 48],\n"
              "    \"layers\": [\n"
              "      { \"image\": \"media/street.jpg\" },\n"
+             "      { \"image\": \"media/logo.png\", \"position\": [480, 270], \"anchor\": [120, 120],\n"
+             "        \"scale\": 0.5, \"motion_blur\": true,\n"
+             "        \"rotation\": [ { \"frame\": 1, \"value\": 0 }, { \"frame\": 48, \"value\": 360 } ] },\n"
              "      { \"image\": \"media/balloon.png\", \"mode\": \"screen\", \"opacity\": 0.8,\n"
              "        \"position\": [ { \"frame\": 1, \"value\": [0, 300] },\n"
              "                      { \"frame\": 48, \"value\": [700, 40] } ] } ] }\n") +
          section("The scene", kSceneKeys) + section("A layer", kLayerKeys) + section("A matte", kMatteKeys) +
+         section("Placing a layer or a matte", kPlacementKeys) + section("Motion blur", kMotionBlurKeys) +
          section("A keyframe, in a list of rising frames", kKeyframeKeys) +
          "\nA colour is [red, green, blue], [red, green, blue, alpha], each 0..1, \"#rrggbb\" or \"#rrggbbaa\".\n"
          "An unknown key is an error.\n";

@@ -24,6 +24,10 @@ inline constexpr std::array kSceneKeys = {
     SceneKey{"output_space", "the same", "the working space", "of the files that are written"},
     SceneKey{"linear_light", "true or false", "false",
              "layers are blended in linear light of the working space, or sRGB"},
+    SceneKey{"quality", "\"draft\", \"bilinear\" or \"bicubic\"", "bilinear", "of layers that do not say otherwise"},
+    SceneKey{"motion_blur", "true, false or motion blur", "false", "of layers that do not say otherwise"},
+    SceneKey{"field", "\"none\", \"upper\" or \"lower\"", "none",
+             "draws only rows 0, 2, 4.. (upper) or 1, 3, 5.. (lower); --field overrides it"},
     SceneKey{"layers", "list of layers", "", "from bottom to top"},
 };
 inline constexpr std::array kLayerKeys = {
@@ -31,7 +35,6 @@ inline constexpr std::array kLayerKeys = {
     SceneKey{"colour", "colour", "", "a solid, instead of \"image\""},
     SceneKey{"size", "[width, height], each 1..30000", "the scene's", "of a solid"},
     SceneKey{"name", "text", "", "for the reader only"},
-    SceneKey{"position", "[x, y] or keyframes", "[0, 0]", "left top corner, rounded to whole pixels"},
     SceneKey{"opacity", "0..1 or keyframes", "1", ""},
     SceneKey{"mode", "name, see zr list modes", "in-front", "how the layer meets what is below"},
     SceneKey{"keep_alpha", "true or false", "false", "leaves the alpha below as it is"},
@@ -43,11 +46,35 @@ inline constexpr std::array kMatteKeys = {
     SceneKey{"image", "file name", "", "relative to the scene file"},
     SceneKey{"kind", "\"alpha\", \"inverted-alpha\", \"luma\" or \"inverted-luma\"", "alpha",
              "inverted kinds are open outside of the image"},
-    SceneKey{"position", "[x, y] or keyframes", "[0, 0]", "in the frame, not in the layer"},
+};
+// Of layers and of mattes.
+inline constexpr std::array kPlacementKeys = {
+    SceneKey{"position", "[x, y], each -1000000..1000000, or keyframes", "[0, 0]",
+             "where the anchor stands in the frame, in pixels; also that of a matte"},
+    SceneKey{"anchor", "[x, y], each -1000000..1000000, or keyframes", "[0, 0]",
+             "a point of the picture, in its pixels; it is scaled and turned about it"},
+    SceneKey{"scale", "number or [x, y], each -1000..1000, or keyframes", "1",
+             "1 is the picture's own size, negative mirrors, 0 draws nothing"},
+    SceneKey{"rotation", "-360000..360000 or keyframes", "0", "degrees, clockwise as seen"},
+    SceneKey{"skew", "number or [x, y], each -89..89, or keyframes", "0",
+             "degrees; x (or the number) leans upright edges, y level ones; before the rotation"},
+    SceneKey{"matrix", "nine numbers, each -1000000..1000000, or keyframes", "none",
+             "row by row, the last 0, 0, 1, from points of the picture to the frame; in place of the five above"},
+    SceneKey{"quality", "\"draft\", \"bilinear\" or \"bicubic\"", "the scene's",
+             "draft takes the nearest pixel and moves by whole pixels; the others take means when they reduce"},
+    SceneKey{"motion_blur", "true, false or motion blur", "the scene's", "from keyframes of the keys above"},
+};
+inline constexpr std::array kMotionBlurKeys = {
+    SceneKey{"shutter_angle", "0..720", "180", "degrees that the shutter is open; 360 is a whole frame"},
+    SceneKey{"shutter_phase", "-360..360", "-90", "degrees from the frame's own moment to the shutter's opening"},
+    SceneKey{"samples", "whole number 2..1024", "16",
+             "moments, evenly from opening to closing; draft keeps to the "
+             "straight line from first to last"},
 };
 inline constexpr std::array kKeyframeKeys = {
     SceneKey{"frame", "whole number", "", ""},
-    SceneKey{"value", "as without keyframes", "", "straight lines between, held before and after"},
+    SceneKey{"value", "as without keyframes", "",
+             "straight lines between, held before and after; motion blur looks between frames too"},
 };
 
 template <class Keys>

@@ -40,12 +40,12 @@ TEST(Scene, IsReadWhole) {
   EXPECT_EQ(solid.seed, -7);
   EXPECT_EQ(image.image, "folder/media/a.png") << "relative to the scene";
   EXPECT_EQ(image.opacity.at(1), 0.25);
-  EXPECT_EQ(image.position.at(3).x, 5.0);
-  EXPECT_EQ(image.position.at(3).y, -0.75);
+  EXPECT_EQ(image.placement.position.at(3).x, 5.0);
+  EXPECT_EQ(image.placement.position.at(3).y, -0.75);
   ASSERT_TRUE(image.matte.has_value());
   EXPECT_EQ(image.matte->image, "/b.png");
   EXPECT_EQ(image.matte->kind, 3u);
-  EXPECT_EQ(image.matte->position.at(1).y, 4.0);
+  EXPECT_EQ(image.matte->placement.position.at(1).y, 4.0);
 }
 
 TEST(Scene, HasDefaults) {

@@ -75,6 +75,11 @@ void zr::free_scratch() {
   shared.capacity = 0;
 }
 
+// The fixed blocks tell, which no call replaces while another one runs.
+bool zr::is_shared_scratch(void* const record[10]) {
+  return record[row_count] != nullptr && record[row_count] == shared.blocks[0];
+}
+
 i32 ZR_AllocateMotionBlurScratch(void* out[7]) {
   if (out == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_MotionBlurScratch);
   return zr::guarded([&] { return allocate_blocks(out); });

@@ -6,5 +6,7 @@ namespace zr {
 
 // Gives everything back; the next ZRp_ReallocScratch starts anew. At death.
 void free_scratch();
+// Whether a record is the shared set, rather than a caller's own. Any thread, between birth and death.
+bool is_shared_scratch(void* const record[10]);
 
 }  // namespace zr

@@ -1,9 +1,12 @@
 // Default contents of the slot table.
 #include "host/slot_defaults.h"
 
+#include <ZR/copy_bits.h>
+
 #include "composite/composite_rect.h"
 #include "composite/ground_rows.h"
 #include "composite/transfer_rect.h"
+#include "copy/transform_rows.h"
 #include "iterate/iterate.h"
 #include "world/effect_world.h"
 #include "world/premul_rows.h"
@@ -15,11 +18,13 @@ namespace {
 // Slots 47 and 48 have no caller in the library; a module that takes them calls something that does nothing.
 i32 do_nothing(void*, void*) { return ZR_Err_None; }
 
-// The slots that exist once for each depth: 17 to 19, 35 to 41, 72 to 78, 94 to 112.
+// The slots that exist once for each depth: 17 to 19, 35 to 41, 72 to 78, 94 to 112,
+// 115 to 117.
 template <class T>
 void fill_slots_of_depth() {
   using S = DepthSlots<T>;
   set_slot<S::transfer_rows>(&transfer_rows<T>);
+  set_slot<S::transform_rows>(&transform_rows<T>);
   set_slot<S::premul>(&premul_row<T>);
   set_slot<S::unmul>(&unmul_row<T>);
   set_slot<S::white_fade>(&white_fade_row<T>);
@@ -45,6 +50,10 @@ void fill_default_slots() {
   set_slot<ZR_Slot_composite_behind_row_straight>(&composite_behind_row_straight);
   set_slot<ZR_Slot_composite_behind_row_premul>(&composite_behind_row_premul);
   set_slot<ZR_Slot_transfer_rect>(&ZR_TransferRect_S);
+  set_slot<ZR_Slot_copy_bits_draft>(&ZR_CopyBits_Draft_Static);
+  set_slot<ZR_Slot_copy_bits_hq_straight>(&ZR_CopyBits_HQ_Straight_Static);
+  set_slot<ZR_Slot_copy_bits_hq_premul>(&ZR_CopyBits_HQ_Premul_Static);
+  set_slot<ZR_Slot_transform_world>(&ZR_TransformWorld_S);
   set_slot<ZR_Slot_iterate>(&iterate_body);
   set_slot<ZR_Slot_iterate_origin>(&iterate_origin_body);
   set_slot<ZR_Slot_iterate_lut>(&iterate_lut_body);
@@ -55,6 +64,7 @@ void fill_default_slots() {
   set_slot<ZR_Slot_iterate_origin_no_clip>(&iterate_origin_no_clip_body);
   set_slot<ZR_Slot_premul_rect>(&ZR_PremulRect_S);
   set_slot<ZR_Slot_iterate_generic>(&ZR_IterateGeneric_Static);
+  fill_sampler_slots();
   fill_slots_of_depth<ZR_Pixel8>();
   fill_slots_of_depth<ZR_Pixel16>();
   fill_slots_of_depth<ZR_PixelFloat>();

@@ -5,5 +5,7 @@ namespace zr {
 
 // Writes every slot whose routine the library has; the others are left alone (null at birth).
 void fill_default_slots();
+// Those of the samplers; called by fill_default_slots.
+void fill_sampler_slots();
 
 }  // namespace zr

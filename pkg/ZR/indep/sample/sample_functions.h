@@ -18,6 +18,12 @@ struct SampleFunctions {
 // What ZR_GetSampleFunctionSet... gives: fetched once before the loops. Cannot fail.
 template <class T>
 SampleFunctions<T> sample_functions(i32 quality);
+template <>
+SampleFunctions<ZR_Pixel8> sample_functions<ZR_Pixel8>(i32 quality);
+template <>
+SampleFunctions<ZR_Pixel16> sample_functions<ZR_Pixel16>(i32 quality);
+template <>
+SampleFunctions<ZR_PixelFloat> sample_functions<ZR_PixelFloat>(i32 quality);
 
 // The box mean with bilinear (1) or bicubic (2) point samples where the box is thin.
 template <class T, i32 quality>

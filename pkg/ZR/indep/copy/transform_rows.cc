@@ -1,0 +1,176 @@
+// A layer through its matrices: what kind of drawing it is, then the loop over the destination's rows.
+#include "copy/transform_rows.h"
+
+#include <ZR/errors.h>
+#include <ZR/transfer_mode.h>
+
+#include <optional>
+
+#include "composite/scratch_state.h"
+#include "copy/track_matte.h"
+#include "copy/transform_bounds.h"
+#include "copy/transform_motion.h"
+#include "world/guard.h"
+
+namespace zr {
+namespace {
+
+bool multiplies_alpha(i32 mode) { return mode == XferMultiplyAlpha || mode == XferMultiplyAlphaLuma; }
+// A transparent source changes the destination too.
+bool draws_transparent(i32 mode) { return mode == XferCopyFast || mode == XferAddPremul || multiplies_alpha(mode); }
+
+// Rows between two polls, less one; a row polls where its number has none of these bits.
+i32 progress_bits(i32 quality, i32 count, bool field) {
+  const i32 bits = count > 1 ? 7 : quality != 0 ? 31 : 63;
+  return field ? bits * 2 + 1 : bits;
+}
+
+bool lacks_pixels(const ZR_LayerDef& world) { return world.data == nullptr && world.width > 0 && world.height > 0; }
+// Pixels of the mask are wanted, and there are none.
+bool mask_lacks_pixels(const ZR_MaskWorld& mask, const GX_LRect& bounds) {
+  const auto meets = [](i64 offset, i64 size, i32 low, i32 high) { return offset < high && offset + size > low; };
+  return lacks_pixels(mask.world) && meets(mask.offset_x, mask.world.width, bounds.left, bounds.right) &&
+         meets(mask.offset_y, mask.world.height, bounds.top, bounds.bottom);
+}
+
+// The last step of a layer that only moves by whole pixels: a plain rectangle. The library's own scratch takes
+// the ordinary road, so that a replacement of it takes effect; a caller's scratch goes on with the call.
+template <class T>
+i32 move_layer(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR_WorldX<T>& src,
+               const ZR_BlendingMode<T>& mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
+               void* const scratch[10], const PlacedScale& scale, const GX_LRect& bounds, ZR_WorldX<T>* dst) {
+  const i32 dx = nearest_index(scale.shift_x), dy = nearest_index(scale.shift_y);
+  const GX_LRect rect = {wrap_sub(bounds.left, dx), wrap_sub(bounds.top, dy), wrap_sub(bounds.right, dx),
+                         wrap_sub(bounds.bottom, dy)};
+  // Opacity over white and back is exact in every depth.
+  const ZR_CompositeModePlus plus(mode.mode, static_cast<f32>(mode.opacity) / static_cast<f32>(Depth<T>::white), tables,
+                                  mode.keep_alpha != 0, mode.seed);
+  ZR_LayerDef* const from = &const_cast<ZR_WorldX<T>&>(src);
+  if (is_shared_scratch(scratch))
+    return call_slot<ZR_Slot_transfer_rect>(progress, quality, u32{0}, field, &rect, from, &plus, tables, mask,
+                                            bounds.left, bounds.top, dst);
+  return call_slot<ZR_Slot_transfer_rect_plus>(progress, quality, u32{0}, field, &rect, from, &plus, tables, mask,
+                                               const_cast<void**>(scratch), bounds.left, bounds.top, dst);
+}
+
+// Lays one sampled row over the destination, or leaves it where nothing would change.
+template <class T>
+i32 finish_row(const ZR_ProgressInfo* progress, i32 count, const ZR_BlendModeDescriptor<T>& plan, const T* row,
+               RowSum<T> sum, const T* mask, Channel<T>* alpha_row, T* out) {
+  constexpr Wide<T> white = Depth<T>::white;
+  if (sum == 0 && !draws_transparent(plan.mode.mode)) return ZR_Err_None;
+  const bool opaque = sum == static_cast<RowSum<T>>(count) * static_cast<RowSum<T>>(white);
+  if (opaque && plan.mode.mode == XferInFront && mask == nullptr && plan.mode.keep_alpha == 0 &&
+      plan.mode.opacity == static_cast<Channel<T>>(white)) {
+    std::memmove(out, row, static_cast<std::size_t>(count) * sizeof(T));
+    return ZR_Err_None;
+  }
+  return ZR_BlendPipeline<T>(progress, count, &plan, row, mask, alpha_row, out);
+}
+
+}  // namespace
+
+template <class T>
+i32 transform_rows(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR_WorldX<T>* src,
+                   const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
+                   const GX_Matrix3* matrices, i32 count, bool src2dst, void* const scratch[10], const GX_LRect* rect,
+                   ZR_WorldX<T>* dst) {
+  return guarded([&]() -> i32 {
+    if (mask != nullptr && ZRp_WorldDepth(&mask->world) != Depth<T>::bits)
+      return failed_verification(ZR_Site_TransformWorld,
+                                 "ZR_TransformWorld requires mask and dst worlds to have same bit depth");
+    const MatrixList list = {matrices, count, src2dst};
+    Shutter shutter;
+    if (!make_shutter(list, &shutter)) return ZR_Err_None;
+    const GX_LRect bounds = reached_bounds(list, drawable_area(*rect, *dst, mask), src->width, src->height);
+    if (GX_EmptyLRect(&bounds)) return ZR_Err_None;
+
+    const PlacedScale scale = placed_scale(shutter.first.forward);
+    if (scale.degenerate) {
+      constexpr GX_LRect nothing = {0, 0, 0, 0};
+      return multiplies_alpha(mode->mode) ? ZR_ClearAlphaExceptRect(progress, &nothing, dst) : ZR_Err_None;
+    }
+    const bool whole = quality == 0 || ((scale.shift_x | scale.shift_y) & 0xffff) == 0;
+    if (!shutter.moves && whole && GX_GetMatrixType(&shutter.first.forward) <= GX_MatrixType_Translation)
+      return move_layer<T>(progress, quality, field, *src, *mode, tables, mask, scratch, scale, bounds, dst);
+
+    ZR_BlendModeDescriptor<T> plan(*mode, mask != nullptr, tables);
+    if (plan.main == nullptr) return ZR_Err_UnimplementedMode;
+    const bool keeps_alpha = plan.may_keep_alpha != 0 && plan.mode.keep_alpha != 0;
+    const bool prepares_mask = mask != nullptr && (mask->kind & mask_kinds) != 0;
+    if (lacks_pixels(*src) || dst->data == nullptr || (mask != nullptr && mask_lacks_pixels(*mask, bounds)) ||
+        scratch[2] == nullptr || (keeps_alpha && scratch[0] == nullptr) || (prepares_mask && scratch[1] == nullptr))
+      return ZR_ReportBadCallbackParam(ZR_Site_TransformWorld);
+    auto* const alpha_row = static_cast<Channel<T>*>(scratch[0]);
+    auto* const mask_cells = static_cast<T*>(scratch[1]);
+    auto* const row = static_cast<T*>(scratch[2]);
+
+    const i32 width = bounds.right - bounds.left, rows = bounds.bottom - bounds.top;
+    const SourceWalk walk = source_walk(shutter.first.inverse, bounds.left, bounds.top);
+    ZR_SampPB params{};
+    params.x_radius = scale.x_radius;
+    params.y_radius = scale.y_radius;
+    params.area = scale.area;
+    params.src = const_cast<ZR_WorldX<T>*>(src);
+
+    std::optional<DraftRow<T>> draft;
+    std::optional<BestRow<T>> best;
+    std::optional<DraftMotionRow<T>> draft_motion;
+    std::optional<BestMotionRow<T>> best_motion;
+    std::optional<ComplexMotionRow<T>> complex_motion;
+    RowSampler<T>* sampler = nullptr;
+    const bool is_draft = quality == 0;
+    if (!shutter.moves) {
+      if (is_draft)
+        sampler = &draft.emplace(*src, walk, width);
+      else
+        sampler = &best.emplace(sample_functions<T>(quality), params, walk, width);
+    } else {
+      const i32 samples = count > 2 ? count : is_draft ? 9 : 17;
+      params.motion_steps = samples - 1;
+      const MotionWalk motion = {walk, source_walk(shutter.last.inverse, bounds.left, bounds.top), samples};
+      if (is_draft)
+        sampler = &draft_motion.emplace(*src, motion, width);
+      else if (count > 2 && is_complex_motion(list, shutter))
+        sampler = &complex_motion.emplace(sample_functions<T>(quality), params, list, bounds, scratch);
+      else
+        sampler = &best_motion.emplace(sample_functions<T>(quality), params, motion, width, scratch);
+    }
+
+    // Around the layer the source counts as clear, and these modes clear under a clear source.
+    if (multiplies_alpha(mode->mode)) {
+      const i32 error = ZR_ClearAlphaExceptRect(progress, &bounds, dst);
+      if (error != 0) return error;
+    }
+    const i32 skipped_parity = field == 1 ? 1 : field == 2 ? 0 : 2;
+    const i32 quiet_bits = progress_bits(quality, count, skipped_parity != 2);
+    // The seed of a row depends on the row alone, so that fields dissolve as the frame does.
+    u32 seed = static_cast<u32>(mode->seed), seed_step = static_cast<u32>(bounds.top) * 12281u;
+    for (i32 i = 0; i < rows; ++i) {
+      const i32 y = bounds.top + i;
+      if ((y & 1) != skipped_parity) {
+        plan.mode.seed = static_cast<i32>(seed);
+        const T* const mask_pixels = mask != nullptr ? mask_row<T>(*mask, bounds.left, y, width, mask_cells) : nullptr;
+        RowSum<T> sum = 0;
+        i32 error = sampler->sample(row, &sum);
+        if (error == 0)
+          error = finish_row<T>(progress, width, plan, row, sum, mask_pixels, alpha_row, dst->At(bounds.left, y));
+        if (error != 0) return error;
+      }
+      sampler->next_row();
+      if ((i & quiet_bits) == 0) {
+        const i32 stop = poll(progress, i, rows);
+        if (stop != 0) return stop;
+      }
+      seed += seed_step;
+      seed_step += 12281u;
+    }
+    return ZR_Err_None;
+  });
+}
+
+template TransformRowsFunc<ZR_Pixel8> transform_rows<ZR_Pixel8>;
+template TransformRowsFunc<ZR_Pixel16> transform_rows<ZR_Pixel16>;
+template TransformRowsFunc<ZR_PixelFloat> transform_rows<ZR_PixelFloat>;
+
+}  // namespace zr

@@ -1,0 +1,146 @@
+// Row samplers of a layer that stands still: a row of destination pixels fetched from the source, with the sum
+// of its alphas. The ends of a row that lie outside are walked once; between them nothing is tested.
+#pragma once
+
+#include <ZR/world.h>
+
+#include <algorithm>
+#include <cstring>
+
+#include "copy/matrix_steps.h"
+#include "sample/sample_functions.h"
+
+namespace zr {
+
+// Wide enough for any row: 0 means wholly transparent, count times white wholly opaque.
+template <class T>
+using RowSum = std::conditional_t<std::is_same_v<T, ZR_PixelFloat>, f64, u64>;
+
+// One kind of sampling, chosen once for a call. Called once for each row.
+template <class T>
+class RowSampler {
+ public:
+  virtual ~RowSampler() = default;
+  // Fills the row's pixels and sums their alphas into *sum. Returns 0 or the first error of a sampler.
+  virtual i32 sample(T* row, RowSum<T>* sum) = 0;
+  virtual void next_row() = 0;
+};
+
+// The first error stays.
+inline void note(i32 result, i32* error) {
+  if (result != 0 && *error == 0) *error = result;
+}
+
+// Nearest pixels.
+template <class T>
+class DraftRow final : public RowSampler<T> {
+ public:
+  DraftRow(const ZR_WorldX<T>& src, const SourceWalk& walk, i32 count) : src_(src), walk_(walk), count_(count) {}
+
+  i32 sample(T* row, RowSum<T>* sum) override {
+    if (!walk_.straight(count_)) {
+      for (i32 i = 0; i < count_; ++i) row[i] = tested(i);
+    } else {
+      const InsideRun run = nearest_run(walk_, count_, src_.width, src_.height);
+      std::fill(row, row + run.first, T{});
+      copy(run.first, run.end - run.first, row + run.first);
+      std::fill(row + run.end, row + count_, T{});
+    }
+    RowSum<T> total = 0;
+    for (i32 i = 0; i < count_; ++i) total += row[i].alpha;
+    *sum = total;
+    return ZR_Err_None;
+  }
+  void next_row() override { walk_.next_row(); }
+
+ private:
+  T tested(i32 i) const {
+    const i32 x = nearest_index(wrap_add(walk_.x, wrap_mul(i, walk_.step_x)));
+    const i32 y = nearest_index(wrap_add(walk_.y, wrap_mul(i, walk_.step_y)));
+    return x >= 0 && x < src_.width && y >= 0 && y < src_.height ? *src_.At(x, y) : T{};
+  }
+  void copy(i32 first, i32 n, T* out) const {
+    i32 x = wrap_add(wrap_add(walk_.x, wrap_mul(first, walk_.step_x)), 32768);
+    i32 y = wrap_add(wrap_add(walk_.y, wrap_mul(first, walk_.step_y)), 32768);
+    if (walk_.step_y == 0) {
+      const T* const from = n > 0 ? src_.Row(y >> 16) : nullptr;
+      if (walk_.step_x == 0x10000 && n > 0) {
+        std::memcpy(out, from + (x >> 16), static_cast<std::size_t>(n) * sizeof(T));
+        return;
+      }
+      for (i32 i = 0; i < n; ++i, x = wrap_add(x, walk_.step_x)) out[i] = from[x >> 16];
+      return;
+    }
+    for (i32 i = 0; i < n; ++i, x = wrap_add(x, walk_.step_x), y = wrap_add(y, walk_.step_y))
+      out[i] = *src_.At(x >> 16, y >> 16);
+  }
+
+  const ZR_WorldX<T>& src_;
+  SourceWalk walk_;
+  i32 count_;
+};
+
+// A box wider than a pixel on either axis is averaged rather than sampled at a point.
+inline bool takes_area(const ZR_SampPB& params) { return params.x_radius > 32768 || params.y_radius > 32768; }
+
+// One row by the samplers of a quality.
+template <class T>
+i32 sample_best_row(const SampleFunctions<T>& samplers, const ZR_SampPB& params, const SourceWalk& walk, i32 count,
+                    T* row, RowSum<T>* sum) {
+  i32 error = ZR_Err_None;
+  RowSum<T> total = 0;
+  const auto x_at = [&](i32 i) { return wrap_add(walk.x, wrap_mul(i, walk.step_x)); };
+  const auto y_at = [&](i32 i) { return wrap_add(walk.y, wrap_mul(i, walk.step_y)); };
+  const auto each = [&](SampleFunc<T>* sampler, i32 first, i32 end) {
+    i32 x = x_at(first), y = y_at(first);
+    for (i32 i = first; i < end; ++i, x = wrap_add(x, walk.step_x), y = wrap_add(y, walk.step_y)) {
+      note(sampler(nullptr, x, y, &params, &row[i]), &error);
+      total += row[i].alpha;
+    }
+  };
+  if (takes_area(params)) {
+    each(samplers.area, 0, count);
+  } else if (!walk.straight(count)) {
+    each(samplers.clipping, 0, count);
+  } else {
+    const auto all_in = [&](i32 i) {
+      u8 inside = 0;
+      note(samplers.inside_flag(nullptr, x_at(i), y_at(i), &params, &inside, &row[i]), &error);
+      total += row[i].alpha;
+      return inside != 0;
+    };
+    i32 first = 0, end = count;
+    while (first < end && !all_in(first++)) continue;
+    while (end > first && !all_in(--end)) continue;
+    if (first < end && walk.step_x == 0x10000 && walk.step_y == 0) {
+      AlphaSum<T> span_sum = 0;  // the run lies inside the range of positions: 2^16 pixels at most
+      note(samplers.span(nullptr, end - first, x_at(first), walk.y, &params, &span_sum, row + first), &error);
+      total += span_sum;
+    } else {
+      each(samplers.no_clipping, first, end);
+    }
+  }
+  *sum = total;
+  return error;
+}
+
+// Bilinear or bicubic pixels, or box means where the layer shrinks.
+template <class T>
+class BestRow final : public RowSampler<T> {
+ public:
+  BestRow(const SampleFunctions<T>& samplers, const ZR_SampPB& params, const SourceWalk& walk, i32 count)
+      : samplers_(samplers), params_(params), walk_(walk), count_(count) {}
+
+  i32 sample(T* row, RowSum<T>* sum) override {
+    return sample_best_row<T>(samplers_, params_, walk_, count_, row, sum);
+  }
+  void next_row() override { walk_.next_row(); }
+
+ private:
+  SampleFunctions<T> samplers_;
+  ZR_SampPB params_;
+  SourceWalk walk_;
+  i32 count_;
+};
+
+}  // namespace zr

@@ -1,0 +1,74 @@
+// Which samplers belong to a depth and a sample quality.
+#include "sample/ZR_Samp.h"
+
+#include <ZR/summed_area.h>
+
+#include "sample/sample_functions.h"
+
+namespace zr {
+namespace {
+
+constexpr bool is_bicubic(i32 quality) { return (quality & ~1) == 2; }
+
+}  // namespace
+
+template <>
+SampleFunctions<ZR_Pixel8> sample_functions<ZR_Pixel8>(i32 quality) {
+  if (is_bicubic(quality))
+    return {&ZR_SubpixelSpanSampleAllInBicubic8,       &ZR_SubpixelBicubic8,
+            &ZR_AreaSample_CPlusPlus<ZR_Pixel8, 2>,    &ZR_SubpixelNoClipBicubic8,
+            &ZR_SubpixelSampleTranslateNoClipBicubic8, &ZR_SubpixelSpanSampleBicubic8};
+  return {
+      slot<ZR_Slot_bilinear_plus8>(),    slot<ZR_Slot_bilinear_straight8>(),          slot<ZR_Slot_area_straight8>(),
+      slot<ZR_Slot_bilinear_no_clip8>(), slot<ZR_Slot_bilinear_translate_no_clip8>(), slot<ZR_Slot_bilinear_span8>()};
+}
+
+template <>
+SampleFunctions<ZR_Pixel16> sample_functions<ZR_Pixel16>(i32 quality) {
+  if (is_bicubic(quality))
+    return {&ZR_SubpixelSpanSampleAllInBicubic16,       &ZR_SubpixelBicubic16,
+            &ZR_AreaSample_CPlusPlus<ZR_Pixel16, 2>,    &ZR_SubpixelNoClipBicubic16,
+            &ZR_SubpixelSampleTranslateNoClipBicubic16, &ZR_SubpixelSpanSampleBicubic16};
+  return {slot<ZR_Slot_bilinear_plus16>(),
+          slot<ZR_Slot_bilinear_straight16>(),
+          slot<ZR_Slot_area_straight16>(),
+          slot<ZR_Slot_bilinear_no_clip16>(),
+          slot<ZR_Slot_bilinear_translate_no_clip16>(),
+          slot<ZR_Slot_bilinear_span16>()};
+}
+
+template <>
+SampleFunctions<ZR_PixelFloat> sample_functions<ZR_PixelFloat>(i32 quality) {
+  if (is_bicubic(quality))
+    return {&ZR_SubpixelSpanSampleAllInBicubicFloat,       &ZR_SubpixelBicubicFloat,
+            &ZR_AreaSample_CPlusPlus<ZR_PixelFloat, 2>,    &ZR_SubpixelNoClipBicubicFloat,
+            &ZR_SubpixelSampleTranslateNoClipBicubicFloat, &ZR_SubpixelSpanSampleBicubicFloat};
+  return {&ZR_SubpixelSpanSampleAllInBilinearFloat,       &ZR_SubpixelBilinearFloat,
+          &ZR_AreaSample_CPlusPlus<ZR_PixelFloat, 1>,     &ZR_SubpixelNoClipBilinearFloat,
+          &ZR_SubpixelSampleTranslateNoClipBilinearFloat, &ZR_SubpixelSpanSampleBilinearFloat};
+}
+
+namespace {
+
+template <class T>
+void function_set(i32 quality, ZR_SampleFunctionSet* out) {
+  const SampleFunctions<T> set = sample_functions<T>(quality);
+  const auto any = [](auto* sampler) { return reinterpret_cast<ZR_AnySampleFunc>(sampler); };
+  *out = {any(set.inside_flag), any(set.clipping),  any(set.area),
+          any(set.no_clipping), any(set.translate), any(set.span)};
+}
+
+}  // namespace
+}  // namespace zr
+
+extern "C" {
+
+void ZR_GetSampleFunctionSet8(i32 quality, ZR_SampleFunctionSet* out) { zr::function_set<ZR_Pixel8>(quality, out); }
+void ZR_GetSampleFunctionSet16(i32 quality, ZR_SampleFunctionSet* out) { zr::function_set<ZR_Pixel16>(quality, out); }
+void ZR_GetSampleFunctionSetFloat(i32 quality, ZR_SampleFunctionSet* out) {
+  zr::function_set<ZR_PixelFloat>(quality, out);
+}
+
+i32 ZR_GetSampleQualityPixelSupport(i32 quality) { return zr::is_bicubic(quality) ? 2 : quality == 1 ? 1 : 0; }
+
+}  // extern "C"
