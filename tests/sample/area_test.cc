@@ -2,6 +2,7 @@
 #include <ZR/summed_area.h>
 
 #include "sample/models.h"
+#include "sample/sample_functions.h"
 #include "support/born_library.h"
 
 namespace {
@@ -35,18 +36,18 @@ template <class T>
 T area_model(const Picture<T>& picture, i32 quality, i32 x, i32 y) {
   const ZR_SampPB& params = picture.params;
   const bool direct = params.x_radius > 32768 && params.y_radius > 32768;
-  long double sums[4] = {};
+  f64 sums[4] = {};
   walk(picture.layer, params, x, y, [&](i32 sample_x, i32 sample_y, i64 width, i64 height) {
     const T p = direct ? picture.at(sample_x >> 16, sample_y >> 16) : point_model(picture, quality, sample_x, sample_y);
     const auto c = numbers<f64>(p);
     for (size_t k = 0; k < 4; ++k)
-      sums[k] += static_cast<long double>((k == 0 ? 1 : c[k]) * c[0]) * static_cast<long double>(width * height);
+      sums[k] += (k == 0 ? c[0] : c[k] * c[0]) * (static_cast<f64>(width * height) * 0x1p-32);
   });
-  if (sums[0] == 0) return T{};
+  const f64 total = sums[0], inverse = 1 / total;
+  if (total == 0) return T{};
   constexpr f64 white = zr::Depth<T>::white;
-  const long double area = 4.0L * params.x_radius * params.y_radius;
-  std::array<f64, 4> out = {std::fmin(white, static_cast<f64>(sums[0] / area))};
-  for (size_t k = 1; k < 4; ++k) out[k] = static_cast<f64>(sums[k] / sums[0]);
+  std::array<f64, 4> out = {std::fmin(white, total * 0.25 / (params.x_radius / 65536.0 * (params.y_radius / 65536.0)))};
+  for (size_t k = 1; k < 4; ++k) out[k] = sums[k] * inverse;
   if (!is_float<T>)
     for (f64& v : out) v = std::floor(v + 0.5);
   return pixel_of<T>(out);
@@ -114,9 +115,9 @@ void expect_mean(const Picture<T>& picture, const f64 (&box)[4], const T& got, f
   for (size_t k = 0; k < 4; ++k) {
     f64 expected = nothing ? 0 : k == 0 ? sums[0] / ((right - left) * (bottom - top)) : sums[k] / sums[0];
     expected = std::fmax(0, std::fmin(white, expected));
+    if (k > 0 && nothing) break;  // colour of what the corners' rounding left
     // Colour under a faint alpha is known only as well as the alpha is.
-    const f64 unsure =
-        k == 0 || nothing ? slack : slack * (1 + 0.02 * white * (right - left) * (bottom - top) / sums[0]);
+    const f64 unsure = k == 0 ? slack : slack * (1 + 0.02 * white * (right - left) * (bottom - top) / sums[0]);
     ASSERT_NEAR(result[k], expected, (is_float<T> ? 0 : 0.5) + unsure * white)
         << picture.name << " channel " << k << " box " << left << ", " << top << ", " << right << ", " << bottom;
   }
@@ -148,7 +149,7 @@ TEST_F(Area, TablesAverageAnyBox) {
       const ZR_SummedAreaTable exact(&world, true), plain(&world, false);
       EXPECT_TRUE(exact.UsesDouble());
       EXPECT_EQ(plain.UsesDouble(), is_float<T>);
-      check_table(*picture, exact.DoubleTable(), 1e-9);
+      check_table(*picture, exact.DoubleTable(), is_float<T> ? 1e-6 : 1e-9);
       if (!is_float<T>) check_table(*picture, plain.FloatTable(), 2e-5);
     }
   });
