@@ -43,9 +43,9 @@ struct Operation {
   Walk walk;
   i32 quality;
 };
-constexpr Operation operations[] = {{"sample-bilinear", Walk::no_clip, 1}, {"sample-bilinear-clip", Walk::clip, 1},
+constexpr Operation operations[] = {{"sample-bilinear", Walk::no_clip, 1},   {"sample-bilinear-clip", Walk::clip, 1},
                                     {"sample-bilinear-span", Walk::span, 1}, {"sample-bicubic", Walk::no_clip, 2},
-                                    {"sample-bicubic-span", Walk::span, 2}, {"sample-area-2.7", Walk::area, 1}};
+                                    {"sample-bicubic-span", Walk::span, 2},  {"sample-area-2.7", Walk::area, 1}};
 
 const bool registered = [] {
   for (const Operation& one : operations)

@@ -177,4 +177,32 @@ TEST_F(Area, TablesHoldMeansAndFailWithoutMemory) {
   }
 }
 
+TEST_F(Area, HorizontalSumsReachBeyondTheWorld) {
+  each_depth([]<class T>() {
+    Picture<T> picture(6, 3, Alpha::opaque, true, 9);
+    ZR_WorldX<T> world(&picture.layer, true);
+    // A box of 2 by 1, doubled and turned by a right angle: 2 wide and 4 high.
+    const ZR_HorizontalSumTable<T> table(&world, 5, 3, 0.5, 1.0, 0.5, 2.0, 2.0, 90.0, true, nullptr, nullptr);
+    EXPECT_EQ(table.OutputWidth(), 3);
+    EXPECT_EQ(table.OutputHeight(), 2);
+    ASSERT_GE(table.PaddingX(), 2);  // the cosine of a right angle is not quite 0
+    ASSERT_LE(table.PaddingX(), 3);
+    EXPECT_GE(table.PaddingY(), 4);
+    for (i32 y = 0; y < 3; ++y)
+      for (i32 from = -table.PaddingX(); from <= 6; ++from)
+        for (i32 to = from; to <= 6 + table.PaddingX(); ++to) {
+          f64 red = 0, alpha = 0;
+          for (i32 x = from; x < to; ++x) {
+            const f64 a = picture.at(x, y).alpha / static_cast<f64>(zr::Depth<T>::white);
+            alpha += a, red += a * picture.at(x, y).red / static_cast<f64>(zr::Depth<T>::white);
+          }
+          const ZR_PixelFloat* const row = table.Row(y) + table.PaddingX();
+          ASSERT_NEAR(row[to].alpha - row[from].alpha, alpha, 1e-5);
+          ASSERT_NEAR(row[to].red - row[from].red, red, 1e-5) << from << ".." << to;
+        }
+    for (const f64 bad : {std::nan(""), std::numeric_limits<f64>::infinity(), 1e9})
+      EXPECT_THROW(ZR_HorizontalSumTable<T>(&world, 5, 3, 1, bad, 1, 1, 1, 0, false, nullptr, nullptr), i32);
+  });
+}
+
 }  // namespace

@@ -28,31 +28,28 @@ std::array<Real, 4> bilinear_weights(i32 x, i32 y) {
   return {1 - (fx - both) - (fy - both) - both, fx - both, fy - both, both};
 }
 
-// Neighbours in the order of the weights; `given` are the caller's.
+// `given`: the caller's weights. Without `branches` all pixels go through the general case of 8 bits.
 template <class T>
-T bilinear_model(const Picture<T>& picture, i32 x, i32 y, const f64* given = nullptr) {
+T bilinear_model(const Picture<T>& picture, i32 x, i32 y, const f64* given = nullptr, bool branches = true) {
   using Real = Precision<T>;
   const i64 ix = x >> 16, iy = y >> 16;
   const T p[4] = {picture.at(ix, iy), picture.at(ix + 1, iy), picture.at(ix, iy + 1), picture.at(ix + 1, iy + 1)};
-  if (!is_float<T> && ((x | y) & 0xffff) == 0) return p[0];
-  if (!is_float<T> && std::all_of(p, p + 4, [&](const T& one) { return std::memcmp(&one, p, sizeof one) == 0; }))
-    return p[0];
+  const auto like_first = [&](const T& one) { return std::memcmp(&one, p, sizeof one) == 0; };
+  if (!is_float<T> && branches && (((x | y) & 0xffff) == 0 || std::all_of(p, p + 4, like_first))) return p[0];
   std::array<Real, 4> c[4], f = bilinear_weights<Real>(x, y);
   if (given != nullptr) std::transform(given, given + 4, f.begin(), [](f64 w) { return static_cast<Real>(w); });
   for (size_t i = 0; i < 4; ++i) c[i] = numbers<Real>(p[i]);
-  const bool equal = c[0][0] == c[1][0] && c[0][0] == c[2][0] && c[0][0] == c[3][0];
+  const bool equal = branches && c[0][0] == c[1][0] && c[0][0] == c[2][0] && c[0][0] == c[3][0];
   const auto sum = [&](size_t k) {
     const Real s0 = f[0] * c[0][k], s1 = f[1] * c[1][k], s2 = f[2] * c[2][k], s3 = f[3] * c[3][k];
     return is_float<T> ? s0 + s1 + s2 + s3 : (s0 + s1) + (s2 + s3);
   };
   Real alpha = equal ? c[0][0] : sum(0), scale = 1;
+  if (is_float<T> ? !equal && alpha == 0 : alpha == 0 || (branches && alpha < Real{0.5})) return T{};
   if (!equal) {
     if (is_float<T>) alpha = std::fmin(Real{1}, alpha);
-    if (is_float<T> ? alpha == 0 : alpha < Real{0.5}) return T{};
     scale = 1 / alpha;
     for (size_t i = 0; i < 4; ++i) f[i] *= c[i][0];
-  } else if (!is_float<T> && alpha == 0) {
-    return T{};
   }
   std::array<Real, 4> out = {alpha, sum(1) * scale, sum(2) * scale, sum(3) * scale};
   if (!is_float<T>)

@@ -70,9 +70,14 @@ inline Lanes<Real> channels(const Pixel& p) {
   } else if constexpr (std::is_same_v<Pixel, ZR_PixelFloat>) {
     return {f64x2{p.alpha, p.red}, f64x2{p.green, p.blue}};
   } else {
-    const i32x4 whole = whole_lanes(p);
-    return {__builtin_convertvector(__builtin_shufflevector(whole, whole, 0, 1), f64x2),
-            __builtin_convertvector(__builtin_shufflevector(whole, whole, 2, 3), f64x2)};
+    // A whole number below the exponent of 2^52 is that much above 2^52: there is no vector instruction for this
+    // conversion that all compilers take.
+    constexpr f64 base = 4503599627370496.0;
+    constexpr i32 exponent = 0x43300000;
+    const i32x4 whole = whole_lanes(p), above{exponent, exponent, exponent, exponent};
+    const f64x2 bases{base, base};
+    return {std::bit_cast<f64x2>(__builtin_shufflevector(whole, above, 0, 4, 1, 5)) - bases,
+            std::bit_cast<f64x2>(__builtin_shufflevector(whole, above, 2, 6, 3, 7)) - bases};
   }
 }
 
@@ -91,8 +96,8 @@ inline ZR_Pixel16 low_words(i32x4 v) {
 }
 
 // Lanes that satisfy the mask; 0 elsewhere.
-inline f32x4 where(i32x4 mask, f32x4 v) { return std::bit_cast<f32x4>(std::bit_cast<i32x4>(v) & mask); }
-inline f64x2 where(i64x2 mask, f64x2 v) { return std::bit_cast<f64x2>(std::bit_cast<i64x2>(v) & mask); }
+inline f32x4 where(i32x4 mask, f32x4 v) { return mask ? v : f32x4{}; }
+inline f64x2 where(i64x2 mask, f64x2 v) { return mask ? v : f64x2{}; }
 
 // Truncated and limited to 0..white; NaN gives 0.
 template <class Pixel>
