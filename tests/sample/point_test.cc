@@ -27,28 +27,31 @@ TEST_F(PointSamplers, EqualTheirModel) {
       for (const i32 quality : {1, 2}) {
         const auto set = zr::sample_functions<T>(quality);
         size_t unclipped = 0;
-        for (const auto& [x, y] : positions(picture->layer, 3000, 11)) {
-          SCOPED_TRACE(picture->name + " q" + std::to_string(quality) + " at " + std::to_string(x) + ", " +
-                       std::to_string(y));
+        // Many on one 8-bit world: the order of additions shows in one sample of tens of thousands.
+        const size_t count = sizeof(T) == 4 && picture->layer.width == 17 ? 250000 : 2000;
+        for (const auto& [x, y] : positions(picture->layer, count, 11)) {
+          const auto where = [&, at = std::array{x, y}] {
+            return testing::Message() << picture->name << " q" << quality << " at " << at[0] << ", " << at[1];
+          };
           const T expected = point_model(*picture, quality, x, y);
           T got;
           ASSERT_EQ(set.clipping(nullptr, x, y, &picture->params, &got), 0);
-          ASSERT_TRUE(same_pixel(got, expected));
+          ASSERT_TRUE(same_pixel(got, expected)) << where();
           u8 all_in = 7;
           ASSERT_EQ(set.inside_flag(nullptr, x, y, &picture->params, &all_in, &got), 0);
-          ASSERT_TRUE(same_pixel(got, expected));
+          ASSERT_TRUE(same_pixel(got, expected)) << where();
           const bool whole = ((x | y) & 0xffff) == 0;
           const bool in = reads_inside<T>(picture->layer, quality, x, y);
           ASSERT_EQ(all_in, in && (quality == 2 ? (x >> 16) > 1 && (y >> 16) > 1 : is_float<T> || !whole));
           if (!in) continue;
           ++unclipped;
           ASSERT_EQ(set.no_clipping(nullptr, x, y, &picture->params, &got), 0);
-          ASSERT_TRUE(same_pixel(got, expected));
+          ASSERT_TRUE(same_pixel(got, expected)) << where();
           if (quality == 2 && !is_float<T>) continue;  // another rule, below
           f64 w[4];
           ZR_SubpixelSampleComputeWeight(static_cast<u16>(x), static_cast<u16>(y), w);
           ASSERT_EQ(set.translate(nullptr, x, y, w, &picture->params, &got), 0);
-          ASSERT_TRUE(same_pixel(got, bilinear_model(*picture, x, y, w)));
+          ASSERT_TRUE(same_pixel(got, bilinear_model(*picture, x, y, w))) << where();
         }
         EXPECT_GE(unclipped, picture->layer.width > 8 ? 100u : 0u);
         EXPECT_TRUE(picture->world.guards_intact());
