@@ -14,7 +14,7 @@ class ZR_ColorSettings;
 
 // The straight mean of the box of 2 * x_radius by 2 * y_radius around (x, y). Where the box is not wider or
 // higher than a pixel it is walked by point samples: bilinear for quality 1, bicubic for 2. For the three
-// pixel types; returns 0, or 3 while the point sampler's slot is empty.
+// pixel types; returns 0, or 3 where it needs a point sampler whose slot is empty.
 template <class T, i32 quality>
 ZR_API i32 ZR_AreaSample_CPlusPlus(const ZR_ProgressInfo* progress, i32 x, i32 y, const ZR_SampPB* params, T* dst);
 

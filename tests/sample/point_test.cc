@@ -87,17 +87,17 @@ TEST_F(PointSamplers, SpansEqualSinglePixelsAndSumTheirAlpha) {
   });
 }
 
+void nearest(i32 x, i32 y, const ZR_SampPB* params, ZR_Pixel8* dst) { ZR_NNSample(nullptr, x, y, params, dst); }
+void nearest(i32 x, i32 y, const ZR_SampPB* params, ZR_Pixel16* dst) { ZR_NNSample16(nullptr, x, y, params, dst); }
+void nearest(i32 x, i32 y, const ZR_SampPB* params, ZR_PixelFloat* dst) {
+  ZR_NNSampleFloat(nullptr, x, y, params, dst);
+}
 TEST_F(PointSamplers, NearestTakesHalvesToTheRightAndDown) {
   each_depth([]<class T>() {
     for (const auto& picture : pictures<T>())
       for (const auto& [x, y] : positions(picture->layer, 2000, 3)) {
         T got;
-        if constexpr (sizeof(T) == 4)
-          ZR_NNSample(nullptr, x, y, &picture->params, &got);
-        else if constexpr (sizeof(T) == 8)
-          ZR_NNSample16(nullptr, x, y, &picture->params, &got);
-        else
-          ZR_NNSampleFloat(nullptr, x, y, &picture->params, &got);
+        nearest(x, y, &picture->params, &got);
         const f64 column = std::floor(x / 65536.0 + 0.5), row = std::floor(y / 65536.0 + 0.5);
         ASSERT_TRUE(same_pixel(got, picture->at(static_cast<i64>(column), static_cast<i64>(row))))
             << picture->name << " at " << x << ", " << y;
@@ -199,6 +199,8 @@ TEST_F(PointSamplers, TheSetFollowsTheSlotsAndTheQuality) {
   ZR_Pixel8 out;
   EXPECT_EQ(ZR_AreaSample_Straight(nullptr, 0, 0, &picture.params, &out), 0);
   EXPECT_TRUE(same_pixel(out, ZR_Pixel8{1, 2, 3, 4}));
+  const SlotOverride emptied(ZR_Slot_bilinear_straight8, nullptr);
+  EXPECT_EQ(ZR_AreaSample_Straight(nullptr, 0, 0, &picture.params, &out), 3);
 }
 
 }  // namespace

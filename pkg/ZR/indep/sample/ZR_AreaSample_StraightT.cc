@@ -64,8 +64,9 @@ T mean_of(const Lanes<f64>& sum, const ZR_SampPB& params) {
 
 template <class T, i32 quality>
 i32 area_sample(const ZR_ProgressInfo* progress, i32 x, i32 y, const ZR_SampPB* params, T* dst) {
-  SampleFunc<T>* const point_sampler = sample_functions<T>(quality).clipping;
-  if (point_sampler == nullptr) return ZR_Err_Internal;
+  const bool thin = params->x_radius <= half_a_pixel || params->y_radius <= half_a_pixel;
+  SampleFunc<T>* const point_sampler = thin ? sample_functions<T>(quality).clipping : nullptr;
+  if (thin && point_sampler == nullptr) return ZR_Err_Internal;
   Lanes<f64> sum = Lanes<f64>::all(0.0);
   walk_box(
       x, y, *params,
