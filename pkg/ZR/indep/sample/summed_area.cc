@@ -81,13 +81,13 @@ auto limited(f64 v) {
 }
 
 // Sums of the four corners to a straight pixel: alpha over the whole area, colour over the sum of alpha.
-template <class O>
-O straight_mean(const Lanes<f64>& sum, f64 area) {
+// unweighted(c, alpha) says in which order the latter is rounded.
+template <class O, class Unweighted>
+O straight_mean(const Lanes<f64>& sum, f64 area, Unweighted&& unweighted) {
   const f64 alpha = sum.alpha();
   if (!(alpha > 0.0)) return O{};
-  const f64 scale = Depth<O>::white / alpha;
-  return {limited<O>(alpha / area), limited<O>(sum.low[1] * scale), limited<O>(sum.high[0] * scale),
-          limited<O>(sum.high[1] * scale)};
+  return {limited<O>(alpha / area), limited<O>(unweighted(sum.low[1], alpha)),
+          limited<O>(unweighted(sum.high[0], alpha)), limited<O>(unweighted(sum.high[1], alpha))};
 }
 
 // corner(u, v) is the sum of (0, 0) to there.
@@ -144,7 +144,8 @@ void ZR_SummedAreaTable_SampleDraft(i32 width, i32 height, const T* table, i32 l
     if (u == 0 || v == 0) return Lanes<f64>::all(0.0);
     return (static_cast<f64>(u) * v) * entry(table[static_cast<ptrdiff_t>(v - 1) * width + (u - 1)]);
   };
-  *dst = straight_mean<O>(sum_of_corners(corner, left, top, right, bottom), area);
+  *dst = straight_mean<O>(sum_of_corners(corner, left, top, right, bottom), area,
+                          [](f64 c, f64 alpha) { return c * (Depth<O>::white / alpha); });
 }
 
 template <class O, class T>
@@ -175,7 +176,8 @@ void ZR_SummedAreaTable_SampleAA(i32 width, i32 height, const T* table, f32 left
     add(fv * fu, iu + 1, iv + 1);
     return sum;
   };
-  *dst = straight_mean<O>(sum_of_corners(corner, left, top, right, bottom), area);
+  *dst = straight_mean<O>(sum_of_corners(corner, left, top, right, bottom), area,
+                          [](f64 c, f64 alpha) { return c / alpha * Depth<O>::white; });
 }
 
 #define ZR_INSTANTIATE(O, T)                                                                       \
