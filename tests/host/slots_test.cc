@@ -1,5 +1,6 @@
 // The slot table after birth, and what replacing a slot does.
 #include <ZR/composite.h>
+#include <ZR/copy_bits.h>
 #include <ZR/summed_area.h>
 
 #include <bitset>
@@ -14,8 +15,8 @@ struct Range {
   int first, last;
 };
 // Slots with a routine; every other one is null.
-constexpr Range filled[] = {{2, 10},  {17, 22}, {31, 31}, {35, 48}, {51, 53}, {57, 58}, {60, 61},
-                            {63, 65}, {68, 68}, {70, 78}, {83, 84}, {86, 87}, {94, 112}};
+constexpr Range filled[] = {{2, 10},  {17, 25}, {31, 32}, {35, 48}, {51, 53}, {57, 58}, {60, 61},
+                            {63, 65}, {68, 68}, {70, 78}, {83, 84}, {86, 87}, {94, 112}, {115, 117}};
 
 using Slots = BornLibrary;
 
@@ -54,7 +55,11 @@ TEST_F(Slots, HoldTheRoutineOfTheirName) {
       {84, address(&ZR_SubpixelSampleTranslateNoClip_Straight_4)},
       {86, address(&ZR_SubpixelSpanSampleTranslateNoClip_Straight)},
       {87, address(&ZR_SubpixelSpanSampleTranslateNoClip_Straight16)},
+      {23, address(&ZR_CopyBits_Draft_Static)},
+      {24, address(&ZR_CopyBits_HQ_Straight_Static)},
+      {25, address(&ZR_CopyBits_HQ_Premul_Static)},
       {31, address(&ZR_TransferRect_S)},
+      {32, address(&ZR_TransformWorld_S)},
       {52, address(&ZR_PremulRect_S)},
       {53, address(&ZR_IterateGeneric_Static)},
       {35, address(&zr::premul_row<ZR_Pixel8>)},

@@ -36,15 +36,14 @@ void copy_all(const CopyPlane& src, const CopyPlane& dst) {
 
 // With a size that the compiler knows, where it is a usual one.
 template <std::size_t known>
-void emit_row(const AxisWalk& walk, std::size_t size, const char* src_row, char* dst_pixels) {
-  walk.each([=](i32 k, std::ptrdiff_t x) {
-    const std::size_t bytes = known != 0 ? known : size;
-    std::memmove(dst_pixels + static_cast<std::size_t>(k) * bytes, src_row + x * static_cast<std::ptrdiff_t>(bytes),
-                 bytes);
-  });
+void emit_row(std::size_t size, i32 n, const i32* columns, const char* src_row, char* dst_pixels) {
+  const std::size_t bytes = known != 0 ? known : size;
+  for (i32 k = 0; k < n; ++k)
+    std::memmove(dst_pixels + static_cast<std::size_t>(k) * bytes,
+                 src_row + columns[k] * static_cast<std::ptrdiff_t>(bytes), bytes);
 }
 
-using EmitRow = void(const AxisWalk&, std::size_t size, const char* src_row, char* dst_pixels);
+using EmitRow = void(std::size_t size, i32 n, const i32* columns, const char* src_row, char* dst_pixels);
 
 EmitRow* emit_row_of(i64 bytes) {
   switch (bytes) {
@@ -76,8 +75,8 @@ i32 ZR_ChannelCopy(const ZR_ProgressInfo* /*progress*/, ZR_Chunk* src, ZR_Chunk*
     }
     zr::EmitRow* const emit = zr::emit_row_of(bytes);
     return zr::copy_scaled(in, from, out, to, zr::overflow_texts,
-                           [&](const zr::AxisWalk& walk, const char* src_row, char* dst_pixels) {
-                             emit(walk, static_cast<std::size_t>(bytes), src_row, dst_pixels);
+                           [&](i32 n, const i32* columns, const char* src_row, char* dst_pixels) {
+                             emit(static_cast<std::size_t>(bytes), n, columns, src_row, dst_pixels);
                            });
   });
 }

@@ -39,10 +39,10 @@ i32 copy_bits(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect, cons
     copy_in_place<To, From>(src, dst, from.rect);
     return ZR_Err_None;
   }
-  const auto emit = [](const AxisWalk& walk, const char* src_row, char* dst_pixels) {
+  const auto emit = [](i32 n, const i32* columns, const char* src_row, char* dst_pixels) {
     const From* const in = reinterpret_cast<const From*>(src_row);
     To* const out = reinterpret_cast<To*>(dst_pixels);
-    walk.each([=](i32 k, std::ptrdiff_t x) { out[k] = copy_pixel<To>(in[x]); });
+    for (i32 k = 0; k < n; ++k) out[k] = copy_pixel<To>(in[columns[k]]);
   };
   return copy_scaled({*src, sizeof(From)}, from, {*dst, sizeof(To)}, to, overflow_texts, emit);
 }

@@ -39,14 +39,10 @@ constexpr To copy_pixel(const From& p) {
 // n pixels to another depth; the rows do not overlap.
 template <class To, class From>
 void copy_row(i32 n, const From* src, To* dst) {
-  if constexpr (std::is_same_v<From, ZR_PixelFloat>) {
-    const auto* __restrict in = reinterpret_cast<const f32*>(src);
-    auto* __restrict out = reinterpret_cast<Channel<To>*>(dst);
-    const std::ptrdiff_t channels = std::ptrdiff_t{n} * 4;
-    for (std::ptrdiff_t k = 0; k < channels; ++k) out[k] = copy_channel<To, From>(in[k]);
-  } else {
+  if constexpr (std::is_same_v<From, ZR_PixelFloat>)
+    narrow_row(n, src, dst);
+  else
     convert_row(n, src, dst, false);
-  }
 }
 
 }  // namespace zr

@@ -44,23 +44,33 @@ CopyAxis clip_axis(const CopyAxis& axis, bool src_full, i32 src_size, bool dst_f
 }
 
 AxisWalk::AxisWalk(const CopyAxis& axis, i32 src_size, i32 dst_size)
-    : src_extent(wrap_sub(axis.src_end, axis.src_begin)), dst_extent(wrap_sub(axis.dst_end, axis.dst_begin)) {
+    : src_extent(wrap_sub(axis.src_end, axis.src_begin)),
+      dst_extent(wrap_sub(axis.dst_end, axis.dst_begin)),
+      src_begin(axis.src_begin),
+      dst_begin(axis.dst_begin) {
   if (src_extent < 1 || dst_extent < 1) return;
-  const i64 cells = src_extent, pixels = dst_extent;
+  const i64 cells = src_extent, pixels = dst_extent, src_from = src_begin, dst_from = dst_begin;
   // Destination pixels that the source pixels before n show; n is not negative, nor is anything here above 2^62.
   const auto shown_before = [=](i64 n) { return std::min(n, cells) * pixels / cells; };
-  const i64 src_begin = axis.src_begin, dst_begin = axis.dst_begin;
-  const i64 begin = std::max(std::max<i64>(0, -dst_begin), shown_before(std::max<i64>(0, -src_begin)));
-  const i64 end =
-      std::min(std::min(pixels, dst_size - dst_begin), shown_before(std::max<i64>(0, src_size - src_begin)));
+  const i64 begin = std::max(std::max<i64>(0, -dst_from), shown_before(std::max<i64>(0, -src_from)));
+  const i64 end = std::min(std::min(pixels, dst_size - dst_from), shown_before(std::max<i64>(0, src_size - src_from)));
   if (begin >= end) return;
-  first = static_cast<i32>(dst_begin + begin);
+  first = static_cast<i32>(dst_from + begin);
   count = static_cast<i32>(end - begin);
-  const i64 numerator = (begin + 1) * cells - 1;
-  src_first = src_begin + numerator / pixels;
-  remainder = static_cast<u32>(numerator % pixels);
-  whole_step = static_cast<i32>(cells / pixels);
-  remainder_step = static_cast<u32>(cells % pixels);
+}
+
+void AxisWalk::sources(i32 from, i32 n, i32* out) const {
+  const i64 cells = src_extent, pixels = dst_extent;
+  const i64 numerator = (i64{first} + from - dst_begin + 1) * cells - 1;
+  const i64 whole_step = cells / pixels, error_step = cells % pixels;
+  i64 at = src_begin + numerator / pixels, error = numerator % pixels;
+  for (i32 k = 0; k < n; ++k) {
+    out[k] = static_cast<i32>(at);
+    error += error_step;
+    const bool carry = error >= pixels;
+    error -= carry ? pixels : 0;
+    at += whole_step + carry;
+  }
 }
 
 }  // namespace zr

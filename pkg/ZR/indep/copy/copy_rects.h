@@ -5,9 +5,6 @@
 #include <ZR/depth.h>
 #include <ZR/types.h>
 
-#include <cstddef>
-#include <limits>
-
 namespace zr {
 
 // Truncating division that wraps where the quotient does not fit; b is not 0.
@@ -48,27 +45,10 @@ struct AxisWalk {
 
   i32 src_extent, dst_extent;  // of the clipped axis; may be 0 or negative, and then count is 0
   i32 first = 0, count = 0;    // destination pixels, in the world's coordinates
-  // Where the walk starts, and its step: whole source pixels and a remainder below dst_extent.
-  i64 src_first = 0;
-  u32 remainder = 0;
-  i32 whole_step = 0;
-  u32 remainder_step = 0;
+  i32 src_begin, dst_begin;
 
-  // Calls body(k, source pixel) for k in 0..count-1.
-  template <class Body>
-  void each(Body&& body) const {
-    const u32 wrap = static_cast<u32>(dst_extent);
-    const i32 n = count;
-    i64 at = src_first;
-    u32 error = remainder;
-    for (i32 k = 0; k < n; ++k) {
-      body(k, static_cast<std::ptrdiff_t>(at));
-      error += remainder_step;
-      const bool carry = error >= wrap;
-      error -= carry ? wrap : 0;
-      at += whole_step + carry;
-    }
-  }
+  // The source pixels of the destination pixels [from, from + n), counted from `first`.
+  void sources(i32 from, i32 n, i32* out) const;
 };
 
 }  // namespace zr

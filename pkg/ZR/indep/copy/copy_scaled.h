@@ -4,6 +4,7 @@
 #include <ZR/errors.h>
 #include <ZR/types.h>
 
+#include <algorithm>
 #include <cstring>
 
 #include "copy/copy_rects.h"
@@ -40,8 +41,7 @@ struct OverflowTexts {
   const char *x, *y;
 };
 
-// emit(walk, source row, destination row) writes walk.count pixels from the given destination pixel on; the source
-// row is that of the source's column 0.
+// emit(n, source columns, source row, destination pixels) writes n pixels; the source row is that of column 0.
 template <class EmitRow>
 i32 copy_scaled(const CopyPlane& src, const CopySide& from, const CopyPlane& dst, const CopySide& to,
                 const OverflowTexts& texts, EmitRow&& emit) {
@@ -55,19 +55,39 @@ i32 copy_scaled(const CopyPlane& src, const CopySide& from, const CopyPlane& dst
   if (y.src_extent < 1) return ZR_Err_None;
   if (y.dst_extent < 0) return failed_verification(texts.site, texts.y);
   if (y.dst_extent > 0 && x.src_extent > 0 && x.dst_extent < 0) return failed_verification(texts.site, texts.x);
-  if (x.count == 0) return ZR_Err_None;
 
-  const bool repeats_move = !src.may_overlap(dst);  // else the source row may have changed between its copies
-  const std::size_t bytes = static_cast<std::size_t>(x.count) * static_cast<std::size_t>(dst.pixel_bytes);
-  std::ptrdiff_t row_above = -1;
-  y.each([&](i32 k, std::ptrdiff_t src_row) {
-    char* const out = dst.at(x.first, i64{y.first} + k);
-    if (repeats_move && src_row == row_above)
-      std::memmove(out, dst.at(x.first, i64{y.first} + k - 1), bytes);
-    else
-      emit(x, src.at(0, src_row), out);
-    row_above = src_row;
-  });
+  // The columns' sources are worked out once for all rows, in blocks that fit a table. Where the planes may share
+  // memory the rows have to be finished one by one, and a row may have changed between its copies.
+  constexpr i32 block = 1024;
+  i32 columns[block], row;
+  const auto write_block = [&](i32 k, i32 column, i32 n) {
+    emit(n, columns, src.at(0, row), dst.at(i64{x.first} + column, i64{y.first} + k));
+  };
+  if (src.may_overlap(dst)) {
+    for (i32 k = 0; k < y.count; ++k) {
+      y.sources(k, 1, &row);
+      for (i32 column = 0; column < x.count; column += block) {
+        const i32 n = std::min(block, x.count - column);
+        x.sources(column, n, columns);
+        write_block(k, column, n);
+      }
+    }
+    return ZR_Err_None;
+  }
+  for (i32 column = 0; column < x.count; column += block) {
+    const i32 n = std::min(block, x.count - column);
+    x.sources(column, n, columns);
+    i32 row_above = -1;
+    for (i32 k = 0; k < y.count; ++k, row_above = row) {
+      y.sources(k, 1, &row);
+      if (row == row_above) {
+        char* const out = dst.at(i64{x.first} + column, i64{y.first} + k);
+        std::memmove(out, out - dst.row_bytes, static_cast<std::size_t>(n) * static_cast<std::size_t>(dst.pixel_bytes));
+      } else {
+        write_block(k, column, n);
+      }
+    }
+  }
   return ZR_Err_None;
 }
 
