@@ -12,11 +12,11 @@ std::string section(const char* title, const Keys& keys) {
   std::string text = std::string("\n") + title + '\n';
   for (const SceneKey& key : keys) {
     std::string line = std::string("  ") + key.name;
-    line.resize(std::max<size_t>(line.size() + 1, 14), ' ');
+    line.resize(std::max<size_t>(line.size() + 1, 16), ' ');
     line += key.values;
     if (*key.standard != '\0') line += std::string(" (default ") + key.standard + ')';
     text += line + '\n';
-    if (*key.meaning != '\0') text += std::string(14, ' ') + key.meaning + '\n';
+    if (*key.meaning != '\0') text += std::string(16, ' ') + key.meaning + '\n';
   }
   return text;
 }
