@@ -63,8 +63,8 @@ TEST_F(Placed, ALayerMovedByWholePixelsIsACopy) {
     for (const std::string keys :
          {R"("position":[3,-2])", R"("position":[8,1],"anchor":[5,3],"scale":1,"rotation":720,"skew":[0,0])",
           R"("matrix":[1,0,3,0,1,-2,0,0,1])", R"("position":[3,-2],"motion_blur":true)"}) {
-      folder.write("s.json", R"({"size":[13,7],"quality":")" + quality + R"(","layers":[{"image":"noise.png",)" + keys +
-                                 "}]}");
+      folder.write("s.json",
+                   R"({"size":[13,7],"quality":")" + quality + R"(","layers":[{"image":"noise.png",)" + keys + "}]}");
       ASSERT_EQ(run("render s.json -o s.png --force"), 0) << err;
       expect_picture("s.png", 13, 7, quality + keys, [&](i32 x, i32 y) { return noise(x - 3, y + 2); });
     }
@@ -89,7 +89,8 @@ TEST_F(Placed, QuarterTurnsOnlyRearrangePixels) {
   for (const auto& one : cases) {
     for (const std::string quality : {"draft", "bilinear", "bicubic"}) {
       if (std::string(one.options).find("quality") != std::string::npos && quality != "draft") continue;
-      const std::string more = std::string(one.options).find("quality") == std::string::npos ? " --quality " + quality : "";
+      const std::string more =
+          std::string(one.options).find("quality") == std::string::npos ? " --quality " + quality : "";
       ASSERT_EQ(run(std::string("transform noise.png -o t.png --force ") + one.options + more), 0) << err;
       expect_picture("t.png", one.width, one.height, one.options + more, one.pixel);
     }
@@ -150,7 +151,8 @@ TEST_F(Placed, MotionBlurFollowsATurnBetweenFrames) {
   const std::vector<int> row = alphas(
       R"("size":[8,1],"anchor":[0,0.5],"position":[10,2],
          "rotation":[{"frame":2,"value":0},{"frame":3,"value":360}],
-         "motion_blur":{"shutter_angle":355,"shutter_phase":0,"samples":60})", 1);
+         "motion_blur":{"shutter_angle":355,"shutter_phase":0,"samples":60})",
+      1);
   EXPECT_GT(row[4], 0) << "left of the pivot";
   EXPECT_GT(row[15], 0) << "and right of it";
   EXPECT_LT(row[15], 200);
@@ -161,16 +163,21 @@ TEST_F(Placed, FieldsLeaveTheOtherRowsAlone) {
     const char *scene, *layer, *option;
     std::vector<int> alpha;  // of the four rows
   } cases[] = {
-      {"none", "all", "", {255, 255, 255, 255}},        {"upper", "all", "", {255, 0, 255, 0}},
-      {"lower", "all", "", {0, 255, 0, 255}},           {"upper", "even", "", {255, 0, 255, 0}},
-      {"upper", "odd", "", {0, 0, 0, 0}},               {"none", "odd", "", {0, 255, 0, 255}},
-      {"upper", "all", "--field lower", {0, 255, 0, 255}}, {"upper", "all", "--field none", {255, 255, 255, 255}},
+      {"none", "all", "", {255, 255, 255, 255}},
+      {"upper", "all", "", {255, 0, 255, 0}},
+      {"lower", "all", "", {0, 255, 0, 255}},
+      {"upper", "even", "", {255, 0, 255, 0}},
+      {"upper", "odd", "", {0, 0, 0, 0}},
+      {"none", "odd", "", {0, 255, 0, 255}},
+      {"upper", "all", "--field lower", {0, 255, 0, 255}},
+      {"upper", "all", "--field none", {255, 255, 255, 255}},
   };
   for (const auto& one : cases) {
     for (const std::string turned : {"", R"(,"rotation":45,"scale":50)"}) {
-      folder.write("s.json", std::string(R"({"size":[2,4],"field":")") + one.scene +
-                                 R"(","layers":[{"colour":"#ffffff","size":[20,40],"anchor":[9,9],"position":[1,2],"field":")" +
-                                 one.layer + '"' + turned + "}]}");
+      folder.write("s.json",
+                   std::string(R"({"size":[2,4],"field":")") + one.scene +
+                       R"(","layers":[{"colour":"#ffffff","size":[20,40],"anchor":[9,9],"position":[1,2],"field":")" +
+                       one.layer + '"' + turned + "}]}");
       ASSERT_EQ(run(std::string("render s.json -o s.png --force ") + one.option), 0) << err;
       const OwnedWorld got = picture("s.png");
       for (i32 y = 0; y < 4; ++y)
