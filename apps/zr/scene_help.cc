@@ -30,7 +30,7 @@ std::string scene_help() {
              "  { \"size\": [960, 540], \"background\": \"#102030\", \"frames\": [1, 48],\n"
              "    \"layers\": [\n"
              "      { \"image\": \"media/street.jpg\" },\n"
-             "      { \"image\": \"media/logo.png\", \"position\": [480, 270], \"anchor\": [120, 120],\n"
+             "      { \"image\": \"media/logo.png\", \"position\": [480, 270], \"anchor\": [320, 160],\n"
              "        \"scale\": 0.5, \"motion_blur\": true,\n"
              "        \"rotation\": [ { \"frame\": 1, \"value\": 0 }, { \"frame\": 48, \"value\": 360 } ] },\n"
              "      { \"image\": \"media/balloon.png\", \"mode\": \"screen\", \"opacity\": 0.8,\n"
