@@ -13,6 +13,9 @@ if(ZR_SANITIZE)
     target_compile_options(zr_rules INTERFACE -fno-sanitize-recover=undefined)
   endif()
 endif()
+if(ZR_BUILD_FUZZ)  # the fuzzer follows which branches its inputs take
+  target_compile_options(zr_rules INTERFACE -fsanitize=fuzzer-no-link)
+endif()
 set(CMAKE_CXX_EXTENSIONS OFF)
 set(CMAKE_C_EXTENSIONS OFF)
 # -O3 for the row loops; assertions of the standard library stay out of release builds.

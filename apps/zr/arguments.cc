@@ -12,8 +12,9 @@
 namespace zr::tool {
 namespace {
 
-constexpr const Command* kCommands[] = {&kRenderCommand,  &kSheetCommand, &kTransformCommand, &kConvertCommand,
-                                        &kDisplayCommand, &kInfoCommand,  &kGalleryCommand,   &kListCommand};
+constexpr const Command* kCommands[] = {&kRenderCommand, &kSheetCommand,   &kTransformCommand,
+                                        &kResizeCommand, &kConvertCommand, &kDisplayCommand,
+                                        &kInfoCommand,   &kGalleryCommand, &kListCommand};
 constexpr const char* kVersion = "zr " ZR_TOOL_VERSION;
 
 std::string exit_code_help() {

@@ -10,12 +10,14 @@
 extern "C" {
 #endif
 
-/* Nearest neighbour by integer error accumulation, all nine depth pairs. */
+/* Nearest neighbour by integer error accumulation, all nine depth pairs. An inverted destination rectangle that
+ * touches its world fails with ZR_Err_Internal. `progress` is not read. */
 ZR_API i32 ZR_CopyBits_Draft(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst,
                              const GX_LRect* src_rect, const GX_LRect* dst_rect);
 ZR_API i32 ZR_CopyBits_Draft_Static(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst,
                                     const GX_LRect* src_rect, const GX_LRect* dst_rect);
-/* Bilinear where neither axis shrinks, else the mean of each pixel's footprint. Sizes that differ need one depth. */
+/* Bilinear where neither axis shrinks, else the mean of each pixel's footprint. Sizes that differ need one depth.
+ * Only the abort function is asked, after rows 0, 64, 128, ... An inverted destination copies nothing. */
 ZR_API i32 ZR_CopyBits_HQ_Straight(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst,
                                    const GX_LRect* src_rect, const GX_LRect* dst_rect);
 ZR_API i32 ZR_CopyBits_HQ_Straight_Static(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst,
@@ -43,7 +45,8 @@ ZR_API i32 ZR_WorldCopy_HQ_Premul(void* unused, RS_World** src, RS_World** dst, 
 /* The draft copy on chunks, whose elements have one size in bytes. */
 ZR_API i32 ZR_ChannelCopy(const ZR_ProgressInfo* progress, ZR_Chunk* src, ZR_Chunk* dst, const GX_LRect* src_rect,
                           const GX_LRect* dst_rect);
-/* Nearest neighbour through a matrix; what the image does not cover inside `clip` (null: all) is cleared. */
+/* Nearest neighbour through a matrix, inside `clip` (null: all). Where nothing of the image falls there, `clip` is
+ * cleared; else the whole rest of the world is. Polls after rows 0, 64, 128, ... of the image. */
 ZR_API i32 ZR_CopyBits3_LO_Straight(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const GX_Matrix3* matrix,
                                     bool src2dst, const GX_LRect* clip, ZR_LayerDef* dst);
 

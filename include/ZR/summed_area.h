@@ -14,7 +14,7 @@ class ZR_ColorSettings;
 
 // The straight mean of the box of 2 * x_radius by 2 * y_radius around (x, y). Where the box is not wider or
 // higher than a pixel it is walked by point samples: bilinear for quality 1, bicubic for 2. For the three
-// pixel types; returns 0, or 3 while the point sampler's slot is empty.
+// pixel types; returns 0, or 3 where it needs a point sampler whose slot is empty.
 template <class T, i32 quality>
 ZR_API i32 ZR_AreaSample_CPlusPlus(const ZR_ProgressInfo* progress, i32 x, i32 y, const ZR_SampPB* params, T* dst);
 
@@ -52,3 +52,34 @@ ZR_API void ZR_SummedAreaTable_SampleDraft(i32 width, i32 height, const T* table
 template <class O, class T>
 ZR_API void ZR_SummedAreaTable_SampleAA(i32 width, i32 height, const T* table, f32 left, f32 top, f32 right, f32 bottom,
                                         O* dst);
+
+// Running sums of each row of a world, for walks that average runs of a row at every pixel of an output of
+// another size. Sums are premultiplied, of channels 0..1, in linear light where the settings ask for it.
+template <class T>
+class ZR_API ZR_HorizontalSumTable {
+ public:
+  // The output has ceil(scale * output_width) by ceil(scale * output_height) pixels. Runs reach up to the box
+  // of 2 * radius_x by 2 * radius_y beyond the world; with transform_radius that box is scaled by
+  // (radius_scale_x, radius_scale_y) and turned by `degrees` first, and its bounds count. settings, or where
+  // they are null the fallback, name the linear-light tables; both may be null. Throws an i32: out of memory,
+  // or ZR_Err_Internal for sizes that are no number or beyond 30000.
+  ZR_HorizontalSumTable(const ZR_WorldX<T>* world, i32 output_width, i32 output_height, f64 scale, f64 radius_x,
+                        f64 radius_y, f64 radius_scale_x, f64 radius_scale_y, f64 degrees, bool transform_radius,
+                        const ZR_ColorSettings* settings, const ZR_ColorSettings* fallback);
+  ~ZR_HorizontalSumTable();
+  ZR_HorizontalSumTable(const ZR_HorizontalSumTable&) = delete;
+  ZR_HorizontalSumTable& operator=(const ZR_HorizontalSumTable&) = delete;
+
+  i32 OutputWidth() const { return output_width_; }
+  i32 OutputHeight() const { return output_height_; }
+  i32 PaddingX() const { return padding_x_; }
+  i32 PaddingY() const { return padding_y_; }
+  // Row y of the world: entry n is the sum of columns -PaddingX()..n - PaddingX() - 1, the last one that of
+  // all columns up to width + PaddingX() - 1. So columns a..b - 1 sum up to [b + PaddingX()] - [a + PaddingX()].
+  const ZR_PixelFloat* Row(i32 y) const { return sums_ + static_cast<size_t>(y) * static_cast<size_t>(entries_); }
+  i32 Entries() const { return entries_; }
+
+ private:
+  ZR_PixelFloat* sums_ = nullptr;
+  i32 output_width_ = 0, output_height_ = 0, padding_x_ = 0, padding_y_ = 0, entries_ = 0;
+};

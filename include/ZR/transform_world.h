@@ -1,4 +1,21 @@
-/* A layer drawn through a matrix, or through the matrices of a shutter interval. */
+/* A layer drawn through a matrix, or through the matrices of a shutter interval.
+ *
+ * quality   0 draft (nearest pixels), 1 bilinear, 2 and 3 bicubic; where the layer shrinks, all but draft
+ *           take the mean of the box that a destination pixel covers. flags are not read.
+ * field     1 draws even rows, 2 odd rows, anything else all.
+ * matrices  `count` of them (at least 1), first to last of the time that the shutter is open, mapping source to
+ *           destination if src2dst, else back. Pixel centres lie on halves. Positions in the source are kept
+ *           within -32767..32766, and along a row they run in even steps. Ends that differ draw motion: of two
+ *           matrices the mean of 17 samples between them (draft: 9), of more the mean of one through each, or,
+ *           in draft and where they lie on a straight line, of as many between the ends.
+ * tables    linear light for the blend, or null. mode->tables is not read.
+ * mask      over the destination and of its depth, or null.
+ * dst_rect  the pixels of dst that may be drawn. src and dst have one depth; they should not share pixels.
+ * Polls     with one matrix every 32nd row of what is drawn (draft: 64th), with more every 8th, under a field
+ *           half as often; the answer of a poll that is not 0 is the result, and what is drawn stays.
+ * Failure   3 for null arguments, worlds without pixels and depths that differ; 4; 5 for an unknown mode. A
+ *           matrix that cannot be inverted at either end, or that reaches no pixel, draws nothing and gives 0.
+ */
 #ifndef ZR_TRANSFORM_WORLD_H
 #define ZR_TRANSFORM_WORLD_H
 
@@ -8,10 +25,12 @@
 extern "C" {
 #endif
 
+/* Jumps through its slot; a replacement is handed the pixels that the layer reaches instead of dst_rect. */
 ZR_API i32 ZR_TransformWorld(const ZR_ProgressInfo* progress, i32 quality, u32 flags, i32 field, ZR_LayerDef* src,
                              const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables,
                              const ZR_MaskWorld* mask, const GX_Matrix3* matrices, i32 count, bool src2dst,
                              const GX_LRect* dst_rect, ZR_LayerDef* dst);
+/* The default body. Uses the shared scratch: not for two threads at once. */
 ZR_API i32 ZR_TransformWorld_S(const ZR_ProgressInfo* progress, i32 quality, u32 flags, i32 field, ZR_LayerDef* src,
                                const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables,
                                const ZR_MaskWorld* mask, const GX_Matrix3* matrices, i32 count, bool src2dst,

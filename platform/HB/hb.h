@@ -50,3 +50,6 @@ i32 HB_TranslateAndReportException(const std::exception& error) noexcept;
 // Reads the processor into the record behind HB_G_CPU_DataP, capped by the "cpu" preference; ZR_Birth
 // calls it, alone. Before that all words are zero.
 void HB_PrepareCpuData();
+
+// The four bytes of a word in the opposite order.
+constexpr u32 HB_LongSwap(u32 word) { return word << 24 | (word & 0xff00u) << 8 | (word >> 8 & 0xff00u) | word >> 24; }

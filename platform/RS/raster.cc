@@ -77,3 +77,5 @@ extern "C" void RS_UnlockPixels(RS_World** raster) {
 void* RSp_GetPixBaseAddr(RS_World** raster) {
   return raster != nullptr && *raster != nullptr ? (*raster)->base : nullptr;
 }
+
+i32 RS_GetChannelOrder(RS_World** raster) { return (*raster)->channel_order; }

@@ -16,3 +16,5 @@ void RS_FreeFrame(void* frame, std::size_t bytes);
 void RS_ReportWorldAllocationFailure(i32 code, i32 row_bytes, i32 width, i32 height, i32 bits_per_pixel);
 // Where the pixels of a frame are whose record has no base address yet; null when it has no memory.
 void* RSp_GetPixBaseAddr(RS_World** raster);
+// The byte order of a 32-bit raster: 0 alpha first, 1 blue first.
+i32 RS_GetChannelOrder(RS_World** raster);

@@ -34,7 +34,7 @@ struct TransformCall {
   }
 };
 
-inline i32 fixed_point(f64 v) { return static_cast<i32>(65536 * v + (v < 0 ? -0.5 : 0.5)); }
+inline i32 fixed_point(f64 v) { return zr::truncate_i32(65536 * v + (v < 0 ? -0.5 : 0.5)); }
 inline f64 limited(f64 v) { return std::fmin(std::fmax(v, -32767), 32766); }
 
 // One matrix, both ways.
@@ -75,7 +75,7 @@ class TransformModel {
     if (!placed_.front() || (moves && !placed_.back())) return;
     for (const auto& placed : placed_)
       if (placed) extend_bounds(*placed);
-    if (bounds_.right <= bounds_.left || bounds_.bottom <= bounds_.top) return;
+    if (GX_EmptyLRect(&bounds_)) return;
 
     const i32 xfer = call_.mode.xfer;
     const bool clears = xfer == 17 || xfer == 18;
@@ -115,31 +115,25 @@ class TransformModel {
   }
 
   void extend_bounds(const PlacedLayer& placed) {
-    const auto cut = [](const GX_LRect& a, const GX_LRect& b) {
-      return GX_LRect{std::max(a.left, b.left), std::max(a.top, b.top), std::min(a.right, b.right),
-                      std::min(a.bottom, b.bottom)};
-    };
-    const auto empty = [](const GX_LRect& r) { return r.right <= r.left || r.bottom <= r.top; };
     const auto image = [](const GX_Matrix3& matrix, const GX_LRect& r) {
       GX_FloatRect box{f64(r.left), f64(r.top), f64(r.right), f64(r.bottom)};
       GX_TransformFloatRect(&matrix, &box, &box);
       const auto round = [](f64 v) { return static_cast<i32>(std::lround(limited(v))); };
       return GX_LRect{round(box.left) - 1, round(box.top) - 1, round(box.right) + 1, round(box.bottom) + 1};
     };
-    GX_LRect area = cut(call_.rect, {0, 0, dst_.width(), dst_.height()});
+    GX_LRect area = {0, 0, dst_.width(), dst_.height()};
+    const GX_LRect around_source = {-1, -1, src_.width() + 1, src_.height() + 1};
+    bool any = GX_SectLRect(&area, &call_.rect, &area);
     if (call_.mask != nullptr && call_.mask->kind % 2 == 0) {
       const ZR_MaskWorld& mask = *call_.mask;
-      area = cut(area,
-                 {mask.offset_x, mask.offset_y, mask.offset_x + mask.world.width, mask.offset_y + mask.world.height});
+      const GX_LRect matte = {mask.offset_x, mask.offset_y, mask.offset_x + mask.world.width,
+                              mask.offset_y + mask.world.height};
+      any = GX_SectLRect(&area, &matte, &area) && any;
     }
-    if (empty(area)) return;
-    const GX_LRect seen = cut(image(placed.to_src, area), {-1, -1, src_.width() + 1, src_.height() + 1});
-    if (empty(seen)) return;
-    const GX_LRect more = cut(image(placed.to_dst, seen), area);
-    if (empty(more)) return;
-    if (empty(bounds_)) bounds_ = more;
-    bounds_ = {std::min(bounds_.left, more.left), std::min(bounds_.top, more.top), std::max(bounds_.right, more.right),
-               std::max(bounds_.bottom, more.bottom)};
+    GX_LRect seen = image(placed.to_src, area);
+    any = any && GX_SectLRect(&seen, &around_source, &seen);
+    GX_LRect more = image(placed.to_dst, seen);
+    if (any && GX_SectLRect(&more, &area, &more)) GX_UnionLRect(&bounds_, &more, &bounds_);
   }
 
   bool turns_or_is_uneven() const {
@@ -163,10 +157,7 @@ class TransformModel {
     return std::fabs(far(0, middle) - far(middle, o.size() - 1)) >= 1.5;
   }
 
-  T nearest(GX_LPoint p) const {
-    const i32 x = p.x >> 16, y = p.y >> 16;
-    return x >= 0 && x < src_.width() && y >= 0 && y < src_.height() ? src_.at(x, y) : T{};
-  }
+  T nearest(GX_LPoint p) const { return inside(p) ? src_.at(p.x >> 16, p.y >> 16) : T{}; }
   T best(const PlacedLayer& placed, GX_LPoint p) const {
     ZR_SampPB params{};
     params.src = src_.layer();
@@ -176,7 +167,10 @@ class TransformModel {
     (placed.shrinks() ? samplers_.area : samplers_.clipping)(nullptr, p.x, p.y, &params, &out);
     return out;
   }
-  bool whole_neighbourhood(GX_LPoint p) const {
+  // The sample's whole neighbourhood lies inside, or, in draft, the pixel does.
+  bool inside(GX_LPoint p) const {
+    const i32 x = p.x >> 16, y = p.y >> 16;
+    if (call_.quality == 0) return x >= 0 && x < src_.width() && y >= 0 && y < src_.height();
     ZR_SampPB params{};
     params.src = src_.layer();
     T out{};
@@ -203,10 +197,6 @@ class TransformModel {
     const auto back_from_end = [&](i32 k) {
       return GX_LPoint{p1.x - (samples_ - 1 - k) * dx, p1.y - (samples_ - 1 - k) * dy};
     };
-    const auto inside = [&](GX_LPoint p) {
-      if (!draft) return whole_neighbourhood(p);
-      return (p.x >> 16) >= 0 && (p.x >> 16) < src_.width() && (p.y >> 16) >= 0 && (p.y >> 16) < src_.height();
-    };
     i32 entry = 0, exit = samples_;  // samples from `exit` on are counted back from the end
     while (entry < samples_ && !inside(ahead(entry))) ++entry;
     if (entry < samples_ && (draft || !front.shrinks())) {
@@ -221,7 +211,7 @@ class TransformModel {
       const GX_LPoint p = k < exit ? ahead(k) : back_from_end(k);
       if (draft) {
         taken.push_back(nearest(p));
-      } else if (k > entry && k < exit && unit(front) && unit(back)) {
+      } else if (k > entry && k < exit && !front.shrinks() && unit(front) && unit(back)) {
         f64 weights[4];
         ZR_SubpixelSampleComputeWeight(static_cast<u16>(p.x), static_cast<u16>(p.y), weights);
         ZR_SampPB params{};

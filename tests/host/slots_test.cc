@@ -1,5 +1,7 @@
 // The slot table after birth, and what replacing a slot does.
 #include <ZR/composite.h>
+#include <ZR/copy_bits.h>
+#include <ZR/summed_area.h>
 
 #include <bitset>
 
@@ -13,8 +15,8 @@ struct Range {
   int first, last;
 };
 // Slots with a routine; every other one is null.
-constexpr Range filled[] = {{2, 10},  {17, 22}, {31, 31}, {35, 48}, {51, 53}, {57, 58}, {60, 61},
-                            {63, 65}, {68, 68}, {70, 78}, {83, 84}, {86, 87}, {94, 112}};
+constexpr Range filled[] = {{2, 10},  {17, 25}, {31, 32}, {35, 48}, {51, 53}, {57, 58}, {60, 61},
+                            {63, 65}, {68, 68}, {70, 78}, {83, 84}, {86, 87}, {94, 112}, {115, 117}};
 
 using Slots = BornLibrary;
 
@@ -34,7 +36,30 @@ TEST_F(Slots, HoldTheRoutineOfTheirName) {
     int slot;
     void* routine;
   } cases[] = {
+      {2, address(&ZR_NNSample)},
+      {3, address(&ZR_SubpixelSample_Straight)},
+      {4, address(&ZR_SubpixelSample_Premul)},
+      {5, address(&ZR_AreaSample_CPlusPlus<ZR_Pixel8, 1>)},
+      {6, address(&ZR_AreaSample_Premul)},
+      {57, address(&ZR_SubpixelSampleComputeWeight)},
+      {58, address(&ZR_SubpixelSampleTranslateNoClip_Straight)},
+      {60, address(&ZR_SubpixelSamplePlus_Straight)},
+      {61, address(&ZR_SubpixelSampleNoClip_Straight)},
+      {63, address(&ZR_NNSample16)},
+      {64, address(&ZR_SubpixelSample_Straight16)},
+      {65, address(&ZR_AreaSample_CPlusPlus<ZR_Pixel16, 1>)},
+      {68, address(&ZR_SubpixelSampleTranslateNoClip_Straight16)},
+      {70, address(&ZR_SubpixelSamplePlus_Straight16)},
+      {71, address(&ZR_SubpixelSampleNoClip_Straight16)},
+      {83, address(&ZR_SubpixelSampleNoClip_Straight_4)},
+      {84, address(&ZR_SubpixelSampleTranslateNoClip_Straight_4)},
+      {86, address(&ZR_SubpixelSpanSampleTranslateNoClip_Straight)},
+      {87, address(&ZR_SubpixelSpanSampleTranslateNoClip_Straight16)},
+      {23, address(&ZR_CopyBits_Draft_Static)},
+      {24, address(&ZR_CopyBits_HQ_Straight_Static)},
+      {25, address(&ZR_CopyBits_HQ_Premul_Static)},
       {31, address(&ZR_TransferRect_S)},
+      {32, address(&ZR_TransformWorld_S)},
       {52, address(&ZR_PremulRect_S)},
       {53, address(&ZR_IterateGeneric_Static)},
       {35, address(&zr::premul_row<ZR_Pixel8>)},
@@ -96,6 +121,8 @@ TEST_F(Slots, ExportsJumpThroughThem) {
       {ZR_Slot_composite_rect_best_straight, answering<1009>(&ZR_CompositeRectBest_Straight)},
       {ZR_Slot_composite_rect_best_premul, answering<1010>(&ZR_CompositeRectBest_Premul)},
       {ZR_Slot_premul_rect, answering<1052>(&ZR_PremulRect)},
+      {ZR_Slot_area_straight8, answering<1005>(&ZR_AreaSample_Straight)},
+      {ZR_Slot_area_straight16, answering<1065>(&ZR_AreaSample_Straight16)},
   };
   EXPECT_EQ(ZR_Iterate(nullptr, 0, 0, nullptr, nullptr, nullptr, nullptr, nullptr), 1042);
   EXPECT_EQ(ZR_IterateOrigin(nullptr, 0, 0, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr), 1043);
@@ -111,6 +138,8 @@ TEST_F(Slots, ExportsJumpThroughThem) {
   EXPECT_EQ(ZR_CompositeRectBest_Straight(nullptr, nullptr, 0, nullptr, 0, 0, 0, 0, nullptr), 1009);
   EXPECT_EQ(ZR_CompositeRectBest_Premul(nullptr, nullptr, 0, nullptr, 0, 0, 0, 0, nullptr), 1010);
   EXPECT_EQ(ZR_PremulRect(nullptr, 0, nullptr, nullptr), 1052);
+  EXPECT_EQ(ZR_AreaSample_Straight(nullptr, 0, 0, nullptr, nullptr), 1005);
+  EXPECT_EQ(ZR_AreaSample_Straight16(nullptr, 0, 0, nullptr, nullptr), 1065);
 }
 
 TEST_F(Slots, AnEmptiedSlotFailsItsExport) {

@@ -73,12 +73,12 @@ bool is_complex_motion(const MatrixList& list, const Shutter& shutter) {
   GX_FloatPoint start{}, first_move{}, before{}, middle{};
   const i32 half = (list.count - (list.count % 2 == 0)) / 2;
   for (i32 i = 0; i < list.count; ++i) {
-    GX_Matrix3 forward = list.matrices[i];
-    // What has no forward matrix has no place on a line either.
-    if (!list.src2dst && GX_InverseMatrixQuiet(&list.matrices[i], &forward) != 0) return true;
+    Placement placement;
+    // A gap in the list is a gap in the motion.
+    if (!make_placement(list.matrices[i], list.src2dst, &placement)) return true;
     constexpr GX_FloatPoint origin = {0, 0};
     GX_FloatPoint here;
-    GX_Matrix3_TransformPointAndDivide(&forward, &origin, &here);
+    GX_Matrix3_TransformPointAndDivide(&placement.forward, &origin, &here);
     const GX_FloatPoint move = {here.x - before.x, here.y - before.y};
     if (i == 0) start = here;
     if (i == 1) first_move = move;

@@ -79,7 +79,9 @@ class Workspace {
   void* own_[2] = {};
 };
 
-// The samples of one pixel, evenly spaced from where the first matrix puts it to where the last one does.
+// The samples of one pixel, evenly spaced from where the first matrix puts it to where the last one does. All
+// of them together step over at most half of the number circle, so that between two inside samples every one
+// is inside, also where the line wraps.
 class SampleLine {
  public:
   SampleLine(i32 x0, i32 y0, i32 x1, i32 y1, i32 samples)
@@ -94,12 +96,7 @@ class SampleLine {
   // division dropped.
   GX_LPoint from_first(i32 k) const { return {wrap_add(x0_, wrap_mul(k, dx_)), wrap_add(y0_, wrap_mul(k, dy_))}; }
   GX_LPoint from_last(i32 k) const { return {wrap_sub(x1_, wrap_mul(k, dx_)), wrap_sub(y1_, wrap_mul(k, dy_))}; }
-  // No step wraps, so that samples between two inside ones are inside.
-  bool straight() const {
-    i32 unused;
-    return !__builtin_sub_overflow(x1_, x0_, &unused) && !__builtin_sub_overflow(y1_, y0_, &unused);
-  }
-  // A straight line that no sample with the widest point kernel sees the world from.
+  // No sample sees the world, however wide its kernel.
   bool misses(i32 width, i32 height) const {
     constexpr i64 reach = 3 * i64{65536};
     return std::max(x0_, x1_) <= -reach || std::max(y0_, y1_) <= -reach ||
@@ -167,10 +164,8 @@ class DraftMotionRow final : public RowSampler<T> {
     while (end > first && !inside(line.from_last(n - end))) --end;
     const bool has_last = end > first;
     const i32 inner_end = has_last ? end - 1 : end;
-    const bool straight = line.straight();
     GX_LPoint p = line.from_first(first);
-    for (i32 k = first; k < inner_end; ++k, p = {wrap_add(p.x, line.dx()), wrap_add(p.y, line.dy())})
-      if (straight || inside(p)) sum.add(at(p));
+    for (i32 k = first; k < inner_end; ++k, p = {wrap_add(p.x, line.dx()), wrap_add(p.y, line.dy())}) sum.add(at(p));
     if (has_last) sum.add(at(line.from_last(n - end)));
     return sum.mean(n);
   }
@@ -233,8 +228,7 @@ class BestMotionRow final : public RowSampler<T> {
   }
   T pixel(const SampleLine& line) {
     const i32 n = walk_.samples;
-    const bool straight = line.straight();
-    if (straight && line.misses(params_.src->width, params_.src->height)) return T{};
+    if (line.misses(params_.src->width, params_.src->height)) return T{};
     MotionSum<T> sum;
     i32 first = 0, end = n;
     for (bool in = false; first < end && !in; ++first) {
@@ -252,9 +246,7 @@ class BestMotionRow final : public RowSampler<T> {
         sum.add(sample);
       }
     };
-    if (!straight)
-      inner([&](i32, T* out) { return samplers_.clipping(nullptr, p.x, p.y, &params_, out); });
-    else if (weights_ != nullptr)
+    if (weights_ != nullptr)
       inner([&](i32 k, T* out) { return samplers_.translate(nullptr, p.x, p.y, weights_[k], &params_, out); });
     else
       inner([&](i32, T* out) { return samplers_.no_clipping(nullptr, p.x, p.y, &params_, out); });

@@ -1,6 +1,8 @@
 // Default contents of the slot table.
 #include "host/slot_defaults.h"
 
+#include <ZR/copy_bits.h>
+
 #include "composite/composite_rect.h"
 #include "composite/ground_rows.h"
 #include "composite/transfer_rect.h"
@@ -48,6 +50,9 @@ void fill_default_slots() {
   set_slot<ZR_Slot_composite_behind_row_straight>(&composite_behind_row_straight);
   set_slot<ZR_Slot_composite_behind_row_premul>(&composite_behind_row_premul);
   set_slot<ZR_Slot_transfer_rect>(&ZR_TransferRect_S);
+  set_slot<ZR_Slot_copy_bits_draft>(&ZR_CopyBits_Draft_Static);
+  set_slot<ZR_Slot_copy_bits_hq_straight>(&ZR_CopyBits_HQ_Straight_Static);
+  set_slot<ZR_Slot_copy_bits_hq_premul>(&ZR_CopyBits_HQ_Premul_Static);
   set_slot<ZR_Slot_transform_world>(&ZR_TransformWorld_S);
   set_slot<ZR_Slot_iterate>(&iterate_body);
   set_slot<ZR_Slot_iterate_origin>(&iterate_origin_body);

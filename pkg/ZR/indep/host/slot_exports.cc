@@ -1,4 +1,6 @@
 // Exports of replaceable routines: each jumps through its slot.
+#include <ZR/copy_bits.h>
+
 #include "world/slot_table.h"
 
 using zr::call_slot;
@@ -68,6 +70,21 @@ i32 ZR_CompositeRectBest_Premul(const ZR_ProgressInfo* progress, const GX_LRect*
 
 i32 ZR_PremulRect(const ZR_ProgressInfo* progress, i32 forward, const GX_LRect* rect, ZR_LayerDef* dst) {
   return call_slot<ZR_Slot_premul_rect>(progress, forward, rect, dst);
+}
+
+i32 ZR_CopyBits_Draft(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect,
+                      const GX_LRect* dst_rect) {
+  return call_slot<ZR_Slot_copy_bits_draft>(progress, src, dst, src_rect, dst_rect);
+}
+
+i32 ZR_CopyBits_HQ_Straight(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst,
+                            const GX_LRect* src_rect, const GX_LRect* dst_rect) {
+  return call_slot<ZR_Slot_copy_bits_hq_straight>(progress, src, dst, src_rect, dst_rect);
+}
+
+i32 ZR_CopyBits_HQ_Premul(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect,
+                          const GX_LRect* dst_rect) {
+  return call_slot<ZR_Slot_copy_bits_hq_premul>(progress, src, dst, src_rect, dst_rect);
 }
 
 i32 ZR_AreaSample_Straight(const ZR_ProgressInfo* progress, i32 x, i32 y, const ZR_SampPB* params, ZR_Pixel8* dst) {

@@ -19,40 +19,22 @@ Lanes<f64> weighted(const T& p) {
   return alpha * c;
 }
 
-// The sum of n pixels beside each other. Integer sums are exact, so their order does not matter.
-template <class T>
-Lanes<f64> sum_of(const T* p, i32 n) {
-  Lanes<f64> sum = Lanes<f64>::all(0.0);
-  for (i32 i = 0; i < n; ++i) sum = sum + weighted(p[i]);
-  return sum;
-}
-template <>
-Lanes<f64> sum_of(const ZR_Pixel8* p, i32 n) {
-  u32 sum[4] = {};  // n is below 32768, a product at most 255 * 255
-  for (i32 i = 0; i < n; ++i) {
-    const u32 alpha = p[i].alpha;
-    sum[0] += alpha, sum[1] += alpha * p[i].red, sum[2] += alpha * p[i].green, sum[3] += alpha * p[i].blue;
-  }
-  return {f64x2{static_cast<f64>(sum[0]), static_cast<f64>(sum[1])},
-          f64x2{static_cast<f64>(sum[2]), static_cast<f64>(sum[3])}};
-}
-
+// Pixel by pixel in reading order: where a mean falls between two values the roundings of the sum decide.
 template <class T>
 Lanes<f64> sum_of_box(const ZR_LayerDef& src, const BoxAxis& across, const BoxAxis& down) {
   Lanes<f64> sum = Lanes<f64>::all(0.0);
-  const auto row = [&](i32 y, f64 height) {  // extents in pixels
-    across.walk(
-        [&](i32 x, u32 width) {
-          sum = sum + (height * (static_cast<f64>(width) * 0x1p-16)) * weighted(*pixel_at<T>(src, x, y));
-        },
-        [&](i32 first, i32 end) {
-          if (first < end) sum = sum + height * sum_of(pixel_at<T>(src, first, y), end - first);
-        });
+  const auto row = [&](i32 y, u32 height) {
+    const auto pixels = [&](i32 first, i32 end, u32 width) {
+      const f64 area = static_cast<f64>(static_cast<u64>(width) * height) * 0x1p-32;
+      const T* const p = pixel_at<T>(src, 0, y);
+      for (i32 x = first; x < end; ++x) sum = sum + area * weighted(p[x]);
+    };
+    across.walk([&](i32 x, u32 width) { pixels(x, x + 1, width); },
+                [&](i32 first, i32 end) { pixels(first, end, 0x10000u); });
   };
-  down.walk([&](i32 y, u32 height) { row(y, static_cast<f64>(height) * 0x1p-16); },
-            [&](i32 first, i32 end) {
-              for (i32 y = first; y < end; ++y) row(y, 1.0);
-            });
+  down.walk(row, [&](i32 first, i32 end) {
+    for (i32 y = first; y < end; ++y) row(y, 0x10000u);
+  });
   return sum;
 }
 
@@ -82,8 +64,9 @@ T mean_of(const Lanes<f64>& sum, const ZR_SampPB& params) {
 
 template <class T, i32 quality>
 i32 area_sample(const ZR_ProgressInfo* progress, i32 x, i32 y, const ZR_SampPB* params, T* dst) {
-  SampleFunc<T>* const point_sampler = sample_functions<T>(quality).clipping;
-  if (point_sampler == nullptr) return ZR_Err_Internal;
+  const bool thin = params->x_radius <= half_a_pixel || params->y_radius <= half_a_pixel;
+  SampleFunc<T>* const point_sampler = thin ? sample_functions<T>(quality).clipping : nullptr;
+  if (thin && point_sampler == nullptr) return ZR_Err_Internal;
   Lanes<f64> sum = Lanes<f64>::all(0.0);
   walk_box(
       x, y, *params,

@@ -29,18 +29,17 @@ struct IntegerBilinear {
   static constexpr bool copies_whole_positions = true;
 
   static Pixel mix(const Pixel* const (&rows)[2], const BilinearWeights<Real>& weights) {
-    const Pixel p[4] = {rows[0][0], rows[0][1], rows[1][0], rows[1][1]};
-    const Word word = std::bit_cast<Word>(p[0]);
-    if (word == std::bit_cast<Word>(p[1]) && word == std::bit_cast<Word>(p[2]) && word == std::bit_cast<Word>(p[3]))
-      return p[0];
+    const Word p[4] = {word(rows[0][0]), word(rows[0][1]), word(rows[1][0]), word(rows[1][1])};
+    const Word difference = (p[0] ^ p[1]) | (p[0] ^ p[2]) | (p[0] ^ p[3]);
+    if (difference == 0) return rows[0][0];
     const Real w[4] = {weights.w00, weights.w10, weights.w01, weights.w11};
-    const Lanes<Real> c[4] = {channels<Real>(p[0]), channels<Real>(p[1]), channels<Real>(p[2]), channels<Real>(p[3])};
-    const Lanes<Real> half = Lanes<Real>::all(Real{0.5});
-    if (p[0].alpha == p[1].alpha && p[0].alpha == p[2].alpha && p[0].alpha == p[3].alpha) {
-      if (p[0].alpha == 0) return Pixel{};
-      Pixel mixed = narrow(in_pairs(w, c) + half);
-      mixed.alpha = p[0].alpha;  // not rounded
-      return mixed;
+    const Lanes<Real> c[4] = {channels<Real>(pixel(p[0])), channels<Real>(pixel(p[1])), channels<Real>(pixel(p[2])),
+                              channels<Real>(pixel(p[3]))};
+    constexpr Word alpha_bits = std::numeric_limits<Channel<Pixel>>::max();
+    if ((difference & alpha_bits) == 0) {
+      if ((p[0] & alpha_bits) == 0) return Pixel{};
+      const Pixel mixed = narrow(in_pairs(w, c) + Lanes<Real>::all(Real{0.5}));
+      return pixel((word(mixed) & static_cast<Word>(~alpha_bits)) | (p[0] & alpha_bits));  // alpha is not rounded
     }
     const Real a[4] = {w[0] * c[0].alpha(), w[1] * c[1].alpha(), w[2] * c[2].alpha(), w[3] * c[3].alpha()};
     const Real alpha = (a[0] + a[1]) + (a[2] + a[3]);
@@ -55,6 +54,8 @@ struct IntegerBilinear {
     return narrow(mixed + Lanes<Real>::all(Real{0.5}));
   }
 
+  static Word word(const Pixel& p) { return std::bit_cast<Word>(p); }
+  static Pixel pixel(Word p) { return std::bit_cast<Pixel>(p); }
   static Pixel narrow(Lanes<Real> c) {
     if constexpr (std::is_same_v<Pixel, ZR_Pixel8>)
       return low_bytes(truncate_limited<ZR_Pixel8>(c.v));

@@ -11,23 +11,18 @@ using zr::Position;
 
 // ---------------------------------------------------------------------------------------- weights
 
-// The kernel within one pixel of the position and beyond; the factors are double, the weight is single.
-f32 near(f32 distance) {
-  const f64 t = distance;
-  return static_cast<f32>((1.25 * t - 2.25) * t * t + 1.0);
-}
-f32 far(f32 distance) {
-  const f64 t = distance;
-  return static_cast<f32>(((-0.75 * t + 3.75) * t - 6.0) * t + 3.0);
-}
-
-// Of the four pixels of an axis, from the one before the position's own.
+// Of the four pixels of an axis, from the one before the position's own. The kernel has one piece within one
+// pixel of the position and one beyond; factors are double, weights single.
 struct CubicWeights {
   f32 w[4];
 
   explicit CubicWeights(u32 fraction) {
-    const f32 f = static_cast<f32>(fraction) * 1.52587890625e-5f;
-    w[0] = far(1.0f + f), w[1] = near(f), w[2] = near(1.0f - f), w[3] = far(2.0f - f);
+    const f64 f = static_cast<f64>(fraction) * 0x1p-16;
+    const zr::f64x2 n{f, 1.0 - f}, t{1.0 + f, 2.0 - f};  // exact, in single precision too
+    const zr::f64x2 near = (1.25 * n - 2.25) * n * n + 1.0;
+    const zr::f64x2 far = ((-0.75 * t + 3.75) * t - 6.0) * t + 3.0;
+    w[0] = static_cast<f32>(far[0]), w[1] = static_cast<f32>(near[0]);
+    w[2] = static_cast<f32>(near[1]), w[3] = static_cast<f32>(far[1]);
   }
 };
 

@@ -10,10 +10,13 @@
 
 namespace zr {
 
+static_assert(std::endian::native == std::endian::little, "a pixel's alpha is the low part of its word");
+
 using u8x16 = u8 __attribute__((vector_size(16)));
 using u16x8 = u16 __attribute__((vector_size(16)));
 using i32x2 = i32 __attribute__((vector_size(8)));
 using i32x4 = i32 __attribute__((vector_size(16)));
+using u64x2 = u64 __attribute__((vector_size(16)));
 using i64x2 = i64 __attribute__((vector_size(16)));
 using f32x4 = f32 __attribute__((vector_size(16)));
 using f64x2 = f64 __attribute__((vector_size(16)));
@@ -67,29 +70,34 @@ inline Lanes<Real> channels(const Pixel& p) {
   } else if constexpr (std::is_same_v<Pixel, ZR_PixelFloat>) {
     return {f64x2{p.alpha, p.red}, f64x2{p.green, p.blue}};
   } else {
-    const i32x4 whole = whole_lanes(p);
-    return {__builtin_convertvector(__builtin_shufflevector(whole, whole, 0, 1), f64x2),
-            __builtin_convertvector(__builtin_shufflevector(whole, whole, 2, 3), f64x2)};
+    // A whole number below the exponent of 2^52 is that much above 2^52: there is no vector instruction for this
+    // conversion that all compilers take.
+    constexpr f64 base = 4503599627370496.0;
+    constexpr i32 exponent = 0x43300000;
+    const i32x4 whole = whole_lanes(p), above{exponent, exponent, exponent, exponent};
+    const f64x2 bases{base, base};
+    return {std::bit_cast<f64x2>(__builtin_shufflevector(whole, above, 0, 4, 1, 5)) - bases,
+            std::bit_cast<f64x2>(__builtin_shufflevector(whole, above, 2, 6, 3, 7)) - bases};
   }
 }
 
 // ---------------------------------------------------------------------------- lanes to pixel
 
+// The low bits of each lane, moved together. (Two 64-bit words, as processors lack a narrowing shuffle of bytes.)
 inline ZR_Pixel8 low_bytes(i32x4 v) {
-  const u8x16 bytes = std::bit_cast<u8x16>(v);
-  const u8x16 words = __builtin_shufflevector(bytes, bytes, 0, 2, 4, 6, 8, 10, 12, 14, 0, 2, 4, 6, 8, 10, 12, 14);
-  const u8x16 packed = __builtin_shufflevector(words, words, 0, 2, 4, 6, 0, 2, 4, 6, 0, 2, 4, 6, 0, 2, 4, 6);
-  return std::bit_cast<ZR_Pixel8>(std::bit_cast<i32x4>(packed)[0]);
+  const u64x2 pairs = std::bit_cast<u64x2>(v & i32x4{255, 255, 255, 255});
+  const u64x2 packed = pairs | (pairs >> 24);
+  return std::bit_cast<ZR_Pixel8>(static_cast<u32>((packed[0] & 0xffffu) | (packed[1] << 16)));
 }
 inline ZR_Pixel16 low_words(i32x4 v) {
-  const u16x8 words = std::bit_cast<u16x8>(v);
-  return std::bit_cast<ZR_Pixel16>(
-      std::bit_cast<i64x2>(__builtin_shufflevector(words, words, 0, 2, 4, 6, 0, 2, 4, 6))[0]);
+  const u64x2 pairs = std::bit_cast<u64x2>(v & i32x4{65535, 65535, 65535, 65535});
+  const i32x4 packed = std::bit_cast<i32x4>(pairs | (pairs >> 16));
+  return std::bit_cast<ZR_Pixel16>(std::bit_cast<u64x2>(__builtin_shufflevector(packed, packed, 0, 2, 0, 2))[0]);
 }
 
 // Lanes that satisfy the mask; 0 elsewhere.
-inline f32x4 where(i32x4 mask, f32x4 v) { return std::bit_cast<f32x4>(std::bit_cast<i32x4>(v) & mask); }
-inline f64x2 where(i64x2 mask, f64x2 v) { return std::bit_cast<f64x2>(std::bit_cast<i64x2>(v) & mask); }
+inline f32x4 where(i32x4 mask, f32x4 v) { return mask ? v : f32x4{}; }
+inline f64x2 where(i64x2 mask, f64x2 v) { return mask ? v : f64x2{}; }
 
 // Truncated and limited to 0..white; NaN gives 0.
 template <class Pixel>

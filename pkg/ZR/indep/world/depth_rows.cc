@@ -109,6 +109,13 @@ void convert_row(i32 n, const From* src, To* dst, bool dither) {
   }
 }
 
+template <class To>
+void narrow_row(i32 n, const ZR_PixelFloat* src, To* dst) {
+  each_channel(n, src, dst, [](f32 c, i32) { return narrow_float_colour<To>(c); });
+}
+
+template void narrow_row(i32, const ZR_PixelFloat*, ZR_Pixel8*);
+template void narrow_row(i32, const ZR_PixelFloat*, ZR_Pixel16*);
 template void convert_row(i32, const ZR_Pixel8*, ZR_Pixel16*, bool);
 template void convert_row(i32, const ZR_Pixel8*, ZR_PixelFloat*, bool);
 template void convert_row(i32, const ZR_Pixel16*, ZR_Pixel8*, bool);

@@ -11,4 +11,8 @@ namespace zr {
 template <class To, class From>
 void convert_row(i32 n, const From* src, To* dst, bool dither);
 
+// Float to an integer depth as scaled copies do it: the scalar rule, and alpha clamped like the colours.
+template <class To>
+void narrow_row(i32 n, const ZR_PixelFloat* src, To* dst);
+
 }  // namespace zr

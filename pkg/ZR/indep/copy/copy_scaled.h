@@ -1,0 +1,94 @@
+// The scaled copy by nearest neighbour over planes of pixels of any size: clipping, overflow, and the rows.
+#pragma once
+
+#include <ZR/errors.h>
+#include <ZR/types.h>
+
+#include <algorithm>
+#include <cstring>
+
+#include "copy/copy_rects.h"
+#include "world/guard.h"
+
+namespace zr {
+
+// Pixels in memory, whoever holds them.
+struct CopyPlane {
+  char* data;
+  i32 row_bytes, width, height, pixel_bytes;
+
+  CopyPlane(const ZR_LayerDef& layer, std::size_t pixel_size)
+      : CopyPlane(layer.data, layer.row_bytes, layer.width, layer.height, static_cast<i32>(pixel_size)) {}
+  CopyPlane(void* data_, i32 row_bytes_, i32 width_, i32 height_, i32 pixel_bytes_)
+      : data(static_cast<char*>(data_)),
+        row_bytes(row_bytes_),
+        width(width_),
+        height(height_),
+        pixel_bytes(pixel_bytes_) {}
+
+  char* at(i64 x, i64 y) const { return data + y * row_bytes + x * pixel_bytes; }
+  // Whether a byte of this plane may be a byte of the other.
+  bool may_overlap(const CopyPlane& other) const { return lowest() < other.highest() && other.lowest() < highest(); }
+
+ private:
+  u64 lowest() const { return reinterpret_cast<u64>(row_bytes < 0 ? at(0, i64{height} - 1) : data); }
+  u64 highest() const { return reinterpret_cast<u64>(row_bytes < 0 ? at(width, 0) : at(width, i64{height} - 1)); }
+};
+
+// What a copy says of an inverted destination.
+struct OverflowTexts {
+  ZR_CallSite site;
+  const char *x, *y;
+};
+
+// emit(n, source columns, source row, destination pixels) writes n pixels; the source row is that of column 0.
+template <class EmitRow>
+i32 copy_scaled(const CopyPlane& src, const CopySide& from, const CopyPlane& dst, const CopySide& to,
+                const OverflowTexts& texts, EmitRow&& emit) {
+  const AxisWalk x(clip_axis({from.rect.left, from.rect.right, to.rect.left, to.rect.right}, from.full, src.width,
+                             to.full, dst.width),
+                   src.width, dst.width);
+  const AxisWalk y(clip_axis({from.rect.top, from.rect.bottom, to.rect.top, to.rect.bottom}, from.full, src.height,
+                             to.full, dst.height),
+                   src.height, dst.height);
+  // An inverted extent makes its error term negative sooner or later; before that nothing is written.
+  if (y.src_extent < 1) return ZR_Err_None;
+  if (y.dst_extent < 0) return failed_verification(texts.site, texts.y);
+  if (y.dst_extent > 0 && x.src_extent > 0 && x.dst_extent < 0) return failed_verification(texts.site, texts.x);
+
+  // The columns' sources are worked out once for all rows, in blocks that fit a table. Where the planes may share
+  // memory the rows have to be finished one by one, and a row may have changed between its copies.
+  constexpr i32 block = 1024;
+  i32 columns[block], row;
+  const auto write_block = [&](i32 k, i32 column, i32 n) {
+    emit(n, columns, src.at(0, row), dst.at(i64{x.first} + column, i64{y.first} + k));
+  };
+  if (src.may_overlap(dst)) {
+    for (i32 k = 0; k < y.count; ++k) {
+      y.sources(k, 1, &row);
+      for (i32 column = 0; column < x.count; column += block) {
+        const i32 n = std::min(block, x.count - column);
+        x.sources(column, n, columns);
+        write_block(k, column, n);
+      }
+    }
+    return ZR_Err_None;
+  }
+  for (i32 column = 0; column < x.count; column += block) {
+    const i32 n = std::min(block, x.count - column);
+    x.sources(column, n, columns);
+    i32 row_above = -1;
+    for (i32 k = 0; k < y.count; ++k, row_above = row) {
+      y.sources(k, 1, &row);
+      if (row == row_above) {
+        char* const out = dst.at(i64{x.first} + column, i64{y.first} + k);
+        std::memmove(out, out - dst.row_bytes, static_cast<std::size_t>(n) * static_cast<std::size_t>(dst.pixel_bytes));
+      } else {
+        write_block(k, column, n);
+      }
+    }
+  }
+  return ZR_Err_None;
+}
+
+}  // namespace zr
