@@ -33,7 +33,7 @@ struct SheetOptions {
   bool force = false, plain = false;
 };
 
-// Where the pictures stand; all are as large as the first wants to be.
+// Where the pictures stand; the first gives all places their shape.
 struct SheetPlan {
   i32 columns, rows, width, height, label;
   i32 page_width() const { return kGap + columns * (width + kGap); }
@@ -62,7 +62,11 @@ SheetPlan plan_sheet(const SheetOptions& options, const ImageInfo& first) {
 OwnedWorld load_small(const std::string& file, const SheetPlan& plan) {
   const OwnedWorld picture = world_in_space(load_picture(file, 32, "sheet"), {}, standard_space(PRISMA_Profile_sRGB),
                                             32, PRISMA_Intent_RelativeColorimetric, file, "sheet");
-  return fit_image(picture, plan.width, plan.height);
+  const f64 step =
+      std::max(static_cast<f64>(picture.width()) / plan.width, static_cast<f64>(picture.height()) / plan.height);
+  const auto fitted = [&](i32 side) { return std::max(1, static_cast<i32>(std::lround(side / step))); };
+  return fit_image(picture, std::min(fitted(picture.width()), plan.width),
+                   std::min(fitted(picture.height()), plan.height));
 }
 
 void make_sheet(const SheetOptions& options) {
@@ -92,8 +96,8 @@ void make_sheet(const SheetOptions& options) {
     const i32 y = kGap + static_cast<i32>(i) / plan.columns * (plan.height + plan.label);
     OwnedWorld small = load_small(options.pictures[i], plan);
     const GX_LRect all = small.bounds();
-    check(ZR_TransferRect(&abort_on_interrupt(), 1, 0, 0, &all, small.layer(), &over, nullptr, nullptr, x, y,
-                          page.layer()),
+    check(ZR_TransferRect(&abort_on_interrupt(), 1, 0, 0, &all, small.layer(), &over, nullptr, nullptr,
+                          x + (plan.width - small.width()) / 2, y + (plan.height - small.height()) / 2, page.layer()),
           "drawing the sheet");
     if (!options.plain)
       draw_text(page, std::filesystem::path(options.pictures[i]).stem().string(), x, y + plan.height + kLabelDrop,
@@ -129,7 +133,7 @@ Run declare(CLI::App& verb) {
       "  zr sheet a.jpg b.tif c.exr -o three.png --width 480 --plain\n"
       "\n"
       "Pictures are shown in sRGB, by the profile in their file; without one, files of 8 or 16 bits are sRGB\n"
-      "and float files linear sRGB. A picture of another shape than the first loses what hangs over.");
+      "and float files linear sRGB. The first picture gives the places their shape; others are fitted inside.");
   return [options] { make_sheet(*options); };
 }
 

@@ -64,9 +64,10 @@ Point parse_pair(const std::string& text, const char* option, f64 limit, std::op
   if (numbers.size() == 2) return {numbers[0], numbers[1]};
   if (numbers.size() == 1 && both) return {numbers[0], numbers[0]};
   if (numbers.size() == 1 && single) return {numbers[0], *single};
-  throw bad_input(std::string("transform: ") + option + " is \"" + text + "\"; it must be " +
-                  (both || single ? "a number or two such as 0.5,2" : "two numbers such as 10,-2.5") + ", " +
-                  range_text(limit));
+  throw bad_input(
+      std::string("transform: ") + option + " is \"" + text + "\"; it must be " +
+      (both || single ? "a number or two with a comma between them" : "two numbers with a comma between them") +
+      ", each " + range_text(limit));
 }
 
 GX_Matrix3 parse_matrix(const std::string& text) {
@@ -102,9 +103,11 @@ Request parse_request(const TransformOptions& options) {
   request.translate = parse_pair(options.translate, "--translate", kFarthest, {}, false);
   request.turning = request.exact ? parse_matrix(options.matrix) : turning_matrix(scale, skew, rotation[0]);
   const auto& m = request.turning.m;
-  if (m[0][0] * m[1][1] - m[0][1] * m[1][0] == 0)
+  const f64 surface = m[0][0] * m[1][1] - m[0][1] * m[1][0];
+  const f64 unleaned = std::hypot(m[0][0], m[1][0]) * std::hypot(m[0][1], m[1][1]);
+  if (!(std::abs(surface) > unleaned * 1e-12))
     throw bad_input("transform: this " + std::string(request.exact ? "--matrix" : "--scale and --skew") +
-                    " flattens the picture to nothing");
+                    " flattens the picture to nothing" + (request.exact ? "" : "; neither scale may be 0"));
   if (!options.size.empty()) parse_size(options.size, request.width, request.height);
   if (options.background != "none") {
     request.background = parse_colour(options.background);

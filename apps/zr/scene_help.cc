@@ -12,11 +12,11 @@ std::string section(const char* title, const Keys& keys) {
   std::string text = std::string("\n") + title + '\n';
   for (const SceneKey& key : keys) {
     std::string line = std::string("  ") + key.name;
-    line.resize(std::max<size_t>(line.size() + 1, 14), ' ');
+    line.resize(std::max<size_t>(line.size() + 1, 16), ' ');
     line += key.values;
     if (*key.standard != '\0') line += std::string(" (default ") + key.standard + ')';
     text += line + '\n';
-    if (*key.meaning != '\0') text += std::string(14, ' ') + key.meaning + '\n';
+    if (*key.meaning != '\0') text += std::string(16, ' ') + key.meaning + '\n';
   }
   return text;
 }
@@ -30,7 +30,7 @@ std::string scene_help() {
              "  { \"size\": [960, 540], \"background\": \"#102030\", \"frames\": [1, 48],\n"
              "    \"layers\": [\n"
              "      { \"image\": \"media/street.jpg\" },\n"
-             "      { \"image\": \"media/logo.png\", \"position\": [480, 270], \"anchor\": [120, 120],\n"
+             "      { \"image\": \"media/logo.png\", \"position\": [480, 270], \"anchor\": [320, 160],\n"
              "        \"scale\": 0.5, \"motion_blur\": true,\n"
              "        \"rotation\": [ { \"frame\": 1, \"value\": 0 }, { \"frame\": 48, \"value\": 360 } ] },\n"
              "      { \"image\": \"media/balloon.png\", \"mode\": \"screen\", \"opacity\": 0.8,\n"

@@ -67,9 +67,9 @@ inline constexpr std::array kPlacementKeys = {
 inline constexpr std::array kMotionBlurKeys = {
     SceneKey{"shutter_angle", "0..720", "180", "degrees that the shutter is open; 360 is a whole frame"},
     SceneKey{"shutter_phase", "-360..360", "-90", "degrees from the frame's own moment to the shutter's opening"},
-    SceneKey{"samples", "whole number 2..1024", "16",
-             "moments, evenly from opening to closing; draft keeps to the "
-             "straight line from first to last"},
+    SceneKey{
+        "samples", "whole number 2..1024", "16",
+        "moments, evenly from opening to closing, one matrix each; 2 are joined by a straight line of 17 (draft 9)"},
 };
 inline constexpr std::array kKeyframeKeys = {
     SceneKey{"frame", "whole number", "", ""},

@@ -6,36 +6,22 @@
 
 #include <array>
 #include <cstdio>
-#include <cstdlib>
 #include <nlohmann/json.hpp>
 
 #include <jpeglib.h>
 
 #include "image_files.h"
-#include "temporary_folder.h"
+#include "tool_run.h"
 
 namespace zr::tool {
 namespace {
 
 using testing::HasSubstr;
 
-std::string slurp(const std::string& file) {
-  std::ifstream stream(file, std::ios::binary);
-  return {std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
-}
 std::string icc(const std::string& name) { return ZR_TEST_DATA "/icc/" + name + ".icc"; }
 
-class Colour : public testing::Test {
+class Colour : public ToolRun {
  protected:
-  // A line of arguments without blanks inside of them; the exit code.
-  int run(const std::string& arguments) {
-    const std::string line = "cd " + folder.path() + " && " ZR_TOOL_PROGRAM " " + arguments + " >" + (streams / "out") +
-                             " 2>" + (streams / "err");
-    const int status = std::system(line.c_str());
-    out = slurp(streams / "out");
-    err = slurp(streams / "err");
-    return WEXITSTATUS(status);
-  }
   // A picture of one pixel.
   void picture(const std::string& name, const std::vector<u8>& pixel, const std::string& profile = "") {
     OIIO::ImageSpec spec(1, 1, static_cast<int>(pixel.size()), OIIO::TypeUInt8);
@@ -52,8 +38,6 @@ class Colour : public testing::Test {
     const ZR_Pixel8 p = world.row<ZR_Pixel8>(0)[0];
     return {p.red, p.green, p.blue};
   }
-  TemporaryFolder folder, streams;
-  std::string out, err;
 };
 
 TEST_F(Colour, KnownValueAndProfileComeOutInEveryFormatThatHoldsOne) {

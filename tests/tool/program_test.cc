@@ -131,7 +131,7 @@ INSTANTIATE_TEST_SUITE_P(
 #undef IMAGE
 
 TEST_F(Program, PictureIsTheComposite) {
-  folder.write("s.json", R"({"size":[4,2],"background":"#808080","layers":[
+  folder.write("s.json", R"({"size":[4,2],"background":"#808080","quality":"draft","layers":[
       {"colour":"#ff8000","size":[2,2],"mode":"multiply","position":[{"frame":1,"value":[0,0]},{"frame":3,"value":[3,0]}]},
       {"colour":"#0000ff","opacity":[{"frame":1,"value":0},{"frame":3,"value":1}],"field":"odd"}]})");
   const Outcome outcome = run({"render", "s.json", "-o", "f.##.png", "--frames", "1-2"});
@@ -147,7 +147,7 @@ TEST_F(Program, PictureIsTheComposite) {
   EXPECT_THAT(rgb(first, 0, 0), ElementsAre(255, 128, 64, 0));
   EXPECT_THAT(rgb(first, 2, 0), ElementsAre(255, 128, 128, 128));
   EXPECT_THAT(rgb(first, 1, 1), ElementsAre(255, 128, 64, 0)) << "opacity 0 changes nothing";
-  EXPECT_THAT(rgb(second, 1, 0), ElementsAre(255, 128, 128, 128)) << "1.5 is rounded to 2";
+  EXPECT_THAT(rgb(second, 1, 0), ElementsAre(255, 128, 128, 128)) << "draft rounds 1.5 to 2";
   EXPECT_THAT(rgb(second, 2, 0), ElementsAre(255, 128, 64, 0));
   EXPECT_THAT(rgb(second, 0, 1), ElementsAre(255, 64, 64, 192)) << "half blue on odd rows";
 }

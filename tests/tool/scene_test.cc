@@ -126,6 +126,29 @@ INSTANTIATE_TEST_SUITE_P(
                 "layers[0].keep_alpha is 1; it must be true or false"},
         Mistake{LAYER("\"colour\":\"#000000\", \"field\": \"upper\""), "must be \"all\", \"even\" or \"odd\""},
         Mistake{LAYER("\"colour\":\"#000000\", \"seed\": 2147483648"), "layers[0].seed is 2147483648"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"scale\": 1001"),
+                "layers[0].scale is 1001; it must be a number -1000 to 1000"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"scale\": [1,2,3]"), "layers[0].scale is a list of 3"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"rotation\": [1,2]"), "layers[0].rotation is a list of 2"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"rotation\": [{\"frame\":1,\"value\":\"30\"}]"),
+                "s.json:2:66: layers[0].rotation[0].value is \"30\""},
+        Mistake{LAYER("\"colour\":\"#000000\", \"skew\": [0,90]"),
+                "layers[0].skew[1] is 90; it must be a number -89 to 89"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"anchor\": 5"), "layers[0].anchor is 5; it must be [x, y]"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"matrix\": [1,0,0,0,1,0]"), "layers[0].matrix is a list of 6"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"matrix\": [1,0,0,0,1,0,0.1,0,1]"), "layers[0].matrix[6] is 0.1"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"matrix\": [1,0,0,0,1,0,0,0,1], \"scale\": 2"),
+                "layers[0].scale cannot stand beside \"matrix\""},
+        Mistake{LAYER("\"colour\":\"#000000\", \"quality\": \"best\""),
+                "is \"best\"; it must be \"draft\", \"bilinear\" or \"bicubic\""},
+        Mistake{LAYER("\"colour\":\"#000000\", \"motion_blur\": 16"), "layers[0].motion_blur is 16; it must be true"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"motion_blur\": {\"samples\":1}"),
+                "motion_blur.samples is 1; it must be a whole number 2 to 1024"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"motion_blur\": {\"shutter_angle\":721}"), "shutter_angle is 721"},
+        Mistake{LAYER("\"colour\":\"#000000\", \"motion_blur\": {\"shutter\":1}"), "unknown key \"shutter\""},
+        Mistake{LAYER("\"colour\":\"#000000\", \"matte\": {\"image\":\"a\",\"scale\":\"x\"}"),
+                "layers[0].matte.scale is \"x\""},
+        Mistake{"{\"size\":[8,8],\"layers\":[],\"field\":\"even\"}", "must be \"none\", \"upper\" or \"lower\""},
         Mistake{LAYER("\"colour\":\"#000000\", \"matte\": {}"), "layers[0].matte lacks \"image\""},
         Mistake{LAYER("\"colour\":\"#000000\", \"matte\": {\"image\":\"a\",\"kind\":\"lumma\"}"),
                 "layers[0].matte.kind is \"lumma\""},
@@ -136,7 +159,8 @@ INSTANTIATE_TEST_SUITE_P(
 
 TEST(SceneHelp, NamesEveryKeyThatIsAccepted) {
   const std::string help = scene_help();
-  for (const char* key : {"background", "keep_alpha", "position", "opacity", "field", "seed", "matte", "kind"})
+  for (const char* key : {"background", "keep_alpha", "position", "opacity", "field", "seed", "matte", "kind", "anchor",
+                          "rotation", "motion_blur", "shutter_angle"})
     EXPECT_THAT(help, HasSubstr(key));
 }
 
