@@ -62,7 +62,7 @@ bool MatrixShaper::prepare(const cmsToneCurve* const forward[3], cmsToneCurve* c
     offset_[i] = map.offset[i];
     for (int c = 0; c < 3; ++c) {
       columns_[c][i] = map.columns[c][i];
-      product_[c][i] = map.product[i][c];
+      product_[i][c] = map.product[i][c];
       same_light_ =
           same_light_ && std::fabs(map.columns[c][i] - (i == c ? 1.0f : 0.0f)) < 2e-6f && map.offset[i] == 0.0f;
     }
@@ -207,7 +207,6 @@ struct MatrixShaper::Kernels {
   struct Exact {
     using Pixel = P;
     const MatrixShaper& s;
-    const Wide red = s.product_[0], green = s.product_[1], blue = s.product_[2];
     const bool clip;
     const f32* tables[3] = {};
     Exact(const MatrixShaper& shaper, bool clip_src) : s(shaper), clip(clip_src) {
@@ -223,8 +222,8 @@ struct MatrixShaper::Kernels {
     }
     Vector operator()(const Pixel& p) const {
       const f64 r = linear(0, p.red), g = linear(1, p.green), b = linear(2, p.blue);
-      return __builtin_convertvector(red * Wide{r, r, r, r} + green * Wide{g, g, g, g} + blue * Wide{b, b, b, b},
-                                     Vector);
+      const auto row = [&](const f64(&m)[3]) { return static_cast<f32>(m[0] * r + m[1] * g + m[2] * b); };
+      return Vector{row(s.product_[0]), row(s.product_[1]), row(s.product_[2]), 0.0f};
     }
   };
 

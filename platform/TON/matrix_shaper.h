@@ -68,11 +68,10 @@ class MatrixShaper {
   void prepare_source16();
   void prepare_result8();
 
-  typedef f64 Wide __attribute__((vector_size(32)));
   CurveSet forward_, inverse_;
   cmsToneCurve* inverse_curves_[3] = {};
   Vector columns_[3] = {}, offset_ = {};
-  Wide product_[3] = {};              // columns
+  f64 product_[3][3] = {};            // rows
   CurveVector<f32> linear8_[3];       // curve of each byte
   CurveVector<Vector> products8_[3];  // curve and column of each byte; the offset is in the first
   CurveVector<f32> linear16_[3];      // curve of each 16-bit value
