@@ -228,6 +228,25 @@ TYPED_TEST(TransformEdges, HostileMatricesStayInside) {
   EXPECT_TRUE(this->caught.quiet());
 }
 
+// A step of 32768 pixels wraps: every other pixel of a row lies inside, and those between lie far away.
+TYPED_TEST(TransformEdges, RowsThatWrap) {
+  using T = TypeParam;
+  TestWorld<T> src(6, 6), dst(9, 9);
+  src.randomise(1);
+  const GX_Matrix3 leaps = {{{32768, 0, -16382 + 0.25}, {0, 1, 0.25}, {0, 0, 1}}};
+  for (i32 quality = 0; quality < 4; ++quality) {
+    TransformCall call;
+    call.quality = quality;
+    call.src2dst = false;
+    call.matrices = {leaps, identity, leaps};  // stands still; the one between widens the bounds
+    TestWorld<T> expected = dst;
+    TransformModel<T>(call, src, expected).draw();
+    EXPECT_EQ(call.run(src, dst), 0);
+    EXPECT_TRUE(dst == expected) << quality;
+    EXPECT_NE(dst.at(4, 3).alpha, 0);
+  }
+}
+
 TYPED_TEST(TransformEdges, TenThousandMatrices) {
   using T = TypeParam;
   TestWorld<T> src(2, 2), dst(3, 2);
