@@ -6,12 +6,15 @@ find_package(Threads REQUIRED)
 pkg_check_modules(LCMS2 REQUIRED IMPORTED_TARGET lcms2)
 find_package(Boost 1.70 REQUIRED)
 find_path(ZR_XXHASH_FOLDER xxhash.h REQUIRED)
+find_path(ZR_HIGHWAY_FOLDER hwy/highway.h REQUIRED)
 
 get_property(zr_sources GLOBAL PROPERTY ZR_LIBRARY_SOURCES)
 add_library(zr_objects OBJECT ${zr_sources})
 target_include_directories(zr_objects
   PUBLIC $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include>
   PRIVATE ${PROJECT_SOURCE_DIR}/platform ${PROJECT_SOURCE_DIR}/pkg/ZR/indep)
+# Vector rows are compiled for SSE4, AVX2 and AVX-512; what lies between is not worth the time.
+target_compile_definitions(zr_objects PRIVATE HWY_DISABLED_TARGETS=\(HWY_SSSE3|HWY_AVX3_DL\) HWY_DISABLE_PCLMUL_AES)
 target_link_libraries(zr_objects PUBLIC zr_rules Boost::headers PRIVATE spdlog::spdlog PkgConfig::LCMS2)
 set_target_properties(zr_objects PROPERTIES
   POSITION_INDEPENDENT_CODE ON

@@ -25,9 +25,10 @@ void read_processor(i32* words) {
   words[word_sse2] = __builtin_cpu_supports("sse2") != 0;
   words[word_sse3] = __builtin_cpu_supports("sse3") != 0;
   words[word_ssse3] = __builtin_cpu_supports("ssse3") != 0;
-  words[word_sse41] = __builtin_cpu_supports("sse4.1") != 0;
-  words[word_avx2] = __builtin_cpu_supports("avx2") != 0;
-  // The set that vector code for 512 bits takes for granted.
+  // Each with what vector code of its width takes for granted.
+  words[word_sse41] = __builtin_cpu_supports("sse4.1") != 0 && __builtin_cpu_supports("sse4.2") != 0;
+  words[word_avx2] = __builtin_cpu_supports("avx2") != 0 && __builtin_cpu_supports("fma") != 0 &&
+                     __builtin_cpu_supports("bmi") != 0 && __builtin_cpu_supports("bmi2") != 0;
   words[word_avx512] = __builtin_cpu_supports("avx512f") != 0 && __builtin_cpu_supports("avx512bw") != 0 &&
                        __builtin_cpu_supports("avx512dq") != 0 && __builtin_cpu_supports("avx512vl") != 0 &&
                        __builtin_cpu_supports("avx512cd") != 0;

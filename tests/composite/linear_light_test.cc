@@ -127,15 +127,16 @@ TYPED_TEST(LinearAt, ARowWithoutTablesIsAFailedVerification) {
   }
 }
 
-// Each of a row's copies in turn finds no memory: the row stays, nothing leaks, and the next call works.
+// Lots are drawn along a row, so that its copies are whole ones: each in turn finds no memory: the row stays, nothing
+// leaks, and the next call works.
 TYPED_TEST(LinearAt, NoMemoryForTheCopies) {
   using T = TypeParam;
   const ZR_LinearBlendingTables gamma = gamma_tables(2.2);
   ZR_InnerBlendingFunc<T> row = nullptr;
-  ASSERT_EQ((ZR_GetInnerBlendingFunc<T, true, true>(XferInFront, &row)), 0);
+  ASSERT_EQ((ZR_GetInnerBlendingFunc<T, true, true>(XferDissolve, &row)), 0);
   constexpr auto white = static_cast<zr::Channel<T>>(zr::Depth<T>::white);
   ZR_BlendingMode<T> record{};
-  record.mode = XferInFront;
+  record.mode = XferDissolve;
   record.opacity = white;
   const T source[2] = {{white, white, white, white}, {white, white, white, white}};
   for (int nth = 1;; ++nth) {

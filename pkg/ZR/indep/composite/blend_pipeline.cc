@@ -1,9 +1,11 @@
 // The plan of a row and the five steps that run it.
 #include <ZR/composite.h>
 
+#include <algorithm>
 #include <array>
 
-#include "composite/transfer_modes.h"
+#include "composite/row_overlap.h"
+#include "composite/transfer_modes-inl.h"
 #include "world/guard.h"
 #include "world/slot_table.h"
 
@@ -85,6 +87,33 @@ ZR_BlendModeDescriptor<T>::ZR_BlendModeDescriptor(const ZR_BlendingMode<T>& mode
   }
 }
 
+namespace zr {
+namespace {
+
+// Several passes go over a piece of the row at a time, which stays in the nearest cache between them.
+template <class T>
+constexpr i32 piece_pixels = 8192 / sizeof(T);
+
+template <class T>
+i32 run_on_ground(const ZR_BlendModeDescriptor<T>& plan, i32 n, const T* src, const T* mask, T* dst) {
+  const bool in_pieces = rows_apart(n, src, dst) && (mask == nullptr || rows_apart(n, mask, dst));
+  const i32 piece = in_pieces ? piece_pixels<T> : n;
+  i32 error = 0;
+  for (i32 i = 0; i < n && error == 0; i += piece) {
+    const i32 count = std::min(n - i, piece);
+    const T* const cover = mask != nullptr ? mask + i : nullptr;
+    error = plan.fade(count, nullptr, dst + i);
+    if (error == 0) error = plan.main(count, &plan.mode, plan.tables, src + i, cover, dst + i);
+    if (error == 0 && plan.use_union_alpha != 0)
+      error = plan.union_alpha(count, src + i, plan.mode.opacity, cover, dst + i);
+    if (error == 0) error = plan.unfade(count, nullptr, dst + i);
+  }
+  return error;
+}
+
+}  // namespace
+}  // namespace zr
+
 template <class T>
 i32 ZR_BlendPipeline(const ZR_ProgressInfo*, i32 n, const ZR_BlendModeDescriptor<T>* descriptor, const T* src,
                      const T* mask, zr::Channel<T>* scratch, T* dst) {
@@ -97,13 +126,13 @@ i32 ZR_BlendPipeline(const ZR_ProgressInfo*, i32 n, const ZR_BlendModeDescriptor
     for (i32 i = 0; i < n; ++i) scratch[i] = dst[i].alpha;
 
   i32 error = 0;
-  if (plan.use_fade != 0)
-    error = plan.fade(n, nullptr, dst);
-  else if (plan.use_first_pass != 0)
-    error = plan.first_pass(n, &plan.mode, plan.tables, src, mask, dst);
-  if (error == 0) error = plan.main(n, &plan.mode, plan.tables, src, mask, dst);
-  if (error == 0 && plan.use_union_alpha != 0) error = plan.union_alpha(n, src, plan.mode.opacity, mask, dst);
-  if (error == 0 && plan.use_fade != 0) error = plan.unfade(n, nullptr, dst);
+  if (plan.use_fade != 0) {
+    error = zr::run_on_ground(plan, n, src, mask, dst);
+  } else {
+    if (plan.use_first_pass != 0) error = plan.first_pass(n, &plan.mode, plan.tables, src, mask, dst);
+    if (error == 0) error = plan.main(n, &plan.mode, plan.tables, src, mask, dst);
+    if (error == 0 && plan.use_union_alpha != 0) error = plan.union_alpha(n, src, plan.mode.opacity, mask, dst);
+  }
 
   if (error == 0 && restores_alpha)
     for (i32 i = 0; i < n; ++i) dst[i].alpha = scratch[i];

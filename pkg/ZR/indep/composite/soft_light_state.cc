@@ -5,8 +5,8 @@
 
 namespace zr {
 
-constinit u16 soft_light_low_16[4097]{};
-constinit u16 soft_light_high_16[4097]{};
+constinit i32 soft_light_low_16[4098]{};
+constinit i32 soft_light_high_16[4098]{};
 constinit f32 soft_light_low_float[4098]{};
 constinit f32 soft_light_high_float[4098]{};
 
@@ -15,7 +15,7 @@ namespace {
 f64 low(f64 x) { return x * (1.0 - x); }
 f64 high(f64 x) { return (x <= 0.25 ? ((16.0 * x - 12.0) * x + 4.0) * x : std::sqrt(x)) - x; }
 // Both curves lie in 0..0.25, so that nothing needs a clamp.
-u16 rounded_16(f64 v) { return static_cast<u16>(32768.0 * v + 0.5); }
+i32 rounded_16(f64 v) { return static_cast<i32>(32768.0 * v + 0.5); }
 
 }  // namespace
 

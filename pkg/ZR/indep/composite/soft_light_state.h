@@ -12,8 +12,8 @@
 namespace zr {
 
 // Entry k of the 16-bit and float tables stands for x = k / 4096; entry 4096 is 0. The float tables have
-// one slot more, also 0, which what lies above 1 reads.
-extern u16 soft_light_low_16[4097], soft_light_high_16[4097];
+// one slot more, also 0, which what lies above 1 reads; so have the 16-bit ones, which is read and not used.
+extern i32 soft_light_low_16[4098], soft_light_high_16[4098];
 extern f32 soft_light_low_float[4098], soft_light_high_float[4098];
 
 void build_soft_light_tables();
@@ -32,16 +32,16 @@ constexpr u32 high_8(u32 i) {
   return root - i;
 }
 template <class Rule>
-constexpr std::array<u8, 256> table_8(Rule rule) {
-  std::array<u8, 256> table{};
-  for (u32 i = 0; i < 256; ++i) table[i] = static_cast<u8>(rule(i));
+constexpr std::array<i32, 256> table_8(Rule rule) {
+  std::array<i32, 256> table{};
+  for (u32 i = 0; i < 256; ++i) table[i] = static_cast<i32>(rule(i));
   return table;
 }
 
 }  // namespace soft_light_detail
 
-inline constexpr std::array<u8, 256> soft_light_low_8 = soft_light_detail::table_8(soft_light_detail::low_8);
-inline constexpr std::array<u8, 256> soft_light_high_8 = soft_light_detail::table_8(soft_light_detail::high_8);
+inline constexpr std::array<i32, 256> soft_light_low_8 = soft_light_detail::table_8(soft_light_detail::low_8);
+inline constexpr std::array<i32, 256> soft_light_high_8 = soft_light_detail::table_8(soft_light_detail::high_8);
 static_assert(soft_light_low_8[1] == 1 && soft_light_high_8[1] == 3);
 static_assert(soft_light_low_8[255] == 0 && soft_light_high_8[255] == 0);
 

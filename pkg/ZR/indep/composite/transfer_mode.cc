@@ -4,7 +4,7 @@
 #include <algorithm>
 #include <array>
 
-#include "composite/transfer_modes.h"
+#include "composite/transfer_modes-inl.h"
 
 namespace zr {
 namespace {

@@ -4,7 +4,7 @@
 #include <array>
 
 #include "composite/linear_light.h"
-#include "composite/mode_kinds_impl.h"
+#include "composite/mode_kinds-inl.h"
 
 namespace zr {
 namespace {
@@ -12,7 +12,8 @@ namespace {
 // Kept out of line: the three opacity forms and linear light share one body for each mode and depth.
 template <class T, class Mode>
 [[gnu::noinline]] void blend_pixel(const T& s, Wide<T> A, T& d) {
-  blend<T, Mode>(s, A, d);
+  using M = ModeMath<T>;
+  d = packed<T>(blend<Mode>(unpacked<M>(s), A, unpacked<M>(d)));
 }
 
 // `amount` are the opacities, applied one after the other with a rounding between.
@@ -27,7 +28,9 @@ void transfer(const T& s, const ZR_LinearBlendingTables* tables, T& d, Opacity..
   if constexpr (scales_source<Mode>) {
     // In linear light the opacities work there too.
     const auto run = []<class Depth>(const Depth& source, Depth& onto, auto... amount) {
-      const Depth whole = scaled(source, [&](auto c) { return under<Depth>(c, amount...); });
+      using M = ModeMath<Depth>;
+      const Depth whole =
+          packed<Depth>(scaled<M>(unpacked<M>(source), [&](auto c) { return under<Depth>(c, amount...); }));
       blend_pixel<Depth, Mode>(whole, whole.alpha, onto);
     };
     if (tables == nullptr) {

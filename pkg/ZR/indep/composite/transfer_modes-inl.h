@@ -7,44 +7,22 @@
 // Formulas are over M = ModeMath<T>: s source, d destination (of ground modes: faded to its ground), A the
 // effective alpha of the source. full(s, d) is the formula under a white A, partial(s, A, d) under a lesser
 // one. Row formulas that round another way than the pixel's have a row_full.
-#pragma once
+#if defined(ZR_COMPOSITE_TRANSFER_MODES_INL_H) == defined(HWY_TARGET_TOGGLE)
+#ifdef ZR_COMPOSITE_TRANSFER_MODES_INL_H
+#undef ZR_COMPOSITE_TRANSFER_MODES_INL_H
+#else
+#define ZR_COMPOSITE_TRANSFER_MODES_INL_H
+#endif
 
 #include <ZR/transfer_mode.h>
 
 #include <tuple>
 
-#include "composite/mode_arithmetic.h"
-#include "composite/mode_colour_impl.h"
+#include "composite/mode_colour-inl.h"
+#include "composite/mode_row.h"
+#include "simd/formulas.h"
 
-namespace zr {
-
-// How a mode treats alpha: what its entry must bring.
-enum class ModeKind {
-  copy,          // pixel
-  over,          // pixel
-  row_only,      // a row function of its own
-  black_ground,  // full, partial
-  white_ground,  // full, partial
-  grey_ground,   // full, partial
-  weighted,      // full
-  colour,        // wanted (or none), recoloured
-  alpha_only,    // alpha
-  special,       // pixel
-};
-
-// What a row of the mode runs besides the main function, and whether the pipeline guards its alpha.
-enum class RowClass { plain, self_contained, black_ground, white_ground, grey_ground, colour };
-
-constexpr RowClass usual_row_class(ModeKind kind) {
-  switch (kind) {
-    case ModeKind::black_ground: return RowClass::black_ground;
-    case ModeKind::white_ground: return RowClass::white_ground;
-    case ModeKind::grey_ground: return RowClass::grey_ground;
-    case ModeKind::weighted: return RowClass::self_contained;
-    case ModeKind::colour: return RowClass::colour;
-    default: return RowClass::plain;
-  }
-}
+ZR_BEGIN_FORMULAS
 
 template <ZR_TransferMode Number, ModeKind Kind, RowClass Class = usual_row_class(Kind)>
 struct Mode {
@@ -55,71 +33,76 @@ struct Mode {
 
 // ------------------------------------------------------------------------------ whole pixels
 
-// Back into a channel; integers modulo its width.
-template <class T>
-constexpr Channel<T> store(Wide<T> v) {
-  return static_cast<Channel<T>>(v);
+// The colours of s and d through change(s, d), as they come back from channels; alpha stays that of d.
+template <class M, class Change>
+ZR_PURE Px<M> each_colour(const Px<M>& s, const Px<M>& d, Change&& change) {
+  return {d.alpha, M::stored(change(s.red, d.red)), M::stored(change(s.green, d.green)),
+          M::stored(change(s.blue, d.blue))};
 }
-
-// d = change(s, d) for the three colour channels.
-template <class T, class Change>
-[[gnu::always_inline]] inline void each_colour(const T& s, T& d, Change&& change) {
-  d.red = store<T>(change(Wide<T>{s.red}, Wide<T>{d.red}));
-  d.green = store<T>(change(Wide<T>{s.green}, Wide<T>{d.green}));
-  d.blue = store<T>(change(Wide<T>{s.blue}, Wide<T>{d.blue}));
+template <class M>
+ZR_PURE Px<M> with_alpha(const Px<M>& p, typename M::Wide alpha) {
+  return {M::stored(alpha), p.red, p.green, p.blue};
 }
 
 // The alpha of two layers.
 template <class M>
-constexpr auto combined_alpha(typename M::Wide A, typename M::Wide D) {
+ZR_PURE auto combined_alpha(typename M::Wide A, typename M::Wide D) {
   return M::white - M::mul(M::inv(A), M::inv(D));
 }
 
 struct Copy : Mode<XferCopy, ModeKind::copy> {
-  template <class T>
-  static void pixel(const T& s, Wide<T> A, T& d) {
-    d = s;
-    d.alpha = store<T>(A);
+  template <class M>
+  static ZR_PURE Px<M> pixel(const Px<M>& s, typename M::Wide A, const Px<M>&) {
+    return with_alpha<M>(s, A);
   }
 };
 
 struct CopyFast : Mode<XferCopyFast, ModeKind::row_only> {};
 struct MatteMix : Mode<XferMatteMix, ModeKind::row_only> {};
 struct Dissolve : Mode<XferDissolve, ModeKind::row_only> {
-  template <class T>
-  static void pixel(const T&, Wide<T>, T&) {}  // one pixel has no place in a row to draw lots for
+  template <class M>
+  static ZR_PURE Px<M> pixel(const Px<M>&, typename M::Wide, const Px<M>& d) {
+    return d;  // one pixel has no place in a row to draw lots for
+  }
 };
 
 struct Behind : Mode<XferBehind, ModeKind::over> {
-  template <class T>
-  static void pixel(const T& s, Wide<T> A, T& d) {
-    using M = ModeMath<T>;
-    const Wide<T> D = d.alpha;
-    if (D == M::white) return;
-    const Wide<T> R = combined_alpha<M>(A, D);
-    each_colour(s, d, [&](Wide<T> sc, Wide<T> dc) { return M::div(M::stored(M::drawn(M::mul(sc, A), dc, D)), R); });
-    d.alpha = store<T>(R);
+  template <class M>
+  static ZR_PURE Px<M> pixel(const Px<M>& s, typename M::Wide A, const Px<M>& d) {
+    using Wide = typename M::Wide;
+    const Wide D = d.alpha;
+    return choose(
+        D == M::white, [&]() ZR_FORMULA { return d; },
+        [&]() ZR_FORMULA {
+          const Wide R = combined_alpha<M>(A, D);
+          return with_alpha<M>(each_colour<M>(s, d,
+                                              [&](Wide sc, Wide dc) ZR_FORMULA {
+                                                return M::div(M::stored(M::drawn(M::mul(sc, A), dc, D)), R);
+                                              }),
+                               R);
+        });
   }
 };
 
 struct InFront : Mode<XferInFront, ModeKind::over, RowClass::self_contained> {
-  template <class T>
-  static void pixel(const T& s, Wide<T> A, T& d) {
-    using M = ModeMath<T>;
-    const Wide<T> D = d.alpha;
-    if (A == M::white) {
-      d = s;
-    } else if (D == 0) {  // without a rounding
-      d = s;
-      d.alpha = store<T>(A);
-    } else {
-      const Wide<T> R = combined_alpha<M>(A, D);
-      each_colour(s, d, [&](Wide<T> sc, Wide<T> dc) {
-        const Wide<T> t = M::mul(dc, D);
-        return M::div(M::stored(t + M::smul(A, sc - t)), R);
-      });
-      d.alpha = store<T>(R);
-    }
+  template <class M>
+  static ZR_PURE Px<M> pixel(const Px<M>& s, typename M::Wide A, const Px<M>& d) {
+    using Wide = typename M::Wide;
+    const Wide D = d.alpha;
+    return choose(
+        A == M::white, [&]() ZR_FORMULA { return s; },
+        [&]() ZR_FORMULA {
+          return choose(
+              D == 0, [&]() ZR_FORMULA { return with_alpha<M>(s, A); },  // without a rounding
+              [&]() ZR_FORMULA {
+                const Wide R = combined_alpha<M>(A, D);
+                const auto mixed = [&](Wide sc, Wide dc) ZR_FORMULA {
+                  const Wide t = M::mul(dc, D);
+                  return M::div(M::stored(t + M::smul(A, sc - t)), R);
+                };
+                return with_alpha<M>(each_colour<M>(s, d, mixed), R);
+              });
+        });
   }
 };
 
@@ -127,54 +110,57 @@ struct InFront : Mode<XferInFront, ModeKind::over, RowClass::self_contained> {
 // that, and alpha 0 still adds the colour.
 struct AddPremul : Mode<XferAddPremul, ModeKind::special, RowClass::self_contained> {
   static constexpr bool scales_source = true;
-  template <class T>
-  static void pixel(const T& s, Wide<T> A, T& d) {
-    using M = ModeMath<T>;
-    const Wide<T> D = d.alpha, K = M::mul(M::inv(A), D);
-    const Wide<T> R = combined_alpha<M>(A, D);
-    each_colour(s, d, [&](Wide<T> sc, Wide<T> dc) { return M::div(M::stored(M::capped(sc + M::mul(dc, K))), R); });
-    d.alpha = store<T>(R);
+  template <class M>
+  static ZR_PURE Px<M> pixel(const Px<M>& s, typename M::Wide A, const Px<M>& d) {
+    using Wide = typename M::Wide;
+    const Wide D = d.alpha, K = M::mul(M::inv(A), D);
+    const Wide R = combined_alpha<M>(A, D);
+    return with_alpha<M>(
+        each_colour<M>(
+            s, d, [&](Wide sc, Wide dc) ZR_FORMULA { return M::div(M::stored(M::capped(sc + M::mul(dc, K))), R); }),
+        R);
   }
 };
 
 // Alphas add, for edges that must sum to full coverage.
 struct AlphaAdd : Mode<XferAlphaAdd, ModeKind::special, RowClass::self_contained> {
-  template <class T>
-  static void pixel(const T& s, Wide<T> A, T& d) {
-    using M = ModeMath<T>;
-    const Wide<T> D = d.alpha, sum = A + D;
-    if (A == M::white) {
-      d = s;
-      d.alpha = store<T>(M::white);
-    } else if (sum >= M::white) {
-      each_colour(s, d, [&](Wide<T> sc, Wide<T> dc) { return M::mul(sc, A) + M::mul(dc, M::inv(A)); });
-      d.alpha = store<T>(M::white);
-    } else {
-      each_colour(s, d, [&](Wide<T> sc, Wide<T> dc) { return M::div(M::stored(M::mul(sc, A) + M::mul(dc, D)), sum); });
-      d.alpha = store<T>(sum);
-    }
+  template <class M>
+  static ZR_PURE Px<M> pixel(const Px<M>& s, typename M::Wide A, const Px<M>& d) {
+    using Wide = typename M::Wide;
+    const Wide D = d.alpha, sum = A + D;
+    return choose(
+        A == M::white, [&]() ZR_FORMULA { return with_alpha<M>(s, M::white); },
+        [&]() ZR_FORMULA {
+          return choose(
+              sum >= M::white,
+              [&]() ZR_FORMULA {
+                const auto mixed = [&](Wide sc, Wide dc) ZR_FORMULA { return M::mul(sc, A) + M::mul(dc, M::inv(A)); };
+                return with_alpha<M>(each_colour<M>(s, d, mixed), M::white);
+              },
+              [&]() ZR_FORMULA {
+                const auto mixed = [&](Wide sc, Wide dc)
+                                       ZR_FORMULA { return M::div(M::stored(M::mul(sc, A) + M::mul(dc, D)), sum); };
+                return with_alpha<M>(each_colour<M>(s, d, mixed), sum);
+              });
+        });
   }
 };
 
 struct BlueThreshold : Mode<XferBlueThreshold, ModeKind::special> {
-  template <class T>
-  static void pixel(const T& s, Wide<T> A, T& d) {
-    if (!(A >= ModeMath<T>::half)) return;  // NaN too
-    d.blue = s.blue;
-    d.alpha = store<T>(ModeMath<T>::white);
+  template <class M>
+  static ZR_PURE Px<M> pixel(const Px<M>& s, typename M::Wide A, const Px<M>& d) {
+    return pick(A >= M::half, Px<M>{M::white, d.red, d.green, s.blue}, d);  // not NaN
   }
 };
 
 // Four marker colours of the destination are kept; all else takes the source as it is stored.
 struct KeyProtect : Mode<XferKeyProtect, ModeKind::special> {
-  template <class T>
-  static void pixel(const T& s, Wide<T>, T& d) {
-    using M = ModeMath<T>;
-    const auto is = [&d](Wide<T> red, Wide<T> green, Wide<T> blue) {
-      return d.red == red && d.green == green && d.blue == blue;
-    };
-    const bool marker = is(M::white, 0, 0) || is(0, M::white, 0) || is(0, 0, M::marker_high) || is(0, 0, M::marker_low);
-    if (!marker) d = s;
+  template <class M>
+  static ZR_PURE Px<M> pixel(const Px<M>& s, typename M::Wide, const Px<M>& d) {
+    const auto no_red = d.red == 0, no_green = d.green == 0, no_blue = d.blue == 0;
+    const auto marker = (d.red == M::white && no_green && no_blue) || (no_red && d.green == M::white && no_blue) ||
+                        (no_red && no_green && (d.blue == M::marker_high || d.blue == M::marker_low));
+    return pick(marker, d, s);
   }
 };
 
@@ -182,67 +168,67 @@ struct KeyProtect : Mode<XferKeyProtect, ModeKind::special> {
 
 struct Add : Mode<XferAdd, ModeKind::black_ground> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     return M::capped(s + d);
   }
   template <class M>
-  static constexpr auto partial(auto s, auto A, auto d) {
+  static ZR_PURE auto partial(auto s, auto A, auto d) {
     return full<M>(M::mul(s, A), d);
   }
 };
 
 struct Screen : Mode<XferScreen, ModeKind::black_ground> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     return M::white - M::mul(M::inv(s), M::inv(d));
   }
   template <class M>
-  static constexpr auto partial(auto s, auto A, auto d) {
+  static ZR_PURE auto partial(auto s, auto A, auto d) {
     return full<M>(M::mul(s, A), d);
   }
 };
 
 struct Lighten : Mode<XferLighten, ModeKind::black_ground> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
-    return s > d ? s : d;
+  static ZR_PURE auto full(auto s, auto d) {
+    return pick(s > d, s, d);
   }
   template <class M>
-  static constexpr auto partial(auto s, auto A, auto d) {
-    return s > d ? d + M::mul(A, s - d) : d;
+  static ZR_PURE auto partial(auto s, auto A, auto d) {
+    return pick(s > d, d + M::mul(A, s - d), d);
   }
 };
 
 struct Difference : Mode<XferDifference, ModeKind::black_ground> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     return M::magnitude(s - d);
   }
   template <class M>
-  static constexpr auto partial(auto s, auto A, auto d) {
+  static ZR_PURE auto partial(auto s, auto A, auto d) {
     return full<M>(M::mul(s, A), d);
   }
 };
 
 struct ColorDodge : Mode<XferColorDodge, ModeKind::black_ground> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     const auto w = M::inv(s);
-    return d >= w ? M::white : M::div(d, w);
+    return pick(d >= w, M::white, M::div(d, w));
   }
   template <class M>
-  static constexpr auto partial(auto s, auto A, auto d) {
+  static ZR_PURE auto partial(auto s, auto A, auto d) {
     return full<M>(M::mul(s, A), d);
   }
 };
 
 struct Exclusion : Mode<XferExclusion, ModeKind::black_ground> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     return s + d - 2 * M::mul(s, d);
   }
   template <class M>
-  static constexpr auto partial(auto s, auto A, auto d) {
+  static ZR_PURE auto partial(auto s, auto A, auto d) {
     const auto product = M::mul(s, d);
     return d + M::smul(A, s - product - product);
   }
@@ -252,38 +238,38 @@ struct Exclusion : Mode<XferExclusion, ModeKind::black_ground> {
 
 struct Multiply : Mode<XferMultiply, ModeKind::white_ground> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     return d - M::mul(d, M::inv(s));
   }
   template <class M>
-  static constexpr auto row_full(auto s, auto d) {
+  static ZR_PURE auto row_full(auto s, auto d) {
     return M::mul(s, d);
   }
   template <class M>
-  static constexpr auto partial(auto s, auto A, auto d) {
+  static ZR_PURE auto partial(auto s, auto A, auto d) {
     return d - M::mul(M::mul(d, M::inv(s)), A);
   }
 };
 
 struct Darken : Mode<XferDarken, ModeKind::white_ground> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
-    return s < d ? s : d;
+  static ZR_PURE auto full(auto s, auto d) {
+    return pick(s < d, s, d);
   }
   template <class M>
-  static constexpr auto partial(auto s, auto A, auto d) {
-    return s < d ? d - M::mul(A, d - s) : d;
+  static ZR_PURE auto partial(auto s, auto A, auto d) {
+    return pick(s < d, d - M::mul(A, d - s), d);
   }
 };
 
 struct ColorBurn : Mode<XferColorBurn, ModeKind::white_ground> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     const auto w = M::inv(d);
-    return w >= s ? typename M::Wide{0} : M::white - M::div(w, s);
+    return pick(w >= s, 0, M::white - M::div(w, s));
   }
   template <class M>
-  static constexpr auto partial(auto s, auto A, auto d) {
+  static ZR_PURE auto partial(auto s, auto A, auto d) {
     return full<M>(M::inv(M::mul(M::inv(s), A)), d);
   }
 };
@@ -292,46 +278,48 @@ struct ColorBurn : Mode<XferColorBurn, ModeKind::white_ground> {
 
 struct Overlay : Mode<XferOverlay, ModeKind::grey_ground> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
-    return d < M::half ? 2 * M::mul(s, d) : M::white - M::mul(M::inv(s), 2 * M::inv(d));
+  static ZR_PURE auto full(auto s, auto d) {
+    return pick(d < M::half, 2 * M::mul(s, d), M::white - M::mul(M::inv(s), 2 * M::inv(d)));
   }
   template <class M>
-  static constexpr auto partial(auto s, auto A, auto d) {
+  static ZR_PURE auto partial(auto s, auto A, auto d) {
     return d + M::smul(A, full<M>(s, d) - d);
   }
 };
 
 struct SoftLight : Mode<XferSoftLight, ModeKind::grey_ground> {
   template <class M>
-  static auto full(auto s, auto d) {
-    return s < M::half ? d - M::mul(M::inv(2 * s), M::soft_low(d)) : d + M::mul(2 * s - M::white, M::soft_high(d));
+  static ZR_PURE auto full(auto s, auto d) {
+    return pick(s < M::half, d - M::mul(M::inv(2 * s), M::soft_low(d)), d + M::mul(2 * s - M::white, M::soft_high(d)));
   }
   template <class M>
-  static auto partial(auto s, auto A, auto d) {
-    return s < M::half ? d - M::soft_weight(M::inv(2 * s), M::soft_low(d), A)
-                       : d + M::soft_weight(2 * s - M::white, M::soft_high(d), A);
+  static ZR_PURE auto partial(auto s, auto A, auto d) {
+    return pick(s < M::half, d - M::soft_weight(M::inv(2 * s), M::soft_low(d), A),
+                d + M::soft_weight(2 * s - M::white, M::soft_high(d), A));
   }
 };
 
 struct HardLight : Mode<XferHardLight, ModeKind::grey_ground> {
   // Twice the half is 256 at 8 bits: a white source counts as 254 there, not 255.
   template <class M>
-  static constexpr auto full(auto s, auto d) {
-    return s < M::half ? d - M::mul(d, M::inv(2 * s)) : d + M::mul(M::inv(d), 2 * s - 2 * M::half);
+  static ZR_PURE auto full(auto s, auto d) {
+    return pick(s < M::half, d - M::mul(d, M::inv(2 * s)), d + M::mul(M::inv(d), 2 * s - 2 * M::half));
   }
   template <class M>
-  static constexpr auto partial(auto s, auto A, auto d) {
-    return s < M::half ? d - M::mul(M::mul(d, M::inv(2 * s)), A)
-                       : d + M::mul(M::mul(M::inv(d), 2 * s - 2 * M::half), A);
+  static ZR_PURE auto partial(auto s, auto A, auto d) {
+    return pick(s < M::half, d - M::mul(M::mul(d, M::inv(2 * s)), A),
+                d + M::mul(M::mul(M::inv(d), 2 * s - 2 * M::half), A));
   }
 };
+#ifndef ZR_IN_LANES
 static_assert(HardLight::full<ModeMath<ZR_Pixel8>>(255, 0) == 254, "8-bit doubling drops the low bit");
+#endif
 
 // ------------------------------------------------------------------------------ weighted by both alphas
 
 struct DifferenceW : Mode<XferDifferenceW, ModeKind::weighted> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     return M::magnitude(s - d);
   }
 };
@@ -339,84 +327,83 @@ struct DifferenceW : Mode<XferDifferenceW, ModeKind::weighted> {
 // Black stays black, also under white.
 struct ColorDodgeW : Mode<XferColorDodgeW, ModeKind::weighted> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
-    return d == 0 ? typename M::Wide{0} : ColorDodge::full<M>(s, d);
+  static ZR_PURE auto full(auto s, auto d) {
+    return pick(d == 0, 0, ColorDodge::full<M>(s, d));
   }
 };
 
 // White stays white, also under black.
 struct ColorBurnW : Mode<XferColorBurnW, ModeKind::weighted> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
-    return s == 0 && d == M::white ? M::white : ColorBurn::full<M>(s, d);
+  static ZR_PURE auto full(auto s, auto d) {
+    return pick(s == 0 && d == M::white, M::white, ColorBurn::full<M>(s, d));
   }
 };
 
 struct LinearDodge : Mode<XferLinearDodge, ModeKind::weighted> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     return M::capped(s + d);
   }
 };
 
 struct LinearBurn : Mode<XferLinearBurn, ModeKind::weighted> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     const auto sum = s + d - M::white;
-    return sum < 0 ? typename M::Wide{0} : sum;  // float is clamped too
+    return pick(sum < 0, 0, sum);  // float is clamped too
   }
 };
 
 struct LinearLight : Mode<XferLinearLight, ModeKind::weighted> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     return M::capped(M::floored(2 * s - 2 * M::half + d));
   }
 };
 
 struct VividLight : Mode<XferVividLight, ModeKind::weighted> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
-    return s < M::half ? low<M>(s, d) : s > M::half ? high<M>(s, d) : d;
+  static ZR_PURE auto full(auto s, auto d) {
+    return pick(s < M::half, low<M>(s, d), pick(s > M::half, high<M>(s, d), d));
   }
 
  private:
   template <class M>
-  static constexpr auto low(auto s, auto d) {
-    return s == 0 ? typename M::Wide{0} : ColorBurn::full<M>(M::stretched_low(s), d);
+  static ZR_PURE auto low(auto s, auto d) {
+    return pick(s == 0, 0, ColorBurn::full<M>(M::stretched_low(s), d));
   }
   template <class M>
-  static constexpr auto high(auto s, auto d) {
-    return s == M::white ? M::white : ColorDodge::full<M>(M::stretched_high(s), d);
+  static ZR_PURE auto high(auto s, auto d) {
+    return pick(s == M::white, M::white, ColorDodge::full<M>(M::stretched_high(s), d));
   }
 };
 
 struct PinLight : Mode<XferPinLight, ModeKind::weighted> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
-    return s < M::half   ? Darken::full<M>(M::stretched_low(s), d)
-           : s > M::half ? Lighten::full<M>(M::stretched_high(s), d)
-                         : d;
+  static ZR_PURE auto full(auto s, auto d) {
+    return pick(s < M::half, Darken::full<M>(M::stretched_low(s), d),
+                pick(s > M::half, Lighten::full<M>(M::stretched_high(s), d), d));
   }
 };
 
 struct HardMix : Mode<XferHardMix, ModeKind::weighted> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     return M::hard_mix(s, d);
   }
 };
 
 struct Subtract : Mode<XferSubtract, ModeKind::weighted> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     return M::floored(d - s);
   }
 };
 
 struct Divide : Mode<XferDivide, ModeKind::weighted> {
   template <class M>
-  static constexpr auto full(auto s, auto d) {
+  static ZR_PURE auto full(auto s, auto d) {
     return M::quotient(d, s);
   }
 };
@@ -428,28 +415,28 @@ struct Divide : Mode<XferDivide, ModeKind::weighted> {
 
 struct Hue : Mode<XferHue, ModeKind::colour> {
   template <class M>
-  static constexpr Rgb<M> recoloured(const Rgb<M>& s, const Rgb<M>& d) {
+  static ZR_PURE Px<M> recoloured(const Px<M>& s, const Px<M>& d) {
     return with_luma(with_saturation(s, saturation_of(d)), luma_of(d));
   }
 };
 
 struct Saturation : Mode<XferSaturation, ModeKind::colour> {
   template <class M>
-  static constexpr Rgb<M> recoloured(const Rgb<M>& s, const Rgb<M>& d) {
+  static ZR_PURE Px<M> recoloured(const Px<M>& s, const Px<M>& d) {
     return with_luma(with_saturation(d, saturation_of(s)), luma_of(d));
   }
 };
 
 struct Color : Mode<XferColor, ModeKind::colour> {
   template <class M>
-  static constexpr Rgb<M> recoloured(const Rgb<M>& s, const Rgb<M>& d) {
+  static ZR_PURE Px<M> recoloured(const Px<M>& s, const Px<M>& d) {
     return with_luma(s, luma_of(d));
   }
 };
 
 struct Luminosity : Mode<XferLuminosity, ModeKind::colour> {
   template <class M>
-  static constexpr Rgb<M> recoloured(const Rgb<M>& s, const Rgb<M>& d) {
+  static ZR_PURE Px<M> recoloured(const Px<M>& s, const Px<M>& d) {
     return with_luma(d, luma_of(s));
   }
 };
@@ -457,17 +444,17 @@ struct Luminosity : Mode<XferLuminosity, ModeKind::colour> {
 // wanted: whether the pixel is recoloured at all, by the lumas of source and destination.
 
 struct LighterColor : Mode<XferLighterColor, ModeKind::colour> {
-  static constexpr bool wanted(auto source_luma, auto luma) { return source_luma > luma; }
+  static ZR_PURE auto wanted(auto source_luma, auto luma) { return source_luma > luma; }
   template <class M>
-  static constexpr Rgb<M> recoloured(const Rgb<M>& s, const Rgb<M>&) {
+  static ZR_PURE Px<M> recoloured(const Px<M>& s, const Px<M>&) {
     return s;
   }
 };
 
 struct DarkerColor : Mode<XferDarkerColor, ModeKind::colour> {
-  static constexpr bool wanted(auto source_luma, auto luma) { return source_luma < luma; }
+  static ZR_PURE auto wanted(auto source_luma, auto luma) { return source_luma < luma; }
   template <class M>
-  static constexpr Rgb<M> recoloured(const Rgb<M>& s, const Rgb<M>&) {
+  static ZR_PURE Px<M> recoloured(const Px<M>& s, const Px<M>&) {
     return s;
   }
 };
@@ -478,28 +465,28 @@ struct DarkerColor : Mode<XferDarkerColor, ModeKind::colour> {
 
 struct MultiplyAlpha : Mode<XferMultiplyAlpha, ModeKind::alpha_only> {
   template <class M>
-  static constexpr auto alpha(const Rgb<M>&, auto A, auto D) {
+  static ZR_PURE auto alpha(const Px<M>&, auto A, auto D) {
     return M::mul(D, A);
   }
 };
 
 struct MultiplyAlphaLuma : Mode<XferMultiplyAlphaLuma, ModeKind::alpha_only> {
   template <class M>
-  static constexpr auto alpha(const Rgb<M>& s, auto A, auto D) {
+  static ZR_PURE auto alpha(const Px<M>& s, auto A, auto D) {
     return M::luma_alpha(M::mul(D, M::mul(luma_of(s), A)));
   }
 };
 
 struct MultiplyNotAlpha : Mode<XferMultiplyNotAlpha, ModeKind::alpha_only> {
   template <class M>
-  static constexpr auto alpha(const Rgb<M>&, auto A, auto D) {
+  static ZR_PURE auto alpha(const Px<M>&, auto A, auto D) {
     return M::mul(D, M::inv(A));
   }
 };
 
 struct MultiplyNotAlphaLuma : Mode<XferMultiplyNotAlphaLuma, ModeKind::alpha_only> {
   template <class M>
-  static constexpr auto alpha(const Rgb<M>& s, auto A, auto D) {
+  static ZR_PURE auto alpha(const Px<M>& s, auto A, auto D) {
     return M::luma_alpha(M::mul(D, M::inv(M::mul(luma_of(s), A))));
   }
 };
@@ -521,6 +508,6 @@ constexpr void for_each_mode(Visit&& visit) {
   }(static_cast<AllModes*>(nullptr));
 }
 
-inline constexpr i32 first_mode = -3, mode_rows = 44, pixel_slots = 44;
+ZR_END_FORMULAS
 
-}  // namespace zr
+#endif

@@ -1,0 +1,133 @@
+// The operations in which transfer modes differ from depth to depth, each under one name, so that a mode
+// is told once: ModeMath<T> is the channel arithmetic of T and these. Of single numbers or of lanes.
+#if defined(ZR_COMPOSITE_MODE_ARITHMETIC_INL_H) == defined(HWY_TARGET_TOGGLE)
+#ifdef ZR_COMPOSITE_MODE_ARITHMETIC_INL_H
+#undef ZR_COMPOSITE_MODE_ARITHMETIC_INL_H
+#else
+#define ZR_COMPOSITE_MODE_ARITHMETIC_INL_H
+#endif
+
+#include "composite/soft_light_state.h"
+#ifdef ZR_IN_LANES
+#include "simd/lane_depth-inl.h"
+#else
+#include "simd/single-inl.h"
+#endif
+#include "simd/formulas.h"
+
+ZR_BEGIN_FORMULAS
+
+template <class T>
+struct ModeMath;
+
+// What the two integer depths share. An integer channel is stored modulo its width; divisors are checked
+// because 16-bit channels may be illegal.
+template <class T>
+struct IntegerModeMath : Primitive<T> {
+  using D = Primitive<T>;
+  using Wide = Number<T>;
+
+  // Clamps that float has not.
+  static ZR_PURE Wide capped(Wide v) { return pick(v < D::white, v, D::white); }
+  static ZR_PURE Wide floored(Wide v) { return pick(v > 0, v, 0); }
+  static ZR_PURE Wide magnitude(Wide v) { return pick(v < 0, 0 - v, v); }
+  // a * b / c of the colour modes, toward zero; legal pixels come here with c > 0 only.
+  static ZR_PURE auto divides(Wide c) { return c > 0; }
+  static ZR_PURE Wide ratio(Wide a, Wide b, Wide c) { return product_ratio(a, b, pick(divides(c), c, 1)); }
+  // The weight of a soft-light table value under a partial alpha.
+  static ZR_PURE Wide soft_weight(Wide k, Wide v, Wide A) { return D::mul(A, D::mul(k, v)); }
+  static ZR_PURE Wide quotient(Wide d, Wide s) { return pick(d == 0, d, pick(d >= s, D::white, D::div(d, s))); }
+  static ZR_PURE Wide luma_alpha(Wide a) { return a; }
+  static ZR_PURE Wide weighted(Wide s, Wide d, Wide f, Wide A, Wide a, Wide R) {
+    const Wide both = D::mul(A, a);
+    const Wide n = D::mul(A, s) + D::mul(a, d) - D::mul(d, both) - (D::mul(s, both) - D::mul(both, f));
+    return D::div(D::stored(n), R);
+  }
+};
+
+template <>
+struct ModeMath<ZR_Pixel8> : IntegerModeMath<ZR_Pixel8> {
+  // t drawn toward d. Not smul: the fold of a negative product rounds another way, so the sign is
+  // taken out first.
+  static ZR_PURE Wide drawn(Wide t, Wide d, Wide k) { return pick(d >= t, t + mul(d - t, k), t - mul(t - d, k)); }
+  // Twice s below half and twice s less white above, of the modes that stretch a half to the whole.
+  static ZR_PURE Wide stretched_low(Wide s) { return shifted_right<7>(s * 255 + 64); }
+  static inline Wide stretched_high(Wide s) { return div(s - half, 127); }
+  static inline Wide soft_low(Wide d) { return entry_of(soft_light_low_8.data(), masked(d, 255)); }
+  static inline Wide soft_high(Wide d) { return entry_of(soft_light_high_8.data(), masked(d, 255)); }
+  static ZR_PURE Wide hard_mix(Wide s, Wide d) { return pick(d > mul(254, inv(s)), white, 0); }
+  // The mask first, then the opacity; alpha unions and the other depths go the other way round.
+  static ZR_PURE Wide covered(Wide c, Wide opacity, Wide mask) { return mul(mul(mask, c), opacity); }
+  static constexpr i32 marker_high = 191, marker_low = 64;  // 0.75 and 0.25 of white
+};
+
+template <>
+struct ModeMath<ZR_Pixel16> : IntegerModeMath<ZR_Pixel16> {
+  static ZR_PURE Wide drawn(Wide t, Wide d, Wide k) { return t + smul(k, d - t); }
+  static ZR_PURE Wide stretched_low(Wide s) { return 2 * s; }
+  static ZR_PURE Wide stretched_high(Wide s) { return 2 * s - white; }
+  static inline Wide soft_low(Wide d) { return interpolated(soft_light_low_16, d); }
+  static inline Wide soft_high(Wide d) { return interpolated(soft_light_high_16, d); }
+  static ZR_PURE Wide hard_mix(Wide s, Wide d) { return pick(d > shifted_right<15>(inv(s) * 32767 + 16384), white, 0); }
+  static ZR_PURE Wide covered(Wide c, Wide opacity, Wide mask) { return mul(mask, mul(c, opacity)); }
+  static constexpr i32 marker_high = 24576, marker_low = 8192;
+
+ private:
+  // The tables have an entry for every eighth value.
+  static inline Wide interpolated(const i32* table, Wide d) {
+    const Wide v = held(d, 0, white);  // an illegal channel stays inside the table
+    const Wide entry = shifted_right<3>(v), between = masked(v, 7);
+    const Wide low = entry_of(table, entry);
+    return low + shifted_right<3>(between * (entry_of(table + 1, entry) - low) + 4);
+  }
+};
+
+// Float: no clamps and no storing, other roundings of the same formulas, and two formulas of its own.
+template <>
+struct ModeMath<ZR_PixelFloat> : Primitive<ZR_PixelFloat> {
+  using Wide = Number<ZR_PixelFloat>;
+
+  static ZR_PURE Wide capped(Wide v) { return v; }
+  static ZR_PURE Wide floored(Wide v) { return v; }
+  static ZR_PURE Wide magnitude(Wide v) { return magnitude_of(v); }
+  static ZR_PURE auto divides(Wide c) { return c != 0.0f; }
+  static ZR_PURE Wide ratio(Wide a, Wide b, Wide c) { return a * b / c; }
+  static ZR_PURE Wide drawn(Wide t, Wide d, Wide k) { return t + (d - t) * k; }
+  static ZR_PURE Wide stretched_low(Wide s) { return 2.0f * s; }
+  static ZR_PURE Wide stretched_high(Wide s) { return (s - 0.5f) * 2.0f; }
+  static inline Wide soft_low(Wide d) { return interpolated(soft_light_low_float, d); }
+  static inline Wide soft_high(Wide d) { return interpolated(soft_light_high_float, d); }
+  static ZR_PURE Wide soft_weight(Wide k, Wide v, Wide A) { return k * (v * A); }
+  // A ramp of the width of `step` instead of a threshold.
+  static ZR_PURE Wide hard_mix(Wide s, Wide d) {
+    constexpr f32 step = 1.001358e-5f;
+    const Wide w = (1.0f - s) * 0.99999f;
+    const Wide t = d - w;
+    return pick(d <= w, 0.0f, pick(t >= step, 1.0f, t / step));
+  }
+  // Sources nearer to black than `least` divide by it.
+  static ZR_PURE Wide quotient(Wide d, Wide s) {
+    constexpr f32 least = 1.8189894e-6f;
+    return d / pick(magnitude(s) > least, s, least);
+  }
+  // An alpha that was multiplied by a luma is the only one that is clamped.
+  static ZR_PURE Wide luma_alpha(Wide a) { return pick(a > 1.0f, 1.0f, pick(a < 1e-16f, 0.0f, a)); }
+  static ZR_PURE Wide weighted(Wide s, Wide d, Wide f, Wide A, Wide a, Wide R) {
+    return div(((f - s - d) * a + s) * A + a * d, R);
+  }
+  static ZR_PURE Wide covered(Wide c, Wide opacity, Wide mask) { return mask * (c * opacity); }
+  static constexpr f32 marker_high = 0.75f, marker_low = 0.25f;
+
+ private:
+  // Below 0 the first segment goes on; above 1 the tables read zero.
+  static inline Wide interpolated(const f32* table, Wide d) {
+    const Wide t = 4096.0f * d;
+    const auto i = held(to_int(t), 0, 4096);
+    const Wide between = t - to_float(i), low = entry_of(table, i);
+    return pick(between != 0.0f, low + (entry_of(table + 1, i) - low) * between, low);
+  }
+};
+
+ZR_END_FORMULAS
+
+#endif

@@ -1,0 +1,218 @@
+// Channel arithmetic of the three depths on lanes: what <ZR/depth.h> says of single numbers, to the last bit.
+// Integer channels are legal ones: whoever loads 16-bit pixels has looked.
+#if defined(ZR_SIMD_LANE_DEPTH_INL_H) == defined(HWY_TARGET_TOGGLE)
+#ifdef ZR_SIMD_LANE_DEPTH_INL_H
+#undef ZR_SIMD_LANE_DEPTH_INL_H
+#else
+#define ZR_SIMD_LANE_DEPTH_INL_H
+#endif
+
+#include "simd/lanes-inl.h"
+
+#if ZR_HAS_LANES
+HWY_BEFORE_NAMESPACE();
+namespace zr {
+namespace HWY_NAMESPACE {
+
+template <class T>
+using Number = Lane<std::conditional_t<std::is_same_v<T, ZR_PixelFloat>, f32, i32>>;
+
+HWY_INLINE Floats magnitude_of(Floats v) { return hn::Abs(v.v); }
+HWY_INLINE Ints held(Ints v, i32 low, i32 high) { return hn::Min(hn::Max(v.v, Ints(low).v), Ints(high).v); }
+// The table has an entry for every index.
+template <class N>
+HWY_INLINE Lane<N> entry_of(const N* table, Ints index) {
+  return hn::GatherIndex(Tag<N>(), table, index.v);
+}
+
+// a * b / c toward zero for c > 0; the product wraps. By doubles, whose quotient is never off by an integer.
+HWY_INLINE Ints product_ratio(Ints a, Ints b, Ints c) {
+  using Half = hn::Rebind<f64, hn::Half<Tag<i32>>>;
+  const Half d;
+  const hn::Rebind<i32, Half> di;
+  const Ints n = a * b;
+  const auto lower = hn::Div(hn::PromoteTo(d, hn::LowerHalf(di, n.v)), hn::PromoteTo(d, hn::LowerHalf(di, c.v)));
+  const auto upper = hn::Div(hn::PromoteTo(d, hn::UpperHalf(di, n.v)), hn::PromoteTo(d, hn::UpperHalf(di, c.v)));
+  return hn::Combine(Tag<i32>(), hn::DemoteTo(di, upper), hn::DemoteTo(di, lower));
+}
+
+template <class T>
+struct Primitive;
+
+template <>
+struct Primitive<ZR_Pixel8> {
+  static constexpr i32 white = 255, half = 128;
+
+  static HWY_INLINE Ints stored(Ints v) { return masked(v, 255); }
+  static HWY_INLINE Ints fold(Ints t) { return shifted_right<8>(t + shifted_right<8>(t + 128) + 128); }
+  static HWY_INLINE Ints mul(Ints a, Ints b) { return fold(a * b); }
+  static HWY_INLINE Ints smul(Ints k, Ints x) { return fold(k * x); }
+  static HWY_INLINE Ints inv(Ints a) { return white - a; }
+  // One division serves three channels. The quotient lies half of 1/r or more away from what would round to
+  // another integer, and is off by less than 1/r / 100.
+  static HWY_INLINE Ints div(Ints n, Ints r) {
+    const Bools<i32> full = n >= r;
+    if (all(full || r == white)) return pick(full, white, n);
+    const Floats numerator = to_float(n * white + shifted_right<1>(r)) + 0.5f;
+    return pick(full, white, fitting_int(numerator * (1.0f / to_float(r))));
+  }
+  static HWY_INLINE Ints luma(Ints r, Ints g, Ints b) {
+    return shifted_right<15>(luma_red * r + luma_green * g + luma_blue * b + 16384);
+  }
+};
+
+template <>
+struct Primitive<ZR_Pixel16> {
+  static constexpr i32 white = 32768, half = 16384;
+
+  static HWY_INLINE Ints stored(Ints v) { return masked(v, 65535); }
+  static HWY_INLINE Ints mul(Ints a, Ints b) { return shifted_right<15>(a * b + 16383); }
+  static HWY_INLINE Ints smul(Ints k, Ints x) { return shifted_right<15>(k * x); }
+  static HWY_INLINE Ints inv(Ints a) { return white - a; }
+  // The estimate is off by less than 1/64; made a little small, it is the quotient or one less.
+  static HWY_INLINE Ints div(Ints n, Ints r) {
+    const Bools<i32> full = at_least(n, r);
+    if (all(full || r == white)) return pick(full, white, n);
+    const Ints numerator = shifted_left<15>(n) + shifted_right<1>(r);
+    const Ints least = fitting_int(to_float(numerator) * (1.0f / to_float(r)) - 0.03125f);
+    const Ints quotient = pick(numerator - least * r >= r, least + 1, least);
+    return pick(full, white, quotient);
+  }
+  static HWY_INLINE Ints luma(Ints r, Ints g, Ints b) {
+    return shifted_right<15>(luma_red * r + luma_green * g + luma_blue * b + 16384);
+  }
+
+ private:
+  // Negative numbers count as the greatest.
+  static HWY_INLINE Bools<i32> at_least(Ints n, Ints r) {
+    const hn::Rebind<u32, Tag<i32>> unsigned_tag;
+    const auto a = hn::BitCast(unsigned_tag, n.v), b = hn::BitCast(unsigned_tag, r.v);
+    return {hn::RebindMask(Tag<i32>(), hn::Not(hn::Lt(a, b)))};
+  }
+};
+
+template <>
+struct Primitive<ZR_PixelFloat> {
+  static constexpr f32 white = 1.0f, half = 0.5f;
+
+  static HWY_INLINE Floats stored(Floats v) { return v; }
+  static HWY_INLINE Floats mul(Floats a, Floats b) { return a * b; }
+  static HWY_INLINE Floats smul(Floats k, Floats x) { return k * x; }
+  static HWY_INLINE Floats inv(Floats a) { return 1.0f - a; }
+  static HWY_INLINE Floats div(Floats n, Floats r) {
+    if (all(r == white)) return n;
+    const Ints exponent = masked(hn::BitCast(Tag<i32>(), r.v), 0x7f800000);
+    const Bools<f32> tiny = {hn::RebindMask(Tag<f32>(), (exponent == 0).mask)};
+    return pick(tiny, 1.0f, n / r);
+  }
+  static HWY_INLINE Floats luma(Floats r, Floats g, Floats b) { return 0.299f * r + 0.587f * g + 0.114f * b; }
+};
+
+// ------------------------------------------------------------------------------ pixels
+
+template <class M>
+struct Px {
+  typename M::Wide alpha, red, green, blue;
+};
+template <class M, class N>
+HWY_INLINE Px<M> pick(Bools<N> c, const Px<M>& a, const Px<M>& b) {
+  return {pick(c, a.alpha, b.alpha), pick(c, a.red, b.red), pick(c, a.green, b.green), pick(c, a.blue, b.blue)};
+}
+
+// As many pixels as there are lanes, from and to memory without alignment.
+template <class M>
+HWY_INLINE Px<M> load(const ZR_Pixel8* p) {
+  const Ints words = hn::LoadU(Tag<i32>(), reinterpret_cast<const i32*>(p));
+  const hn::Rebind<u32, Tag<i32>> unsigned_tag;
+  const Ints last = hn::BitCast(Tag<i32>(), hn::ShiftRight<24>(hn::BitCast(unsigned_tag, words.v)));
+  return {masked(words, 255), masked(shifted_right<8>(words), 255), masked(shifted_right<16>(words), 255), last};
+}
+template <class M>
+HWY_INLINE void store(const Px<M>& v, ZR_Pixel8* p) {
+  const auto both = hn::Or(masked(v.alpha, 255).v, shifted_left<8>(masked(v.red, 255)).v);
+  const auto rest = hn::Or(shifted_left<16>(masked(v.green, 255)).v, shifted_left<24>(v.blue).v);
+  hn::StoreU(hn::Or(both, rest), Tag<i32>(), reinterpret_cast<i32*>(p));
+}
+template <class M>
+HWY_INLINE Px<M> load(const ZR_Pixel16* p) {
+  const hn::Rebind<u32, Tag<i32>> d;
+  hn::Vec<decltype(d)> front, back;
+  hn::LoadInterleaved2(d, reinterpret_cast<const u32*>(p), front, back);
+  const auto low = [&](auto v) HWY_ATTR { return Ints(hn::BitCast(Tag<i32>(), hn::And(v, hn::Set(d, 65535)))); };
+  const auto high = [&](auto v) HWY_ATTR { return Ints(hn::BitCast(Tag<i32>(), hn::ShiftRight<16>(v))); };
+  return {low(front), high(front), low(back), high(back)};
+}
+template <class M>
+HWY_INLINE void store(const Px<M>& v, ZR_Pixel16* p) {
+  const hn::Rebind<u32, Tag<i32>> d;
+  const auto pair = [&](Ints low, Ints high)
+                        HWY_ATTR { return hn::BitCast(d, hn::Or(masked(low, 65535).v, shifted_left<16>(high).v)); };
+  hn::StoreInterleaved2(pair(v.alpha, v.red), pair(v.green, v.blue), d, reinterpret_cast<u32*>(p));
+}
+template <class M>
+HWY_INLINE Px<M> load(const ZR_PixelFloat* p) {
+  Px<M> v;
+  hn::LoadInterleaved4(Tag<f32>(), reinterpret_cast<const f32*>(p), v.alpha.v, v.red.v, v.green.v, v.blue.v);
+  return v;
+}
+template <class M>
+HWY_INLINE void store(const Px<M>& v, ZR_PixelFloat* p) {
+  hn::StoreInterleaved4(v.alpha.v, v.red.v, v.green.v, v.blue.v, Tag<f32>(), reinterpret_cast<f32*>(p));
+}
+
+// How pixels lie in a Px. Apart: each channel in a vector of its own.
+struct Apart {
+  static constexpr i32 pixels = lane_count();
+  template <class M, class T>
+  static HWY_INLINE Px<M> load(const T* p) {
+    return HWY_NAMESPACE::load<M>(p);
+  }
+  template <class M, class T>
+  static HWY_INLINE void store(const Px<M>& v, T* p) {
+    HWY_NAMESPACE::store<M>(v, p);
+  }
+};
+// Together: whole float pixels as they lie in memory, for formulas that treat the three colours alike. All three
+// colours are that one vector, so that the compiler works them out once; alpha is spread over its pixel's lanes.
+struct Together {
+  static constexpr i32 pixels = lane_count() / 4;
+  template <class M>
+  static HWY_INLINE Px<M> load(const ZR_PixelFloat* p) {
+    const Floats v = hn::LoadU(Tag<f32>(), reinterpret_cast<const f32*>(p));
+    return {hn::Broadcast<0>(v.v), v, v, v};
+  }
+  template <class M>
+  static HWY_INLINE void store(const Px<M>& v, ZR_PixelFloat* p) {
+    const Ints place = hn::Iota(Tag<i32>(), 0);
+    const Bools<f32> first = {hn::RebindMask(Tag<f32>(), (masked(place, 3) == 0).mask)};
+    hn::StoreU(pick(first, v.alpha, v.red).v, Tag<f32>(), reinterpret_cast<f32*>(p));
+  }
+};
+template <class T>
+using AlikePack = std::conditional_t<std::is_same_v<T, ZR_PixelFloat>, Together, Apart>;
+
+// Whether no alpha is above white, of depths where one may be.
+template <class M>
+HWY_INLINE bool legal_alpha(typename M::Wide a) {
+  if constexpr (std::is_same_v<typename M::Wide, Ints>)
+    return none(a > M::white);
+  else
+    return true;
+}
+// Whether no channel is above white; of 8 bits and floats none is.
+template <class M>
+HWY_INLINE bool legal(const Px<M>& p) {
+  if constexpr (M::white == 32768) {
+    const auto most = hn::Max(hn::Max(p.alpha.v, p.red.v), hn::Max(p.green.v, p.blue.v));
+    return none(Ints(most) > M::white);
+  } else {
+    return true;
+  }
+}
+
+}  // namespace HWY_NAMESPACE
+}  // namespace zr
+HWY_AFTER_NAMESPACE();
+#endif  // ZR_HAS_LANES
+
+#endif
