@@ -1,4 +1,5 @@
-// Whole rows between the three depths. Plain loops over channels, in the shape that compilers vectorise.
+// Whole rows between the three depths. Plain loops over channels, in the shape that compilers vectorise; compiled
+// once for each instruction set.
 #include "world/depth_rows.h"
 
 #include <ZR/depth.h>
@@ -9,8 +10,14 @@
 
 #include "world/dither_state.h"
 
+#undef HWY_TARGET_INCLUDE
+#define HWY_TARGET_INCLUDE "world/depth_rows.cc"
+#include <hwy/foreach_target.h>
+#include <hwy/highway.h>
+
+HWY_BEFORE_NAMESPACE();
 namespace zr {
-namespace {
+namespace HWY_NAMESPACE {
 
 constexpr i32 block_channels = 256;  // dither words drawn together
 
@@ -40,7 +47,7 @@ void each_channel_with_drawn(i32 n, const From* src, To* dst, Draw draw, Rule ru
   for (i32 k = 0; k < left; ++k) out[k] = rule(in[k], drawn[k]);
 }
 
-void narrow_16_dithered(i32 n, const ZR_Pixel16* src, ZR_Pixel8* dst) {
+inline void narrow_16_dithered(i32 n, const ZR_Pixel16* src, ZR_Pixel8* dst) {
   DitherRow dither;
   const auto draw = [&](i32 count, u32* words) { dither.draw(static_cast<std::size_t>(count), words); };
   each_channel_with_drawn<u32>(n, src, dst, draw, [](u16 v, u32 word) { return narrow_16_to_8_dither(v, word); });
@@ -74,14 +81,12 @@ void narrow_scalar(i32 n, const ZR_PixelFloat* src, To* dst) {
   each_channel(n, src, dst, [&](f32 c, i32 k) { return narrow_float<To>(c, floor[k], ceiling[k]); });
 }
 
-bool takes_vector_rule(const ZR_PixelFloat* row) {
+inline bool takes_vector_rule(const ZR_PixelFloat* row) {
   return HB_G_CPU_DataP[2] != 0 && reinterpret_cast<std::uintptr_t>(row) % 16 == 0;
 }
 
-}  // namespace
-
 template <class To, class From>
-void convert_row(i32 n, const From* src, To* dst, bool dither) {
+void convert(i32 n, const From* src, To* dst, bool dither) {
   constexpr bool from8 = std::is_same_v<From, ZR_Pixel8>, from16 = std::is_same_v<From, ZR_Pixel16>;
   constexpr bool to8 = std::is_same_v<To, ZR_Pixel8>, to16 = std::is_same_v<To, ZR_Pixel16>;
   if constexpr (from8 && to16) {
@@ -110,8 +115,38 @@ void convert_row(i32 n, const From* src, To* dst, bool dither) {
 }
 
 template <class To>
-void narrow_row(i32 n, const ZR_PixelFloat* src, To* dst) {
+void narrow(i32 n, const ZR_PixelFloat* src, To* dst) {
   each_channel(n, src, dst, [](f32 c, i32) { return narrow_float_colour<To>(c); });
+}
+
+template void convert(i32, const ZR_Pixel8*, ZR_Pixel16*, bool);
+template void convert(i32, const ZR_Pixel8*, ZR_PixelFloat*, bool);
+template void convert(i32, const ZR_Pixel16*, ZR_Pixel8*, bool);
+template void convert(i32, const ZR_Pixel16*, ZR_PixelFloat*, bool);
+template void convert(i32, const ZR_PixelFloat*, ZR_Pixel8*, bool);
+template void convert(i32, const ZR_PixelFloat*, ZR_Pixel16*, bool);
+template void narrow(i32, const ZR_PixelFloat*, ZR_Pixel8*);
+template void narrow(i32, const ZR_PixelFloat*, ZR_Pixel16*);
+
+}  // namespace HWY_NAMESPACE
+}  // namespace zr
+HWY_AFTER_NAMESPACE();
+
+#if HWY_ONCE
+#include "simd/variant.h"
+
+namespace zr {
+
+template <class To, class From>
+void convert_row(i32 n, const From* src, To* dst, bool dither) {
+  ZR_RETURN_BEST(convert(n, src, dst, dither));
+  HWY_STATIC_DISPATCH(convert)(n, src, dst, dither);
+}
+
+template <class To>
+void narrow_row(i32 n, const ZR_PixelFloat* src, To* dst) {
+  ZR_RETURN_BEST(narrow(n, src, dst));
+  HWY_STATIC_DISPATCH(narrow)(n, src, dst);
 }
 
 template void narrow_row(i32, const ZR_PixelFloat*, ZR_Pixel8*);
@@ -124,3 +159,4 @@ template void convert_row(i32, const ZR_PixelFloat*, ZR_Pixel8*, bool);
 template void convert_row(i32, const ZR_PixelFloat*, ZR_Pixel16*, bool);
 
 }  // namespace zr
+#endif

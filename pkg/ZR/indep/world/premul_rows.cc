@@ -7,6 +7,8 @@
 #include <cstring>
 #include <type_traits>
 
+#include "world/lane_premul_rows.h"
+
 namespace zr {
 namespace {
 
@@ -80,10 +82,8 @@ void by_pixel(const T* in, T* out, Rule rule) {
   }
 }
 
-}  // namespace
-
 template <class T>
-i32 premul_row(i32 n, const T* src, T* dst) {
+i32 single_premul(i32 n, const T* src, T* dst) {
   return in_blocks(n, src, dst, [](const T* in, T* out) {
     if constexpr (std::is_same_v<T, ZR_PixelFloat>)
       by_pixel(in, out, premultiply<T>);
@@ -93,13 +93,39 @@ i32 premul_row(i32 n, const T* src, T* dst) {
 }
 
 template <class T>
-i32 unmul_row(i32 n, const T* src, T* dst) {
+i32 single_unmul(i32 n, const T* src, T* dst) {
   return in_blocks(n, src, dst, [](const T* in, T* out) {
     if constexpr (std::is_same_v<T, ZR_Pixel16>)
       by_channel<T, true>(in, out, unmultiply<T>);
     else
       by_pixel(in, out, unmultiply<T>);
   });
+}
+
+template <class T>
+const PremulRows<T>& best_rows() {
+  const PremulRows<T>* const lanes = lane_premul_rows<T>();
+  return lanes != nullptr ? *lanes : single_premul_rows<T>();
+}
+
+}  // namespace
+
+template <class T>
+const PremulRows<T>& single_premul_rows() {
+  static constexpr PremulRows<T> rows = {&single_premul<T>, &single_unmul<T>};
+  return rows;
+}
+template const PremulRows<ZR_Pixel8>& single_premul_rows();
+template const PremulRows<ZR_Pixel16>& single_premul_rows();
+template const PremulRows<ZR_PixelFloat>& single_premul_rows();
+
+template <class T>
+i32 premul_row(i32 n, const T* src, T* dst) {
+  return best_rows<T>().premul(n, src, dst);
+}
+template <class T>
+i32 unmul_row(i32 n, const T* src, T* dst) {
+  return best_rows<T>().unmul(n, src, dst);
 }
 
 template i32 premul_row(i32, const ZR_Pixel8*, ZR_Pixel8*);
