@@ -1,0 +1,124 @@
+// Vector rows against rows of single numbers, for every instruction set that this processor has: all lengths from
+// 1 to 130, at pages that cannot be read, in place and onto themselves.
+#include <ZR/composite.h>
+
+#include <vector>
+
+#include "composite/ground_rows.h"
+#include "composite/linear_rows.h"
+#include "support/born_library.h"
+#include "support/edge_rows.h"
+#include "support/gamma_tables.h"
+#include "world/depth_rows.h"
+#include "world/premul_rows.h"
+
+namespace {
+
+constexpr i32 longest = 130;
+
+template <class T>
+class LaneRows : public BornLibrary {
+ protected:
+  // Runs body(src, mask, dst) on single numbers and on each instruction set, for all lengths and both edges, and
+  // compares what comes out at dst, pixels of type Out.
+  template <class Out = T, class Body>
+  void compare(const char* what, Body&& body) {
+    for (i32 n = 1; n <= longest; ++n) {
+      const bool at_end = n % 2 == 0;
+      T *const src = src_.at<T>(n, at_end), *const mask = mask_.at<T>(n, !at_end);
+      Out* const dst = dst_.at<Out>(n, at_end);
+      fill_edgy(random_, n, src);
+      fill_edgy(random_, n, mask);
+      std::vector<Out> before(static_cast<std::size_t>(n)), expected;
+      fill_edgy(random_, n, before.data());
+      for (int level = 0; level < 4 && Instructions::has(level); ++level) {
+        std::memcpy(dst, before.data(), before.size() * sizeof(Out));
+        {
+          const Instructions instructions(level);
+          body(n, src, mask, dst);
+        }
+        if (level == 0) expected.assign(dst, dst + n);
+        for (i32 i = 0; level > 0 && i < n; ++i)
+          ASSERT_TRUE(same_pixel(dst[i], expected[static_cast<std::size_t>(i)]))
+              << what << " by " << Instructions::names[level] << ", pixel " << i << " of " << n;
+      }
+    }
+  }
+  EdgeRow src_, mask_, dst_;
+  std::mt19937 random_{77};
+};
+using Depths = testing::Types<ZR_Pixel8, ZR_Pixel16, ZR_PixelFloat>;
+TYPED_TEST_SUITE(LaneRows, Depths);
+
+template <class T>
+zr::Channel<T> part_of_white(f32 part) {
+  return static_cast<zr::Channel<T>>(part * static_cast<f32>(zr::Depth<T>::white));
+}
+
+TYPED_TEST(LaneRows, InnerBlends) {
+  using T = TypeParam;
+  const ZR_LinearBlendingTables gamma = gamma_tables(2.2);
+  for (i32 mode = -3; mode <= 40; ++mode) {
+    if (mode == -1) continue;
+    for (const f32 opacity : {1.0f, 0.37f}) {
+      ZR_BlendingMode<T> record{};
+      record.mode = mode;
+      record.seed = 5;
+      record.opacity = part_of_white<T>(opacity);
+      record.keep_alpha = opacity < 1.0f;
+      const std::string name = "mode " + std::to_string(mode);
+      const auto run = [&]<bool masked, bool linear>(i32 n, const T* src, const T* mask, T* dst) {
+        ZR_InnerBlendingFunc<T> row = nullptr;
+        ASSERT_EQ((ZR_GetInnerBlendingFunc<T, masked, linear>(mode, &row)), 0);
+        ASSERT_EQ(row(n, &record, linear ? &gamma : nullptr, src, masked ? mask : nullptr, dst), 0);
+      };
+      this->compare(name.c_str(), [&](i32 n, T* s, T*, T* d) { run.template operator()<false, false>(n, s, s, d); });
+      this->compare((name + " masked").c_str(),
+                    [&](i32 n, T* s, T* m, T* d) { run.template operator()<true, false>(n, s, m, d); });
+      this->compare((name + " in place").c_str(),
+                    [&](i32 n, T*, T* m, T* d) { run.template operator()<true, false>(n, d, m, d); });
+      this->compare((name + " onto what it reads next").c_str(), [&](i32 n, T*, T*, T* d) {
+        if (n > 3) run.template operator()<false, false>(n - 3, d, d, d + 3);
+      });
+      if constexpr (!std::is_same_v<T, ZR_PixelFloat>)
+        this->compare((name + " in linear light").c_str(),
+                      [&](i32 n, T* s, T* m, T* d) { run.template operator()<true, true>(n, s, m, d); });
+      if (this->HasFatalFailure()) return;
+    }
+  }
+}
+
+TYPED_TEST(LaneRows, GroundsAndAlphas) {
+  using T = TypeParam;
+  struct Row {
+    const char* name;
+    i32 (*row)(i32, const T*, T*);
+  };
+  for (const Row& one : {Row{"premultiply", zr::premul_row<T>}, {"unmultiply", zr::unmul_row<T>},
+                         {"white fade", zr::white_fade_row<T>}, {"white unfade", zr::white_unfade_row<T>},
+                         {"grey fade", zr::grey_fade_row<T>}, {"grey unfade", zr::grey_unfade_row<T>}}) {
+    this->compare(one.name, [&](i32 n, T* s, T*, T* d) { one.row(n, s, d); });
+    this->compare(one.name, [&](i32 n, T*, T*, T* d) { one.row(n, nullptr, d); });
+    this->compare(one.name, [&](i32 n, T*, T*, T* d) { one.row(n - 1, d, d + 1); });
+  }
+  for (const f32 opacity : {1.0f, 0.6f, 0.0f}) {
+    const auto factor = part_of_white<T>(opacity);
+    this->compare("union", [&](i32 n, T* s, T*, T* d) { zr::union_alpha_row<T>(n, s, factor, nullptr, d); });
+    this->compare("masked union", [&](i32 n, T* s, T* m, T* d) { zr::union_alpha_row<T>(n, s, factor, m, d); });
+  }
+}
+
+TYPED_TEST(LaneRows, Depths) {
+  using T = TypeParam;
+  const auto to = [&]<class Out>() {
+    if constexpr (!std::is_same_v<T, Out>) {
+      this->template compare<Out>("conversion", [](i32 n, T* s, T*, Out* d) { zr::convert_row(n, s, d, false); });
+    }
+  };
+  // The vector rule of floats is a rule of its own, not a variant.
+  if constexpr (!std::is_same_v<T, ZR_PixelFloat>) to.template operator()<ZR_Pixel8>();
+  to.template operator()<ZR_Pixel16>();
+  to.template operator()<ZR_PixelFloat>();
+}
+
+}  // namespace
