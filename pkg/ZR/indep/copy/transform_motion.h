@@ -319,7 +319,7 @@ class ComplexMotionRow final : public RowSampler<T> {
     SourceWalk walk;
     bool regular;
   };
-  SampleFunctions<T> samplers_;
+  RowFunctions<T> samplers_;
   i32 count_, matrices_;
   Workspace workspace_;
   MotionSum<T>* sums_ = nullptr;

@@ -12,10 +12,6 @@
 
 namespace zr {
 
-// Wide enough for any row: 0 means wholly transparent, count times white wholly opaque.
-template <class T>
-using RowSum = std::conditional_t<std::is_same_v<T, ZR_PixelFloat>, f64, u64>;
-
 // One kind of sampling, chosen once for a call. Called once for each row.
 template <class T>
 class RowSampler {
@@ -83,10 +79,18 @@ class DraftRow final : public RowSampler<T> {
 // A box wider than a pixel on either axis is averaged rather than sampled at a point.
 inline bool takes_area(const ZR_SampPB& params) { return params.x_radius > 32768 || params.y_radius > 32768; }
 
+// The samplers of a quality, and what runs in place of them along rows.
+template <class T>
+struct RowFunctions : SampleFunctions<T> {
+  LaneRowFunc<T>* inner;  // may be null
+
+  explicit RowFunctions(const SampleFunctions<T>& set) : SampleFunctions<T>(set), inner(no_clip_row(set)) {}
+};
+
 // One row by the samplers of a quality.
 template <class T>
-i32 sample_best_row(const SampleFunctions<T>& samplers, const ZR_SampPB& params, const SourceWalk& walk, i32 count,
-                    T* row, RowSum<T>* sum) {
+i32 sample_best_row(const RowFunctions<T>& samplers, const ZR_SampPB& params, const SourceWalk& walk, i32 count, T* row,
+                    RowSum<T>* sum) {
   i32 error = ZR_Err_None;
   RowSum<T> total = 0;
   const auto x_at = [&](i32 i) { return wrap_add(walk.x, wrap_mul(i, walk.step_x)); };
@@ -117,6 +121,9 @@ i32 sample_best_row(const SampleFunctions<T>& samplers, const ZR_SampPB& params,
       note(samplers.span(nullptr, end - first, x_at(first), walk.y, &params, &span_sum, row + first), &error);
       total += span_sum;
     } else {
+      if (samplers.inner != nullptr && first < end)
+        first += samplers.inner({end - first, x_at(first), y_at(first), walk.step_x, walk.step_y}, params, &total,
+                                row + first);
       each(samplers.no_clipping, first, end);
     }
   }
@@ -137,7 +144,7 @@ class BestRow final : public RowSampler<T> {
   void next_row() override { walk_.next_row(); }
 
  private:
-  SampleFunctions<T> samplers_;
+  RowFunctions<T> samplers_;
   ZR_SampPB params_;
   SourceWalk walk_;
   i32 count_;

@@ -48,6 +48,23 @@ SampleFunctions<ZR_PixelFloat> sample_functions<ZR_PixelFloat>(i32 quality) {
           &ZR_SubpixelSampleTranslateNoClipBilinearFloat, &ZR_SubpixelSpanSampleBilinearFloat};
 }
 
+template <class T>
+LaneRowFunc<T>* no_clip_row(const SampleFunctions<T>& samplers) {
+  static constexpr SampleFunc<T>* bilinear = [] {
+    if constexpr (std::is_same_v<T, ZR_Pixel8>)
+      return &ZR_SubpixelSampleNoClip_Straight;
+    else if constexpr (std::is_same_v<T, ZR_Pixel16>)
+      return &ZR_SubpixelSampleNoClip_Straight16;
+    else
+      return &ZR_SubpixelNoClipBilinearFloat;
+  }();
+  const LaneRows<T>* const rows = samplers.no_clipping == bilinear ? lane_bilinear_rows<T>() : nullptr;
+  return rows != nullptr ? rows->no_clip : nullptr;
+}
+template LaneRowFunc<ZR_Pixel8>* no_clip_row(const SampleFunctions<ZR_Pixel8>&);
+template LaneRowFunc<ZR_Pixel16>* no_clip_row(const SampleFunctions<ZR_Pixel16>&);
+template LaneRowFunc<ZR_PixelFloat>* no_clip_row(const SampleFunctions<ZR_PixelFloat>&);
+
 namespace {
 
 template <class T>

@@ -3,6 +3,7 @@
 #pragma once
 
 #include "sample/ZR_Samp.h"
+#include "sample/lane_rows.h"
 #include "sample/lanes.h"
 #include "world/slot_table.h"
 
@@ -144,11 +145,13 @@ inline i32 bilinear_no_clip(i32 x, i32 y, const BilinearWeights<typename Bilinea
 template <class T>
 inline i32 bilinear_span(i32 count, i32 x, i32 y, const ZR_SampPB* params, AlphaSum<T>* sum_alpha, T* dst) {
   if (count < 1) return ZR_Err_None;
+  const LaneRows<T>* const lanes = lane_bilinear_rows<T>();
+  const i32 done = lanes != nullptr ? lanes->span({count, x, y, 0x10000, 0}, *params, sum_alpha, dst) : 0;
   const Position at(x, y);
   const BilinearWeights<typename Bilinear<T>::Real> weights(at);
-  NoClip::Block<T, 2> block(*params->src, at.x, at.y);
+  NoClip::Block<T, 2> block(*params->src, at.x + done, at.y);
   AlphaSum<T> sum = *sum_alpha;
-  for (i32 i = 0; i < count; ++i, block.slide()) {
+  for (i32 i = done; i < count; ++i, block.slide()) {
     const T mixed = Bilinear<T>::mix(block.rows, weights);
     dst[i] = mixed;
     sum += mixed.alpha;

@@ -1,6 +1,7 @@
 // The six samplers of a depth and quality, with their types.
 #pragma once
 
+#include "sample/lane_rows.h"
 #include "world/slot_table.h"
 
 namespace zr {
@@ -24,6 +25,11 @@ template <>
 SampleFunctions<ZR_Pixel16> sample_functions<ZR_Pixel16>(i32 quality);
 template <>
 SampleFunctions<ZR_PixelFloat> sample_functions<ZR_PixelFloat>(i32 quality);
+
+// What samples vectors of pixels just as the set's sampler without clipping does, or null: where that sampler is not
+// the library's own, and where the processor has no lanes. Fetched as the set is.
+template <class T>
+LaneRowFunc<T>* no_clip_row(const SampleFunctions<T>& samplers);
 
 // The box mean with bilinear (1) or bicubic (2) point samples where the box is thin.
 template <class T, i32 quality>

@@ -1,0 +1,141 @@
+// Bilinear samples of straight pixels along a row, on lanes.
+#include "sample/lane_rows.h"
+
+#undef HWY_TARGET_INCLUDE
+#define HWY_TARGET_INCLUDE "sample/lane_bilinear.cc"
+#include <hwy/foreach_target.h>
+
+#include "simd/lanes-inl.h"
+#if ZR_HAS_LANES
+#include "sample/lane_samples-inl.h"
+
+HWY_BEFORE_NAMESPACE();
+namespace zr {
+namespace HWY_NAMESPACE {
+
+template <class Real>
+struct LaneWeights {
+  Real w[4];
+
+  HWY_INLINE LaneWeights(Ints fraction_x, Ints fraction_y) {
+    const Real unit(0x1p-16f), fx = to_real<Real>(fraction_x) * unit, fy = to_real<Real>(fraction_y) * unit;
+    w[3] = fx * fy;
+    w[1] = fx - w[3];
+    w[2] = fy - w[3];
+    w[0] = Real(1.0f) - w[1] - w[2] - w[3];
+  }
+};
+
+template <int k, class Real, class T>
+HWY_INLINE Real in_pairs(const Real (&w)[4], const Raw<T> (&p)[4]) {
+  return (w[0] * real_channel_of<Real, k>(p[0]) + w[1] * real_channel_of<Real, k>(p[1])) +
+         (w[2] * real_channel_of<Real, k>(p[2]) + w[3] * real_channel_of<Real, k>(p[3]));
+}
+template <int k, class T>
+HWY_INLINE Floats in_order(const Floats (&w)[4], const Raw<T> (&p)[4]) {
+  return ((w[0] * real_channel_of<Floats, k>(p[0]) + w[1] * real_channel_of<Floats, k>(p[1])) +
+          w[2] * real_channel_of<Floats, k>(p[2])) +
+         w[3] * real_channel_of<Floats, k>(p[3]);
+}
+
+// Weights are within a rounding of 0..1, so that all results fit their channels. `takes_first`: lanes that copy the
+// upper left neighbour whatever it holds.
+template <class T, class Real>
+HWY_INLINE Raw<T> integer_mix(const Raw<T> (&p)[4], const LaneWeights<Real>& weights, Bools<i32> takes_first) {
+  const auto difference = [&](i32 i) HWY_ATTR {
+    return ((p[0].w[i] ^ p[1].w[i]) | (p[0].w[i] ^ p[2].w[i])) | (p[0].w[i] ^ p[3].w[i]);
+  };
+  const Ints first = difference(0);
+  Ints any = first;
+  for (i32 i = 1; i < Raw<T>::words; ++i) any = any | difference(i);
+  const Bools<i32> same = takes_first || any == 0;
+  if (all(same)) return p[0];
+  const Bools<i32> equal = masked(first, std::numeric_limits<Channel<T>>::max()) == 0;
+  const Real half(0.5f);
+  const Ints alpha = channel_of<0>(p[0]);
+  if (all(equal)) {
+    const auto colour = [&](Real c) HWY_ATTR { return fitting_int(c + half); };
+    const Raw<T> mixed = packed<T>(alpha, colour(in_pairs<1>(weights.w, p)), colour(in_pairs<2>(weights.w, p)),
+                                   colour(in_pairs<3>(weights.w, p)));
+    return pick(same, p[0], pick(alpha == 0, Raw<T>{}, mixed));
+  }
+  // Lanes of equal alphas are weighted by 1 in its place.
+  Real a[4];
+  for (i32 i = 0; i < 4; ++i) a[i] = weights.w[i] * to_real<Real>(pick(equal, 1, channel_of<0>(p[i])));
+  const Real sum = (a[0] + a[1]) + (a[2] + a[3]);
+  const Bools<i32> clear = pick(equal, alpha, fitting_int(sum + sum)) == 0;
+  const Real inverse = pick_real(equal, Real(1.0f), Real(1.0f) / sum);
+  const auto colour = [&](Real c) HWY_ATTR { return fitting_int(inverse * c + half); };
+  const Raw<T> mixed = packed<T>(pick(equal, alpha, fitting_int(sum + half)), colour(in_pairs<1>(a, p)),
+                                 colour(in_pairs<2>(a, p)), colour(in_pairs<3>(a, p)));
+  return pick(same, p[0], pick(clear, Raw<T>{}, mixed));
+}
+
+HWY_INLINE Raw<ZR_PixelFloat> float_mix(const Raw<ZR_PixelFloat> (&p)[4], const LaneWeights<Floats>& weights) {
+  Floats alpha[4];
+  for (i32 i = 0; i < 4; ++i) alpha[i] = as_floats(p[i].w[0]);
+  const Bools<f32> equal = (alpha[0] == alpha[1] && alpha[0] == alpha[2]) && alpha[0] == alpha[3];
+  if (all(equal))
+    return {{p[0].w[0], as_ints(in_order<1>(weights.w, p)), as_ints(in_order<2>(weights.w, p)),
+             as_ints(in_order<3>(weights.w, p))}};
+  Floats a[4];
+  for (i32 i = 0; i < 4; ++i) a[i] = weights.w[i] * pick(equal, 1.0f, alpha[i]);
+  const Floats sum = ((a[0] + a[1]) + a[2]) + a[3];
+  const Bools<f32> clear = !equal && sum == 0.0f;
+  const Floats limited = pick(equal || sum > 1.0f, 1.0f, sum), inverse = 1.0f / limited;
+  const auto colour = [&](Floats c) HWY_ATTR { return as_ints(pick(clear, 0.0f, inverse * c)); };
+  return {{as_ints(pick(clear, 0.0f, pick(equal, alpha[0], limited))), colour(in_order<1>(a, p)),
+           colour(in_order<2>(a, p)), colour(in_order<3>(a, p))}};
+}
+
+template <class T, class Neighbours, class Sum>
+i32 bilinear_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, T* dst) {
+  using Real = std::conditional_t<std::is_same_v<T, ZR_Pixel16>, Doubles, Floats>;
+  using Weights = LaneWeights<Real>;
+  const Weights phase(run.x & 0xffff, run.y & 0xffff);
+  return sample_vectors<T, Neighbours>(run, *params.src, sum, dst, [&](const Neighbours& at) HWY_ATTR {
+    Raw<T> upper[2], lower[2];
+    at.row(0, 0, upper);
+    at.row(0, 1, lower);
+    const Raw<T> p[4] = {upper[0], upper[1], lower[0], lower[1]};
+    const Weights weights = Neighbours::one_phase ? phase : Weights(at.fraction_x(), at.fraction_y());
+    if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
+      return float_mix(p, weights);
+    } else {
+      const Bools<i32> whole = Neighbours::one_phase ? Ints(0) != Ints(0) : (at.fraction_x() | at.fraction_y()) == 0;
+      return integer_mix<T>(p, weights, whole);
+    }
+  });
+}
+
+template <class T>
+const LaneRows<T>* bilinear_rows() {
+  static constexpr LaneRows<T> rows = {&bilinear_vectors<T, Scattered<T>, RowSum<T>>,
+                                       &bilinear_vectors<T, Adjacent<T>, AlphaSum<T>>};
+  return &rows;
+}
+template const LaneRows<ZR_Pixel8>* bilinear_rows<ZR_Pixel8>();
+template const LaneRows<ZR_Pixel16>* bilinear_rows<ZR_Pixel16>();
+template const LaneRows<ZR_PixelFloat>* bilinear_rows<ZR_PixelFloat>();
+
+}  // namespace HWY_NAMESPACE
+}  // namespace zr
+HWY_AFTER_NAMESPACE();
+#endif
+
+#if HWY_ONCE
+#include "simd/variant.h"
+
+namespace zr {
+
+template <class T>
+const LaneRows<T>* lane_bilinear_rows() {
+  ZR_RETURN_BEST(bilinear_rows<T>());
+  return nullptr;
+}
+template const LaneRows<ZR_Pixel8>* lane_bilinear_rows<ZR_Pixel8>();
+template const LaneRows<ZR_Pixel16>* lane_bilinear_rows<ZR_Pixel16>();
+template const LaneRows<ZR_PixelFloat>* lane_bilinear_rows<ZR_PixelFloat>();
+
+}  // namespace zr
+#endif

@@ -1,0 +1,329 @@
+// What samplers of lanes share: neighbours of a vector of positions, double precision, and the walk along a row.
+#if defined(ZR_SAMPLE_LANE_SAMPLES_INL_H) == defined(HWY_TARGET_TOGGLE)
+#ifdef ZR_SAMPLE_LANE_SAMPLES_INL_H
+#undef ZR_SAMPLE_LANE_SAMPLES_INL_H
+#else
+#define ZR_SAMPLE_LANE_SAMPLES_INL_H
+#endif
+
+#include "sample/lane_rows.h"
+#include "simd/lane_depth-inl.h"
+
+HWY_BEFORE_NAMESPACE();
+namespace zr {
+namespace HWY_NAMESPACE {
+
+// ---------------------------------------------------------------------------- double precision
+
+// As many doubles as there are lanes, in two vectors.
+struct Doubles {
+  using V = hn::Vec<Tag<f64>>;
+  V low, high;
+
+  Doubles() = default;
+  HWY_INLINE Doubles(V l, V h) : low(l), high(h) {}
+  HWY_INLINE Doubles(f64 number) : low(hn::Set(Tag<f64>(), number)), high(low) {}  // NOLINT: numbers mix with lanes
+  friend HWY_INLINE Doubles operator+(Doubles a, Doubles b) { return {hn::Add(a.low, b.low), hn::Add(a.high, b.high)}; }
+  friend HWY_INLINE Doubles operator-(Doubles a, Doubles b) { return {hn::Sub(a.low, b.low), hn::Sub(a.high, b.high)}; }
+  friend HWY_INLINE Doubles operator*(Doubles a, Doubles b) { return {hn::Mul(a.low, b.low), hn::Mul(a.high, b.high)}; }
+  friend HWY_INLINE Doubles operator/(Doubles a, Doubles b) { return {hn::Div(a.low, b.low), hn::Div(a.high, b.high)}; }
+};
+using HalfInts = hn::Rebind<i32, Tag<f64>>;
+using HalfFloats = hn::Rebind<f32, Tag<f64>>;
+
+HWY_INLINE Doubles to_double(Ints v) {
+  const Tag<f64> d;
+  const HalfInts half;
+  return {hn::PromoteTo(d, hn::LowerHalf(half, v.v)), hn::PromoteTo(d, hn::UpperHalf(half, v.v))};
+}
+HWY_INLINE Floats narrowed(Doubles v) {
+  const HalfFloats half;
+  return hn::Combine(Tag<f32>(), hn::DemoteTo(half, v.high), hn::DemoteTo(half, v.low));
+}
+// Toward zero; the argument fits.
+HWY_INLINE Ints fitting_int(Doubles v) {
+  const HalfInts half;
+  return hn::Combine(Tag<i32>(), hn::DemoteTo(half, v.high), hn::DemoteTo(half, v.low));
+}
+
+template <class Real>
+HWY_INLINE Real to_real(Ints v) {
+  if constexpr (std::is_same_v<Real, Floats>)
+    return to_float(v);
+  else
+    return to_double(v);
+}
+HWY_INLINE Floats pick_real(Bools<i32> c, Floats a, Floats b) {
+  return pick(Bools<f32>{hn::RebindMask(Tag<f32>(), c.mask)}, a, b);
+}
+HWY_INLINE Doubles pick_real(Bools<i32> c, Doubles a, Doubles b) {
+  const hn::Rebind<i64, Tag<f64>> d;
+  const HalfInts half;
+  const auto bits = hn::VecFromMask(Tag<i32>(), c.mask);
+  const auto mask = [&](auto v) HWY_ATTR {
+    return hn::RebindMask(Tag<f64>(), hn::MaskFromVec(hn::PromoteTo(d, v)));
+  };
+  return {hn::IfThenElse(mask(hn::LowerHalf(half, bits)), a.low, b.low),
+          hn::IfThenElse(mask(hn::UpperHalf(half, bits)), a.high, b.high)};
+}
+
+// ---------------------------------------------------------------------------------- raw pixels
+
+// A vector of pixels as the 32-bit words they are made of.
+template <class T>
+struct Raw {
+  static constexpr i32 words = sizeof(T) / 4;
+  Ints w[words];
+};
+HWY_INLINE Floats as_floats(Ints v) { return hn::BitCast(Tag<f32>(), v.v); }
+HWY_INLINE Ints as_ints(Floats v) { return hn::BitCast(Tag<i32>(), v.v); }
+HWY_INLINE Ints operator|(Ints a, Ints b) { return hn::Or(a.v, b.v); }
+HWY_INLINE Ints operator^(Ints a, Ints b) { return hn::Xor(a.v, b.v); }
+
+template <int bits>
+HWY_INLINE Ints shifted_right_unsigned(Ints a) {
+  const hn::Rebind<u32, Tag<i32>> d;
+  return hn::BitCast(Tag<i32>(), hn::ShiftRight<bits>(hn::BitCast(d, a.v)));
+}
+// Channel k of integer pixels.
+template <int k>
+HWY_INLINE Ints channel_of(const Raw<ZR_Pixel8>& p) {
+  if constexpr (k == 3)
+    return shifted_right_unsigned<24>(p.w[0]);
+  else if constexpr (k == 0)
+    return masked(p.w[0], 255);
+  else
+    return masked(shifted_right<8 * k>(p.w[0]), 255);
+}
+template <int k>
+HWY_INLINE Ints channel_of(const Raw<ZR_Pixel16>& p) {
+  if constexpr ((k & 1) != 0)
+    return shifted_right_unsigned<16>(p.w[k / 2]);
+  else
+    return masked(p.w[k / 2], 65535);
+}
+template <class Real, int k, class T>
+HWY_INLINE Real real_channel_of(const Raw<T>& p) {
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+    return as_floats(p.w[k]);
+  else
+    return to_real<Real>(channel_of<k>(p));
+}
+// Channels within their range.
+template <class T>
+HWY_INLINE Raw<T> packed(Ints alpha, Ints red, Ints green, Ints blue) {
+  if constexpr (std::is_same_v<T, ZR_Pixel8>)
+    return {{(alpha | shifted_left<8>(red)) | (shifted_left<16>(green) | shifted_left<24>(blue))}};
+  else
+    return {{alpha | shifted_left<16>(red), green | shifted_left<16>(blue)}};
+}
+template <class T>
+HWY_INLINE Raw<T> pick(Bools<i32> c, const Raw<T>& a, const Raw<T>& b) {
+  Raw<T> r;
+  for (i32 i = 0; i < Raw<T>::words; ++i) r.w[i] = pick(c, a.w[i], b.w[i]);
+  return r;
+}
+
+HWY_INLINE void store(const Raw<ZR_Pixel8>& p, ZR_Pixel8* dst) {
+  hn::StoreU(p.w[0].v, Tag<i32>(), reinterpret_cast<i32*>(dst));
+}
+HWY_INLINE void store(const Raw<ZR_Pixel16>& p, ZR_Pixel16* dst) {
+  hn::StoreInterleaved2(p.w[0].v, p.w[1].v, Tag<i32>(), reinterpret_cast<i32*>(dst));
+}
+HWY_INLINE void store(const Raw<ZR_PixelFloat>& p, ZR_PixelFloat* dst) {
+  hn::StoreInterleaved4(p.w[0].v, p.w[1].v, p.w[2].v, p.w[3].v, Tag<i32>(), reinterpret_cast<i32*>(dst));
+}
+
+// ---------------------------------------------------------------------------------- neighbours
+
+// 16 bytes for each lane: block b of the result is that of lane 4 * b.
+template <class D>
+HWY_INLINE hn::Vec<D> load_blocks(D d, const char* base, const i64* offsets) {
+  if constexpr (hn::MaxLanes(D()) == 4) {
+    return hn::LoadU(d, reinterpret_cast<const i32*>(base + *offsets));
+  } else {
+    const hn::Half<D> half;
+    return hn::Combine(d, load_blocks(half, base, offsets + hn::MaxLanes(half)), load_blocks(half, base, offsets));
+  }
+}
+// The four words of 16 bytes at base + offsets[i] for each lane i.
+HWY_INLINE void gather_blocks(const char* base, const i64* offsets, Ints (&words)[4]) {
+  const Tag<i32> d;
+  const auto v0 = load_blocks(d, base, offsets), v1 = load_blocks(d, base, offsets + 1);
+  const auto v2 = load_blocks(d, base, offsets + 2), v3 = load_blocks(d, base, offsets + 3);
+  const auto even_low = hn::InterleaveLower(d, v0, v2), odd_low = hn::InterleaveLower(d, v1, v3);
+  const auto even_high = hn::InterleaveUpper(d, v0, v2), odd_high = hn::InterleaveUpper(d, v1, v3);
+  words[0] = hn::InterleaveLower(d, even_low, odd_low);
+  words[1] = hn::InterleaveUpper(d, even_low, odd_low);
+  words[2] = hn::InterleaveLower(d, even_high, odd_high);
+  words[3] = hn::InterleaveUpper(d, even_high, odd_high);
+}
+
+// Positions of a vector of pixels anywhere in the source.
+template <class T>
+class Scattered {
+ public:
+  static constexpr bool one_phase = false;
+
+  HWY_INLINE Scattered(const SampleRun& run, const ZR_LayerDef& src)
+      : data_(static_cast<const char*>(src.data)),
+        row_bytes_(src.row_bytes),
+        step_x_(run.step_x),
+        step_y_(run.step_y) {
+    const Ints place = hn::Iota(Tag<i32>(), 0);
+    x_ = Ints(run.x) + place * step_x_;
+    y_ = Ints(run.y) + place * step_y_;
+    locate();
+  }
+  HWY_INLINE void next() {
+    x_ = x_ + Ints(wrap_mul(step_x_, lane_count()));
+    y_ = y_ + Ints(wrap_mul(step_y_, lane_count()));
+    locate();
+  }
+  HWY_INLINE Ints fraction_x() const { return masked(x_, 65535); }
+  HWY_INLINE Ints fraction_y() const { return masked(y_, 65535); }
+
+  // `count` pixels of each position's row `dy`, from its column `dx` on.
+  template <i32 count>
+  HWY_INLINE void row(i32 dx, i32 dy, Raw<T> (&p)[count]) const {
+    constexpr i32 words = Raw<T>::words;
+    const char* const base =
+        data_ + static_cast<std::ptrdiff_t>(dy) * row_bytes_ + static_cast<std::ptrdiff_t>(dx) * i32{sizeof(T)};
+    if constexpr (count * words == 2) {
+      const hn::Rebind<i64, Tag<f64>> d;
+      const Tag<i32> di;
+      const i64* const pairs = reinterpret_cast<const i64*>(base);
+      const auto low = hn::BitCast(di, hn::GatherOffset(d, pairs, low_));
+      const auto high = hn::BitCast(di, hn::GatherOffset(d, pairs, high_));
+      p[0].w[0] = hn::ConcatEven(di, high, low);
+      p[1].w[0] = hn::ConcatOdd(di, high, low);
+    } else {
+      for (i32 i = 0; i < count; i += 4 / words) {
+        Ints block[4];
+        gather_blocks(base + i * i32{sizeof(T)}, offsets_, block);
+        for (i32 k = 0; k < 4; ++k) p[i + k / words].w[k % words] = block[k];
+      }
+    }
+  }
+
+ private:
+  using Offsets = hn::Rebind<i64, Tag<f64>>;
+
+  // Where each pixel lies from the first of the world, in bytes.
+  HWY_INLINE void locate() {
+    const HalfInts half;
+    const Ints x = shifted_right<16>(x_), y = shifted_right<16>(y_);
+    const auto offset = [&](auto column, auto row) HWY_ATTR {
+      const Offsets d;
+      const auto rows = hn::MulEven(hn::BitCast(Tag<i32>(), hn::PromoteTo(d, row)), Ints(row_bytes_).v);
+      return hn::Add(rows, hn::ShiftLeft<sizeof(T) == 4 ? 2 : sizeof(T) == 8 ? 3 : 4>(hn::PromoteTo(d, column)));
+    };
+    low_ = offset(hn::LowerHalf(half, x.v), hn::LowerHalf(half, y.v));
+    high_ = offset(hn::UpperHalf(half, x.v), hn::UpperHalf(half, y.v));
+    hn::Store(low_, Offsets(), offsets_);
+    hn::Store(high_, Offsets(), offsets_ + lane_count() / 2);
+  }
+
+  Ints x_, y_;
+  hn::Vec<Offsets> low_, high_;
+  alignas(64) i64 offsets_[lane_count()];
+  const char* data_;
+  i32 row_bytes_, step_x_, step_y_;
+};
+
+// Positions one pixel apart in a row: neighbours lie side by side.
+template <class T>
+class Adjacent {
+ public:
+  static constexpr bool one_phase = true;
+
+  HWY_INLINE Adjacent(const SampleRun& run, const ZR_LayerDef& src)
+      : at_(static_cast<const char*>(src.data) + static_cast<std::ptrdiff_t>(run.y >> 16) * src.row_bytes +
+            static_cast<std::ptrdiff_t>(run.x >> 16) * i32{sizeof(T)}),
+        row_bytes_(src.row_bytes),
+        x_(run.x),
+        y_(run.y) {}
+  HWY_INLINE void next() { at_ += lane_count() * i32{sizeof(T)}; }
+  HWY_INLINE Ints fraction_x() const { return x_ & 0xffff; }
+  HWY_INLINE Ints fraction_y() const { return y_ & 0xffff; }
+
+  template <i32 count>
+  HWY_INLINE void row(i32 dx, i32 dy, Raw<T> (&p)[count]) const {
+    const i32* const first = reinterpret_cast<const i32*>(at_ + static_cast<std::ptrdiff_t>(dy) * row_bytes_ +
+                                                          static_cast<std::ptrdiff_t>(dx) * i32{sizeof(T)});
+    const Tag<i32> d;
+    for (i32 i = 0; i < count; ++i) {
+      Ints(&w)[Raw<T>::words] = p[i].w;
+      const i32* const from = first + i * Raw<T>::words;
+      if constexpr (Raw<T>::words == 1)
+        w[0] = hn::LoadU(d, from);
+      else if constexpr (Raw<T>::words == 2)
+        hn::LoadInterleaved2(d, from, w[0].v, w[1].v);
+      else
+        hn::LoadInterleaved4(d, from, w[0].v, w[1].v, w[2].v, w[3].v);
+    }
+  }
+
+ private:
+  const char* at_;
+  i32 row_bytes_, x_, y_;
+};
+
+// ---------------------------------------------------------------------------------------- rows
+
+// Alphas of vectors of pixels. Those of floats are added one by one: the order is part of the sum.
+template <class T, class Sum>
+class AlphaSums {
+ public:
+  explicit HWY_INLINE AlphaSums(Sum* total) : total_(total), lanes_(0) {}
+  HWY_INLINE void add(const Raw<T>& p, const T* stored) {
+    if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
+      for (i32 i = 0; i < lane_count(); ++i) *total_ += stored[i].alpha;
+    } else {
+      lanes_ = lanes_ + channel_of<0>(p);
+      if (++vectors_ == 32768) flush();  // more would not fit
+    }
+  }
+  HWY_INLINE void flush() {
+    if constexpr (!std::is_same_v<T, ZR_PixelFloat>) {
+      *total_ += static_cast<Sum>(static_cast<u64>(hn::GetLane(hn::SumOfLanes(Tag<i64>(), pairs()))));
+      lanes_ = 0, vectors_ = 0;
+    }
+  }
+
+ private:
+  HWY_INLINE hn::Vec<Tag<i64>> pairs() const {
+    const HalfInts half;
+    const Tag<i64> d;
+    return hn::Add(hn::PromoteTo(d, hn::LowerHalf(half, lanes_.v)), hn::PromoteTo(d, hn::UpperHalf(half, lanes_.v)));
+  }
+  Sum* total_;
+  Ints lanes_;
+  i32 vectors_ = 0;
+};
+
+// The whole vectors of a run: mix(neighbours) gives the pixels of one. Returns how many pixels that are.
+template <class T, class Neighbours, class Sum, class Mix>
+HWY_INLINE i32 sample_vectors(const SampleRun& run, const ZR_LayerDef& src, Sum* sum, T* dst, Mix mix) {
+  constexpr i32 lanes = lane_count();
+  if (run.count < lanes) return 0;
+  Neighbours at(run, src);
+  AlphaSums<T, Sum> sums(sum);
+  i32 i = 0;
+  for (;;) {
+    const Raw<T> p = mix(at);
+    store(p, dst + i);
+    sums.add(p, dst + i);
+    i += lanes;
+    if (run.count - i < lanes) break;
+    at.next();
+  }
+  sums.flush();
+  return i;
+}
+
+}  // namespace HWY_NAMESPACE
+}  // namespace zr
+HWY_AFTER_NAMESPACE();
+
+#endif
