@@ -48,17 +48,34 @@ SampleFunctions<ZR_PixelFloat> sample_functions<ZR_PixelFloat>(i32 quality) {
           &ZR_SubpixelSampleTranslateNoClipBilinearFloat, &ZR_SubpixelSpanSampleBilinearFloat};
 }
 
+namespace {
+
+// The library's own samplers of a depth that read without clipping.
+template <class T>
+struct Own;
+template <>
+struct Own<ZR_Pixel8> {
+  static constexpr SampleFunc<ZR_Pixel8>*bilinear = &ZR_SubpixelSampleNoClip_Straight,
+                   *bicubic = &ZR_SubpixelNoClipBicubic8;
+};
+template <>
+struct Own<ZR_Pixel16> {
+  static constexpr SampleFunc<ZR_Pixel16>*bilinear = &ZR_SubpixelSampleNoClip_Straight16,
+                   *bicubic = &ZR_SubpixelNoClipBicubic16;
+};
+template <>
+struct Own<ZR_PixelFloat> {
+  static constexpr SampleFunc<ZR_PixelFloat>*bilinear = &ZR_SubpixelNoClipBilinearFloat,
+                   *bicubic = &ZR_SubpixelNoClipBicubicFloat;
+};
+
+}  // namespace
+
 template <class T>
 LaneRowFunc<T>* no_clip_row(const SampleFunctions<T>& samplers) {
-  static constexpr SampleFunc<T>* bilinear = [] {
-    if constexpr (std::is_same_v<T, ZR_Pixel8>)
-      return &ZR_SubpixelSampleNoClip_Straight;
-    else if constexpr (std::is_same_v<T, ZR_Pixel16>)
-      return &ZR_SubpixelSampleNoClip_Straight16;
-    else
-      return &ZR_SubpixelNoClipBilinearFloat;
-  }();
-  const LaneRows<T>* const rows = samplers.no_clipping == bilinear ? lane_bilinear_rows<T>() : nullptr;
+  const LaneRows<T>* rows = nullptr;
+  if (samplers.no_clipping == Own<T>::bilinear) rows = lane_bilinear_rows<T>();
+  if (samplers.no_clipping == Own<T>::bicubic) rows = lane_bicubic_rows<T>();
   return rows != nullptr ? rows->no_clip : nullptr;
 }
 template LaneRowFunc<ZR_Pixel8>* no_clip_row(const SampleFunctions<ZR_Pixel8>&);

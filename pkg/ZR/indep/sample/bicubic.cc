@@ -102,11 +102,13 @@ i32 bicubic_all_in(i32 x, i32 y, const ZR_SampPB* params, u8* all_in, T* dst) {
 template <class T>
 i32 bicubic_span(i32 count, i32 x, i32 y, const ZR_SampPB* params, zr::AlphaSum<T>* sum_alpha, T* dst) {
   if (count < 1) return ZR_Err_None;
+  const zr::LaneRows<T>* const lanes = zr::lane_bicubic_rows<T>();
+  const i32 done = lanes != nullptr ? lanes->span({count, x, y, 0x10000, 0}, *params, sum_alpha, dst) : 0;
   const Position at(x, y);
   const CubicWeights across(at.fraction_x), down(at.fraction_y);
-  NoClip::Block<T, 4> block(*params->src, at.x - 1, at.y - 1);
+  NoClip::Block<T, 4> block(*params->src, at.x - 1 + done, at.y - 1);
   zr::AlphaSum<T> sum = *sum_alpha;
-  for (i32 i = 0; i < count; ++i, block.slide()) {
+  for (i32 i = done; i < count; ++i, block.slide()) {
     const T mixed = mix(block.rows, across, down);
     dst[i] = mixed;
     sum += mixed.alpha;

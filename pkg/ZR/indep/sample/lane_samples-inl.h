@@ -60,9 +60,7 @@ HWY_INLINE Doubles pick_real(Bools<i32> c, Doubles a, Doubles b) {
   const hn::Rebind<i64, Tag<f64>> d;
   const HalfInts half;
   const auto bits = hn::VecFromMask(Tag<i32>(), c.mask);
-  const auto mask = [&](auto v) HWY_ATTR {
-    return hn::RebindMask(Tag<f64>(), hn::MaskFromVec(hn::PromoteTo(d, v)));
-  };
+  const auto mask = [&](auto v) HWY_ATTR { return hn::RebindMask(Tag<f64>(), hn::MaskFromVec(hn::PromoteTo(d, v))); };
   return {hn::IfThenElse(mask(hn::LowerHalf(half, bits)), a.low, b.low),
           hn::IfThenElse(mask(hn::UpperHalf(half, bits)), a.high, b.high)};
 }
@@ -166,10 +164,7 @@ class Scattered {
   static constexpr bool one_phase = false;
 
   HWY_INLINE Scattered(const SampleRun& run, const ZR_LayerDef& src)
-      : data_(static_cast<const char*>(src.data)),
-        row_bytes_(src.row_bytes),
-        step_x_(run.step_x),
-        step_y_(run.step_y) {
+      : data_(static_cast<const char*>(src.data)), row_bytes_(src.row_bytes), step_x_(run.step_x), step_y_(run.step_y) {
     const Ints place = hn::Iota(Tag<i32>(), 0);
     x_ = Ints(run.x) + place * step_x_;
     y_ = Ints(run.y) + place * step_y_;
@@ -216,7 +211,7 @@ class Scattered {
     const auto offset = [&](auto column, auto row) HWY_ATTR {
       const Offsets d;
       const auto rows = hn::MulEven(hn::BitCast(Tag<i32>(), hn::PromoteTo(d, row)), Ints(row_bytes_).v);
-      return hn::Add(rows, hn::ShiftLeft<sizeof(T) == 4 ? 2 : sizeof(T) == 8 ? 3 : 4>(hn::PromoteTo(d, column)));
+      return hn::Add(rows, hn::ShiftLeft < sizeof(T) == 4 ? 2 : sizeof(T) == 8 ? 3 : 4 > (hn::PromoteTo(d, column)));
     };
     low_ = offset(hn::LowerHalf(half, x.v), hn::LowerHalf(half, y.v));
     high_ = offset(hn::UpperHalf(half, x.v), hn::UpperHalf(half, y.v));

@@ -1,0 +1,117 @@
+// Cubic convolution along a row, on lanes.
+#include "sample/lane_rows.h"
+
+#undef HWY_TARGET_INCLUDE
+#define HWY_TARGET_INCLUDE "sample/lane_bicubic.cc"
+#include <hwy/foreach_target.h>
+
+#include "simd/lanes-inl.h"
+#if ZR_HAS_LANES
+#include "sample/lane_samples-inl.h"
+
+HWY_BEFORE_NAMESPACE();
+namespace zr {
+namespace HWY_NAMESPACE {
+
+struct LaneCubicWeights {
+  Floats w[4];
+
+  explicit HWY_INLINE LaneCubicWeights(Ints fraction) {
+    const Doubles f = to_double(fraction) * 0x1p-16, one(1.0);
+    const auto near = [&](Doubles t) HWY_ATTR { return narrowed((t * 1.25 - 2.25) * t * t + one); };
+    const auto far = [&](Doubles t) HWY_ATTR { return narrowed(((t * -0.75 + 3.75) * t - 6.0) * t + 3.0); };
+    w[0] = far(one + f), w[1] = near(f), w[2] = near(one - f), w[3] = far(Doubles(2.0) - f);
+  }
+};
+
+struct FloatPixels {
+  Floats c[4];
+};
+HWY_INLINE Floats in_order(const Floats (&w)[4], const FloatPixels (&p)[4], i32 k) {
+  return ((w[0] * p[0].c[k] + w[1] * p[1].c[k]) + w[2] * p[2].c[k]) + w[3] * p[3].c[k];
+}
+
+// Four pixels into one: where their alphas differ colour is weighted by alpha and divided by its sum.
+HWY_INLINE FloatPixels convolve(const Floats (&w)[4], const FloatPixels (&p)[4]) {
+  const Floats alpha = p[0].c[0];
+  const Bools<f32> equal = (alpha == p[1].c[0] && alpha == p[2].c[0]) && alpha == p[3].c[0];
+  if (all(equal)) return {{alpha, in_order(w, p, 1), in_order(w, p, 2), in_order(w, p, 3)}};
+  // Lanes of equal alphas are weighted by 1 in its place.
+  Floats b[4];
+  for (i32 i = 0; i < 4; ++i) b[i] = w[i] * pick(equal, 1.0f, p[i].c[0]);
+  const Floats sum = ((b[0] + b[1]) + b[2]) + b[3];
+  const Bools<f32> clear = !equal && sum == 0.0f;
+  const Floats inverse = pick(equal, 1.0f, 1.0f / sum);
+  const auto colour = [&](i32 k) HWY_ATTR { return pick(clear, 0.0f, inverse * in_order(b, p, k)); };
+  return {{pick(clear, 0.0f, pick(equal, alpha, sum)), colour(1), colour(2), colour(3)}};
+}
+
+template <class T>
+HWY_INLINE Raw<T> limited(const FloatPixels& p) {
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
+    const Floats alpha = p.c[0];
+    const Floats held = pick(alpha > 1.0f, 1.0f, pick(alpha < 1e-16f, 0.0f, alpha));
+    return {{as_ints(held), as_ints(p.c[1]), as_ints(p.c[2]), as_ints(p.c[3])}};
+  } else {
+    // An alpha that counts as none is none on the channel's scale too, so that one rule serves all channels.
+    constexpr f32 white = static_cast<f32>(Depth<T>::white);
+    const auto channel = [](Floats c) HWY_ATTR {
+      const Floats scaled = c * (1.0f / white) * white;
+      const Floats rounded = pick(scaled > 0.0f, scaled, 0.0f) + 0.5f;
+      return fitting_int(pick(rounded < white, rounded, white));
+    };
+    return packed<T>(channel(p.c[0]), channel(p.c[1]), channel(p.c[2]), channel(p.c[3]));
+  }
+}
+
+template <class T, class Neighbours, class Sum>
+i32 bicubic_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, T* dst) {
+  const LaneCubicWeights phase_across(Ints(run.x & 0xffff)), phase_down(Ints(run.y & 0xffff));
+  return sample_vectors<T, Neighbours>(run, *params.src, sum, dst, [&](const Neighbours& at) HWY_ATTR {
+    const LaneCubicWeights across = Neighbours::one_phase ? phase_across : LaneCubicWeights(at.fraction_x());
+    FloatPixels rows[4];
+    for (i32 j = 0; j < 4; ++j) {
+      Raw<T> raw[4];
+      at.row(-1, j - 1, raw);
+      FloatPixels p[4];
+      for (i32 i = 0; i < 4; ++i)
+        p[i] = {{real_channel_of<Floats, 0>(raw[i]), real_channel_of<Floats, 1>(raw[i]),
+                 real_channel_of<Floats, 2>(raw[i]), real_channel_of<Floats, 3>(raw[i])}};
+      rows[j] = convolve(across.w, p);
+    }
+    const LaneCubicWeights down = Neighbours::one_phase ? phase_down : LaneCubicWeights(at.fraction_y());
+    return limited<T>(convolve(down.w, rows));
+  });
+}
+
+template <class T>
+const LaneRows<T>* bicubic_rows() {
+  static constexpr LaneRows<T> rows = {&bicubic_vectors<T, Scattered<T>, RowSum<T>>,
+                                       &bicubic_vectors<T, Adjacent<T>, AlphaSum<T>>};
+  return &rows;
+}
+template const LaneRows<ZR_Pixel8>* bicubic_rows<ZR_Pixel8>();
+template const LaneRows<ZR_Pixel16>* bicubic_rows<ZR_Pixel16>();
+template const LaneRows<ZR_PixelFloat>* bicubic_rows<ZR_PixelFloat>();
+
+}  // namespace HWY_NAMESPACE
+}  // namespace zr
+HWY_AFTER_NAMESPACE();
+#endif
+
+#if HWY_ONCE
+#include "simd/variant.h"
+
+namespace zr {
+
+template <class T>
+const LaneRows<T>* lane_bicubic_rows() {
+  ZR_RETURN_BEST(bicubic_rows<T>());
+  return nullptr;
+}
+template const LaneRows<ZR_Pixel8>* lane_bicubic_rows<ZR_Pixel8>();
+template const LaneRows<ZR_Pixel16>* lane_bicubic_rows<ZR_Pixel16>();
+template const LaneRows<ZR_PixelFloat>* lane_bicubic_rows<ZR_PixelFloat>();
+
+}  // namespace zr
+#endif
