@@ -7,6 +7,7 @@
 #include <stdexcept>
 #include <utility>
 
+#include "divided_calls_state.h"
 #include "threaded_iterate.h"
 #include "threaded_iterate_state.h"
 
@@ -22,6 +23,7 @@ struct Hostkit::State {
     WorkerPool* nobody = nullptr;
     if (!G_iterate_workers.compare_exchange_strong(nobody, &workers))
       throw std::runtime_error("a second Hostkit in one process");
+    G_scratch_records.store(&scratch);
   }
   ~State() {
     if (alive) ZR_Death();
@@ -31,6 +33,7 @@ struct Hostkit::State {
     if (!options.module_folders.empty()) ADDIN_SetModuleFolders(nullptr, 0);
     if (options.message_sink) HB_SetMessageSink(nullptr, nullptr);
     if (options.verification_sink) HB_SetVerificationSink(nullptr, nullptr);
+    G_scratch_records.store(nullptr);
     G_iterate_workers.store(nullptr);
   }
   State(const State&) = delete;
@@ -66,6 +69,7 @@ struct Hostkit::State {
 
   HostkitOptions options;
   WorkerPool workers;
+  ScratchRecords scratch;
   bool alive = false;
 };
 

@@ -63,6 +63,21 @@ template <class T>
 ZR_API i32 ZR_BlendPipeline(const ZR_ProgressInfo* progress, i32 n, const ZR_BlendModeDescriptor<T>* descriptor,
                             const T* src, const T* mask, zr::Channel<T>* scratch, T* dst);
 
+namespace zr {
+
+// The seed of a composite's rows is the record's seed + left at the top, and grows by y * row_seed_step behind
+// row y.
+inline constexpr u32 row_seed_step = 12281;
+// The rand_seed with which a composite that starts at row `y` gives its rows the seeds that they have in one with
+// `rand_seed` that starts at `top` (at most y), both in the same columns.
+constexpr i32 seed_from_row(i32 rand_seed, i32 top, i32 y) {
+  const i64 rows = i64{y} - top;
+  const u32 sum = static_cast<u32>(rows * (i64{y} + top - 1) / 2);  // of top .. y - 1
+  return static_cast<i32>(static_cast<u32>(rand_seed) + sum * row_seed_step);
+}
+
+}  // namespace zr
+
 // Grows the shared scratch to `width` pixels (or, forced, to exactly that) and fills the ten pointers of
 // `record`. channel_bytes is 1, 2 or 4. Returns 0, 3 or 4. Not for threads.
 ZR_API i32 ZRp_ReallocScratch(i32 width, i32 channel_bytes, bool force, void* record[10]);

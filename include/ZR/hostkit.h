@@ -57,3 +57,24 @@ class Hostkit {
 };
 
 }  // namespace zr
+
+// ZR_TransferRect and ZR_TransformWorld on all threads of the Hostkit that lives: destination rows are cut into
+// bands, each drawn with a scratch record of its own (kept between calls, freed with the host). Arguments, results
+// and bytes are those of the undivided call, whatever the number of threads; but
+//   - only the calling thread polls: before the first row, then now and then with the rows done so far, which never
+//     fall. After a refusal, or an error, no further band is begun: rows are whole, done or not, in any order;
+//   - an error is that of the topmost band that met one; several bands may report theirs;
+//   - without memory for scratch nothing is drawn (ZR_Err_OutOfMemory).
+// Calls from several threads at once are independent, where no replacement takes the shared scratch. Undivided run:
+// small rectangles, a call from inside an iterate callback, worlds or a mask that share memory with the destination,
+// transfer modes beyond the known ones, a replaced ZR_Slot_transfer_rect or ZR_Slot_transform_world (replaced rows
+// of a transform likewise). Bands of a composite go through ZR_TransferRectPlus and what stands in its slots.
+extern "C" {
+i32 ZRHost_TransferRect(const ZR_ProgressInfo* progress, i32 quality, u32 flags, i32 field, const GX_LRect* rect,
+                        ZR_LayerDef* src, const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables,
+                        const ZR_MaskWorld* mask, i32 dest_x, i32 dest_y, ZR_LayerDef* dst);
+i32 ZRHost_TransformWorld(const ZR_ProgressInfo* progress, i32 quality, u32 flags, i32 field, ZR_LayerDef* src,
+                          const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables,
+                          const ZR_MaskWorld* mask, const GX_Matrix3* matrices, i32 count, bool src2dst,
+                          const GX_LRect* dst_rect, ZR_LayerDef* dst);
+}

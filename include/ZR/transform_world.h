@@ -41,6 +41,33 @@ ZR_API i32 ZR_TransformWorldPlus(const ZR_ProgressInfo* progress, i32 quality, u
                                  const ZR_MaskWorld* mask, const GX_Matrix3* matrices, i32 count, bool src2dst,
                                  void* scratch[10], const GX_LRect* dst_rect, ZR_LayerDef* dst);
 
+/* What a transform is going to be, before a pixel is touched. */
+typedef enum ZR_TransformKind {
+  ZR_Transform_Nothing = 0, /* leaves dst as it is */
+  ZR_Transform_Move = 1,    /* ZR_TransferRect of `bounds` moved by (-shift_x, -shift_y), to its top left corner */
+  ZR_Transform_Rows = 2,    /* rows that ZR_TransformWorldRows draws in parts */
+  ZR_Transform_Whole = 3 /* one call draws it: the image has collapsed, or the depth's row slot holds a replacement */
+} ZR_TransformKind;
+typedef struct ZR_TransformExtent {
+  i32 kind;
+  GX_LRect bounds; /* pixels of dst that are blended; (0, 0, 0, 0) for ZR_Transform_Nothing */
+  i32 shift_x, shift_y;
+} ZR_TransformExtent;
+/* Arguments as for ZR_TransformWorld, mask may be null. Any thread. Returns 0, or what the transform itself returns
+ * for missing records and an unknown depth. */
+ZR_API i32 ZR_GetTransformExtent(i32 quality, const ZR_LayerDef* src, const ZR_MaskWorld* mask,
+                                 const GX_Matrix3* matrices, i32 count, bool src2dst, const GX_LRect* dst_rect,
+                                 const ZR_LayerDef* dst, ZR_TransformExtent* extent);
+/* Of a transform of kind ZR_Transform_Rows the destination rows first_row..end_row-1, with the bytes that the whole
+ * one gives them; other kinds draw nothing. dst_rect is the whole one's. Alpha outside the bounds is left to the
+ * caller: XferMultiplyAlpha and XferMultiplyAlphaLuma want ZR_ClearAlphaExceptRect of the bounds once. Polls on the
+ * rows of the whole one, with its counts. Calls for different rows, with scratch of their own, may run together. */
+ZR_API i32 ZR_TransformWorldRows(const ZR_ProgressInfo* progress, i32 quality, u32 flags, i32 field, ZR_LayerDef* src,
+                                 const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables,
+                                 const ZR_MaskWorld* mask, const GX_Matrix3* matrices, i32 count, bool src2dst,
+                                 void* scratch[10], const GX_LRect* dst_rect, i32 first_row, i32 end_row,
+                                 ZR_LayerDef* dst);
+
 #ifdef __cplusplus
 }
 #endif

@@ -167,6 +167,12 @@ ZR_API i32 ZR_TransferRectPlus(const ZR_ProgressInfo* progress, i32 quality, u32
                                ZR_LayerDef* src, const ZR_CompositeModePlus* mode,
                                const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask, void* scratch[10],
                                i32 dest_x, i32 dest_y, ZR_LayerDef* dst);
+/* The pixels of dst that a composite blends: `rect` clipped to both worlds and, for even kinds, to the mask (which may
+ * be null); (0, 0, 0, 0) when none are left. Nothing is drawn. Any thread. Hosts cut bands of rows from it: a band is
+ * the Plus form on those rows of `rect`, with rand_seed by zr::seed_from_row (<ZR/composite.h>), and with
+ * XferMultiplyAlpha and XferMultiplyAlphaLuma on a record of those rows alone, as all else in dst is cleared. */
+ZR_API i32 ZR_GetTransferBounds(const GX_LRect* rect, const ZR_LayerDef* src, const ZR_MaskWorld* mask, i32 dest_x,
+                                i32 dest_y, const ZR_LayerDef* dst, GX_LRect* bounds);
 /* Zeroes the alpha of every pixel outside `rect`, of all when it misses the world; colours stay.
  * progress is not read. */
 ZR_API i32 ZR_ClearAlphaExceptRect(const ZR_ProgressInfo* progress, const GX_LRect* rect, ZR_LayerDef* world);

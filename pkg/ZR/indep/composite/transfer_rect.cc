@@ -18,6 +18,10 @@ struct Area {
   i64 left, top, right, bottom;
 
   bool empty() const { return right <= left || bottom <= top; }
+  // Of an area inside a world, where they fit.
+  GX_LRect corners() const {
+    return {static_cast<i32>(left), static_cast<i32>(top), static_cast<i32>(right), static_cast<i32>(bottom)};
+  }
   void move(i64 dx, i64 dy) { left += dx, right += dx, top += dy, bottom += dy; }
   // Cuts to width x height pixels at (x, y).
   void clip(i64 x, i64 y, i64 width, i64 height) {
@@ -58,9 +62,7 @@ i32 transfer_rows(const ZR_ProgressInfo* progress, i32 /*quality*/, i32 field, c
     const i64 dx = static_cast<i64>(dest_x) - rect->left, dy = static_cast<i64>(dest_y) - rect->top;
     const Area area = clipped_area(*rect, *src, mask, dx, dy, *dst);
     if (area.empty()) return ZR_Err_None;
-    // Clipped to the destination, the corners are its own coordinates again.
-    const GX_LRect to = {static_cast<i32>(area.left), static_cast<i32>(area.top), static_cast<i32>(area.right),
-                         static_cast<i32>(area.bottom)};
+    const GX_LRect to = area.corners();
     const i32 width = to.right - to.left, rows = to.bottom - to.top;
 
     ZR_BlendModeDescriptor<T> plan(*mode, mask != nullptr, tables);
@@ -82,7 +84,7 @@ i32 transfer_rows(const ZR_ProgressInfo* progress, i32 /*quality*/, i32 field, c
     const i32 skipped_parity = field == 1 ? 1 : field == 2 ? 0 : 2;
     // The seed of a row depends on the row alone, so that fields and single rows dissolve as the frame does.
     u32 seed = static_cast<u32>(mode->seed) + static_cast<u32>(to.left);
-    u32 seed_step = static_cast<u32>(to.top) * 12281u;
+    u32 seed_step = static_cast<u32>(to.top) * row_seed_step;
     for (i32 y = to.top; y < to.bottom; ++y) {
       const T* const mask_pixels = mask != nullptr ? mask_row<T>(*mask, to.left, y, width, mask_cells) : nullptr;
       if ((y & 1) != skipped_parity) {
@@ -97,7 +99,7 @@ i32 transfer_rows(const ZR_ProgressInfo* progress, i32 /*quality*/, i32 field, c
         if (stop != 0) return stop;
       }
       seed += seed_step;
-      seed_step += 12281u;
+      seed_step += row_seed_step;
     }
     return ZR_Err_None;
   });
@@ -153,4 +155,16 @@ i32 ZR_TransferRect_S(const ZR_ProgressInfo* progress, i32 quality, u32 /*flags*
                       const ZR_MaskWorld* mask, i32 dest_x, i32 dest_y, ZR_LayerDef* dst) {
   return zr::transfer_rect(progress, quality, field, rect, src, mode, tables, mask, nullptr, dest_x, dest_y, dst,
                            "ZR_TransferRect requires src and dst worlds to have same bit depth");
+}
+
+i32 ZR_GetTransferBounds(const GX_LRect* rect, const ZR_LayerDef* src, const ZR_MaskWorld* mask, i32 dest_x, i32 dest_y,
+                         const ZR_LayerDef* dst, GX_LRect* bounds) {
+  return zr::guarded([&]() -> i32 {
+    if (rect == nullptr || src == nullptr || dst == nullptr || bounds == nullptr)
+      return ZR_ReportBadCallbackParam(ZR_Site_TransferRect);
+    const i64 dx = static_cast<i64>(dest_x) - rect->left, dy = static_cast<i64>(dest_y) - rect->top;
+    const zr::Area area = zr::clipped_area(*rect, *src, mask, dx, dy, *dst);
+    *bounds = area.empty() ? GX_LRect{0, 0, 0, 0} : area.corners();
+    return ZR_Err_None;
+  });
 }

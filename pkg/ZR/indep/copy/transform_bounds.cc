@@ -68,6 +68,26 @@ GX_LRect reached_bounds(const MatrixList& list, const GX_LRect& area, i32 src_wi
   return bounds;
 }
 
+ZR_TransformExtent transform_extent(i32 quality, const MatrixList& list, const ZR_LayerDef& src,
+                                    const ZR_MaskWorld* mask, const GX_LRect& rect, const ZR_LayerDef& dst) {
+  ZR_TransformExtent extent{};
+  Shutter shutter;
+  if (!make_shutter(list, &shutter)) return extent;
+  extent.bounds = reached_bounds(list, drawable_area(rect, dst, mask), src.width, src.height);
+  if (GX_EmptyLRect(&extent.bounds)) {
+    extent.bounds = {0, 0, 0, 0};
+    return extent;
+  }
+  const PlacedScale scale = placed_scale(shutter.first.forward);
+  extent.shift_x = nearest_index(scale.shift_x);
+  extent.shift_y = nearest_index(scale.shift_y);
+  const bool by_pixels = quality == 0 || ((scale.shift_x | scale.shift_y) & 0xffff) == 0;
+  const bool moved =
+      !shutter.moves && by_pixels && GX_GetMatrixType(&shutter.first.forward) <= GX_MatrixType_Translation;
+  extent.kind = scale.degenerate ? ZR_Transform_Whole : moved ? ZR_Transform_Move : ZR_Transform_Rows;
+  return extent;
+}
+
 bool is_complex_motion(const MatrixList& list, const Shutter& shutter) {
   if (turns(shutter)) return true;
   GX_FloatPoint start{}, first_move{}, before{}, middle{};

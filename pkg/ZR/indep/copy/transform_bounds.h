@@ -2,6 +2,8 @@
 // layer can reach, and whether its motion is a straight line.
 #pragma once
 
+#include <ZR/transform_world.h>
+
 #include "copy/matrix_steps.h"
 
 namespace zr {
@@ -24,6 +26,10 @@ bool make_shutter(const MatrixList& list, Shutter* out);
 GX_LRect drawable_area(const GX_LRect& rect, const ZR_LayerDef& dst, const ZR_MaskWorld* mask);
 // What of `area` any of the matrices reaches; a singular one reaches nothing. (0, 0, 0, 0) when empty.
 GX_LRect reached_bounds(const MatrixList& list, const GX_LRect& area, i32 src_width, i32 src_height);
+
+// Kind, bounds and shift of a drawing by the library's own rows: ZR_Transform_Whole is a collapsed image.
+ZR_TransformExtent transform_extent(i32 quality, const MatrixList& list, const ZR_LayerDef& src,
+                                    const ZR_MaskWorld* mask, const GX_LRect& rect, const ZR_LayerDef& dst);
 
 // Between the ends the layer turns, or its origin does not keep its pace: the ends alone do not tell the way.
 // For more than two matrices.

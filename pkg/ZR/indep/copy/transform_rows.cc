@@ -4,6 +4,7 @@
 #include <ZR/errors.h>
 #include <ZR/transfer_mode.h>
 
+#include <algorithm>
 #include <optional>
 
 #include "composite/scratch_state.h"
@@ -38,8 +39,9 @@ bool mask_lacks_pixels(const ZR_MaskWorld& mask, const GX_LRect& bounds) {
 template <class T>
 i32 move_layer(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR_WorldX<T>& src,
                const ZR_BlendingMode<T>& mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
-               void* const scratch[10], const PlacedScale& scale, const GX_LRect& bounds, ZR_WorldX<T>* dst) {
-  const i32 dx = nearest_index(scale.shift_x), dy = nearest_index(scale.shift_y);
+               void* const scratch[10], const ZR_TransformExtent& extent, ZR_WorldX<T>* dst) {
+  const GX_LRect& bounds = extent.bounds;
+  const i32 dx = extent.shift_x, dy = extent.shift_y;
   const GX_LRect rect = {wrap_sub(bounds.left, dx), wrap_sub(bounds.top, dy), wrap_sub(bounds.right, dx),
                          wrap_sub(bounds.bottom, dy)};
   // Opacity over white and back is exact in every depth.
@@ -68,31 +70,30 @@ i32 finish_row(const ZR_ProgressInfo* progress, i32 count, const ZR_BlendModeDes
   return ZR_BlendPipeline<T>(progress, count, &plan, row, mask, alpha_row, out);
 }
 
-}  // namespace
-
+// The rows of `band`, or with none the whole layer.
 template <class T>
-i32 transform_rows(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR_WorldX<T>* src,
-                   const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
-                   const GX_Matrix3* matrices, i32 count, bool src2dst, void* const scratch[10], const GX_LRect* rect,
-                   ZR_WorldX<T>* dst) {
+i32 draw_layer(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR_WorldX<T>* src,
+               const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
+               const MatrixList& list, void* const scratch[10], const GX_LRect* rect, const RowBand* band,
+               ZR_WorldX<T>* dst) {
   return guarded([&]() -> i32 {
     if (mask != nullptr && ZRp_WorldDepth(&mask->world) != Depth<T>::bits)
       return failed_verification(ZR_Site_TransformWorld,
                                  "ZR_TransformWorld requires mask and dst worlds to have same bit depth");
-    const MatrixList list = {matrices, count, src2dst};
-    Shutter shutter;
-    if (!make_shutter(list, &shutter)) return ZR_Err_None;
-    const GX_LRect bounds = reached_bounds(list, drawable_area(*rect, *dst, mask), src->width, src->height);
-    if (GX_EmptyLRect(&bounds)) return ZR_Err_None;
-
-    const PlacedScale scale = placed_scale(shutter.first.forward);
-    if (scale.degenerate) {
+    const ZR_TransformExtent extent = transform_extent(quality, list, *src, mask, *rect, *dst);
+    if (extent.kind == ZR_Transform_Nothing || (band != nullptr && extent.kind != ZR_Transform_Rows))
+      return ZR_Err_None;
+    if (extent.kind == ZR_Transform_Whole) {
       constexpr GX_LRect nothing = {0, 0, 0, 0};
       return multiplies_alpha(mode->mode) ? ZR_ClearAlphaExceptRect(progress, &nothing, dst) : ZR_Err_None;
     }
-    const bool whole = quality == 0 || ((scale.shift_x | scale.shift_y) & 0xffff) == 0;
-    if (!shutter.moves && whole && GX_GetMatrixType(&shutter.first.forward) <= GX_MatrixType_Translation)
-      return move_layer<T>(progress, quality, field, *src, *mode, tables, mask, scratch, scale, bounds, dst);
+    if (extent.kind == ZR_Transform_Move)
+      return move_layer<T>(progress, quality, field, *src, *mode, tables, mask, scratch, extent, dst);
+    const GX_LRect& bounds = extent.bounds;
+    const i32 count = list.count;
+    Shutter shutter;
+    make_shutter(list, &shutter);
+    const PlacedScale scale = placed_scale(shutter.first.forward);
 
     ZR_BlendModeDescriptor<T> plan(*mode, mask != nullptr, tables);
     if (plan.main == nullptr) return ZR_Err_UnimplementedMode;
@@ -138,17 +139,19 @@ i32 transform_rows(const ZR_ProgressInfo* progress, i32 quality, i32 field, cons
     }
 
     // Around the layer the source counts as clear, and these modes clear under a clear source.
-    if (multiplies_alpha(mode->mode)) {
+    if (multiplies_alpha(mode->mode) && band == nullptr) {
       const i32 error = ZR_ClearAlphaExceptRect(progress, &bounds, dst);
       if (error != 0) return error;
     }
     const i32 skipped_parity = field == 1 ? 1 : field == 2 ? 0 : 2;
     const i32 quiet_bits = progress_bits(quality, count, skipped_parity != 2);
     // The seed of a row depends on the row alone, so that fields dissolve as the frame does.
-    u32 seed = static_cast<u32>(mode->seed), seed_step = static_cast<u32>(bounds.top) * 12281u;
-    for (i32 i = 0; i < rows; ++i) {
+    u32 seed = static_cast<u32>(mode->seed), seed_step = static_cast<u32>(bounds.top) * row_seed_step;
+    const i32 first = band != nullptr ? std::max(band->first, bounds.top) - bounds.top : 0;
+    const i32 end = band != nullptr ? std::min(band->end, bounds.bottom) - bounds.top : rows;
+    for (i32 i = 0; i < end; ++i) {
       const i32 y = bounds.top + i;
-      if ((y & 1) != skipped_parity) {
+      if (i >= first && (y & 1) != skipped_parity) {
         plan.mode.seed = static_cast<i32>(seed);
         const T* const mask_pixels = mask != nullptr ? mask_row<T>(*mask, bounds.left, y, width, mask_cells) : nullptr;
         RowSum<T> sum = 0;
@@ -158,19 +161,42 @@ i32 transform_rows(const ZR_ProgressInfo* progress, i32 quality, i32 field, cons
         if (error != 0) return error;
       }
       sampler->next_row();
-      if ((i & quiet_bits) == 0) {
+      if (i >= first && (i & quiet_bits) == 0) {
         const i32 stop = poll(progress, i, rows);
         if (stop != 0) return stop;
       }
       seed += seed_step;
-      seed_step += 12281u;
+      seed_step += row_seed_step;
     }
     return ZR_Err_None;
   });
 }
 
+}  // namespace
+
+template <class T>
+i32 transform_rows(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR_WorldX<T>* src,
+                   const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
+                   const GX_Matrix3* matrices, i32 count, bool src2dst, void* const scratch[10], const GX_LRect* rect,
+                   ZR_WorldX<T>* dst) {
+  return draw_layer<T>(progress, quality, field, src, mode, tables, mask, {matrices, count, src2dst}, scratch, rect,
+                       nullptr, dst);
+}
+
+template <class T>
+i32 transform_band(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR_WorldX<T>* src,
+                   const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
+                   const GX_Matrix3* matrices, i32 count, bool src2dst, void* const scratch[10], const GX_LRect* rect,
+                   RowBand band, ZR_WorldX<T>* dst) {
+  return draw_layer<T>(progress, quality, field, src, mode, tables, mask, {matrices, count, src2dst}, scratch, rect,
+                       &band, dst);
+}
+
 template TransformRowsFunc<ZR_Pixel8> transform_rows<ZR_Pixel8>;
 template TransformRowsFunc<ZR_Pixel16> transform_rows<ZR_Pixel16>;
 template TransformRowsFunc<ZR_PixelFloat> transform_rows<ZR_PixelFloat>;
+template TransformBandFunc<ZR_Pixel8> transform_band<ZR_Pixel8>;
+template TransformBandFunc<ZR_Pixel16> transform_band<ZR_Pixel16>;
+template TransformBandFunc<ZR_PixelFloat> transform_band<ZR_PixelFloat>;
 
 }  // namespace zr

@@ -16,4 +16,16 @@ i32 transform_rows(const ZR_ProgressInfo* progress, i32 quality, i32 field, cons
                    const GX_Matrix3* matrices, i32 count, bool src2dst, void* const scratch[10], const GX_LRect* rect,
                    ZR_WorldX<T>* dst);
 
+// Only the rows of `band`, of a layer whose extent is of kind ZR_Transform_Rows; alpha outside the bounds stays.
+struct RowBand {
+  i32 first, end;
+};
+template <class T>
+using TransformBandFunc = i32(const ZR_ProgressInfo*, i32 quality, i32 field, const ZR_WorldX<T>* src,
+                              const ZR_BlendingMode<T>*, const ZR_LinearBlendingTables*, const ZR_MaskWorld*,
+                              const GX_Matrix3*, i32 count, bool src2dst, void* const scratch[10], const GX_LRect*,
+                              RowBand, ZR_WorldX<T>* dst);
+template <class T>
+TransformBandFunc<T> transform_band;
+
 }  // namespace zr

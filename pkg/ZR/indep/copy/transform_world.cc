@@ -14,7 +14,7 @@ namespace {
 i32 transform_world(const ZR_ProgressInfo* progress, i32 quality, i32 field, ZR_LayerDef* src,
                     const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
                     const GX_Matrix3* matrices, i32 count, bool src2dst, void* const* own_scratch,
-                    const GX_LRect* dst_rect, ZR_LayerDef* dst) {
+                    const GX_LRect* dst_rect, const RowBand* band, ZR_LayerDef* dst) {
   return guarded([&]() -> i32 {
     if (src == nullptr || mode == nullptr || matrices == nullptr || count < 1 || dst_rect == nullptr || dst == nullptr)
       return ZR_ReportBadCallbackParam(ZR_Site_TransformWorld);
@@ -33,6 +33,9 @@ i32 transform_world(const ZR_ProgressInfo* progress, i32 quality, i32 field, ZR_
       const ZR_WorldX<T> from(src, false);
       ZR_WorldX<T> to(dst, false);
       void* const* const scratch = own_scratch != nullptr ? own_scratch : shared;
+      if (band != nullptr)
+        return transform_band<T>(progress, quality, field, &from, &typed_mode, tables, mask, matrices, count, src2dst,
+                                 scratch, dst_rect, *band, &to);
       return call_slot<DepthSlots<T>::transform_rows>(progress, quality, field, &from, &typed_mode, tables, mask,
                                                       matrices, count, src2dst, scratch, dst_rect, &to);
     });
@@ -47,7 +50,7 @@ i32 ZR_TransformWorld_S(const ZR_ProgressInfo* progress, i32 quality, u32 /*flag
                         const ZR_MaskWorld* mask, const GX_Matrix3* matrices, i32 count, bool src2dst,
                         const GX_LRect* dst_rect, ZR_LayerDef* dst) {
   return zr::transform_world(progress, quality, field, src, mode, tables, mask, matrices, count, src2dst, nullptr,
-                             dst_rect, dst);
+                             dst_rect, nullptr, dst);
 }
 
 i32 ZR_TransformWorldPlus(const ZR_ProgressInfo* progress, i32 quality, u32 /*flags*/, i32 field, ZR_LayerDef* src,
@@ -56,7 +59,32 @@ i32 ZR_TransformWorldPlus(const ZR_ProgressInfo* progress, i32 quality, u32 /*fl
                           void* scratch[10], const GX_LRect* dst_rect, ZR_LayerDef* dst) {
   if (scratch == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_TransformWorld);
   return zr::transform_world(progress, quality, field, src, mode, tables, mask, matrices, count, src2dst, scratch,
-                             dst_rect, dst);
+                             dst_rect, nullptr, dst);
+}
+
+i32 ZR_TransformWorldRows(const ZR_ProgressInfo* progress, i32 quality, u32 /*flags*/, i32 field, ZR_LayerDef* src,
+                          const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables,
+                          const ZR_MaskWorld* mask, const GX_Matrix3* matrices, i32 count, bool src2dst,
+                          void* scratch[10], const GX_LRect* dst_rect, i32 first_row, i32 end_row, ZR_LayerDef* dst) {
+  if (scratch == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_TransformWorld);
+  const zr::RowBand band = {first_row, end_row};
+  return zr::transform_world(progress, quality, field, src, mode, tables, mask, matrices, count, src2dst, scratch,
+                             dst_rect, &band, dst);
+}
+
+i32 ZR_GetTransformExtent(i32 quality, const ZR_LayerDef* src, const ZR_MaskWorld* mask, const GX_Matrix3* matrices,
+                          i32 count, bool src2dst, const GX_LRect* dst_rect, const ZR_LayerDef* dst,
+                          ZR_TransformExtent* extent) {
+  return zr::guarded([&]() -> i32 {
+    if (src == nullptr || matrices == nullptr || count < 1 || dst_rect == nullptr || dst == nullptr ||
+        extent == nullptr)
+      return ZR_ReportBadCallbackParam(ZR_Site_TransformWorld);
+    return zr::on_depth(ZRp_WorldDepth(dst), zr::unknown_depth_text, [&]<class T>() -> i32 {
+      *extent = zr::transform_extent(quality, {matrices, count, src2dst}, *src, mask, *dst_rect, *dst);
+      if (zr::slot<zr::DepthSlots<T>::transform_rows>() != &zr::transform_rows<T>) extent->kind = ZR_Transform_Whole;
+      return ZR_Err_None;
+    });
+  });
 }
 
 // Jumps through the slot. A replacement is handed the pixels that the layer reaches instead of the caller's
