@@ -1,16 +1,10 @@
 // Copies between worlds: whole, converting, scaled by nearest neighbour and by samples.
-#include <ZR/copy_bits.h>
-
-#include "workloads.h"
+#include "placements.h"
 
 namespace bench {
 namespace {
 
 using Copy = decltype(&ZR_CopyBits_Draft);
-
-Size scaled(Size size, f64 scale) {
-  return {static_cast<i32>(size.width * scale + 0.5), static_cast<i32>(size.height * scale + 0.5)};
-}
 
 template <class To, class From>
 void copy(benchmark::State& state, Copy routine, Size from, Size to, Layer layer) {
@@ -34,31 +28,17 @@ void add_copy(Size size) {
       size, [](benchmark::State& state, Size s) { copy<To, From>(state, &ZR_CopyBits_Draft, s, s, Layer::opaque); });
 }
 
-struct Scale {
-  const char* name;
-  Copy routine;
-  f64 scale;
-};
-constexpr Scale scales[] = {{"copybits-draft", &ZR_CopyBits_Draft, 0.5},
-                            {"copybits-draft", &ZR_CopyBits_Draft, 2},
-                            {"copybits-hq", &ZR_CopyBits_HQ_Straight, 0.37},
-                            {"copybits-hq", &ZR_CopyBits_HQ_Straight, 0.5},
-                            {"copybits-hq", &ZR_CopyBits_HQ_Straight, 1.3}};
+constexpr const Resize* resizes[] = {&nearest_half, &nearest_double, &area_third, &area_half, &bilinear_larger};
 
 const bool registered = [] {
   for (const Size size : sizes) {
     each_depth([&]<class T>() {
       add_copy<T, T>(size);
-      for (const Scale& one : scales)
-        for (const Layer layer : {Layer::opaque, Layer::translucent}) {
-          const bool samples = one.routine != &ZR_CopyBits_Draft;
-          if (!samples && layer != Layer::opaque) continue;  // values do not matter there
-          char factor[16];
-          std::snprintf(factor, sizeof factor, "/x%g", one.scale);
-          add(std::string(one.name) + "/" + depth_name<T>() + factor +
-                  (samples ? std::string("-") + name_of(layer) : ""),
-              size,
-              [=](benchmark::State& state, Size s) { copy<T, T>(state, one.routine, s, scaled(s, one.scale), layer); });
+      for (const Resize* one : resizes)
+        for (const Layer layer : layers) {
+          if (one->routine == &ZR_CopyBits_Draft && layer != Layer::opaque) continue;  // values do not matter there
+          add(std::string(one->name) + "/" + depth_name<T>() + "/" + name_of(layer), size,
+              [=](benchmark::State& state, Size s) { copy<T, T>(state, one->routine, s, one->to(s), layer); });
         }
     });
     add_copy<ZR_PixelFloat, ZR_Pixel8>(size);

@@ -30,15 +30,6 @@ struct Work {
   std::vector<GX_Matrix3> (*matrices)(Size);
 };
 const Work works[] = {
-    {"transform-turned-draft", 0,
-     [](Size s) { return std::vector{placement(turned_degrees, enlarged, s.width, s.height)}; }},
-    {"transform-turned-bilinear", 1,
-     [](Size s) { return std::vector{placement(turned_degrees, enlarged, s.width, s.height)}; }},
-    {"transform-turned-bicubic", 2,
-     [](Size s) { return std::vector{placement(turned_degrees, enlarged, s.width, s.height)}; }},
-    {"transform-reduced-area", 1, [](Size s) { return std::vector{placement(0, reduced, s.width, s.height)}; }},
-    {"transform-moved", 1, [](Size s) { return std::vector{placement(0, 1, s.width, s.height, 7, 5)}; }},
-    {"transform-moved-half-pixel", 1, [](Size s) { return std::vector{placement(0, 1, s.width, s.height, 7.5, 5.5)}; }},
     {"transform-motion-moved", 1,
      [](Size s) {
        return std::vector{placement(0, 1, s.width, s.height), placement(0, 1, s.width, s.height, 24.3, 9)};
@@ -59,9 +50,18 @@ const Work works[] = {
      }},
 };
 
+constexpr const Placement* placements[] = {&turned_draft, &turned_bilinear, &turned_bicubic,
+                                           &reduced_area, &moved,           &moved_half_pixel};
+
 const bool registered = [] {
   for (const Size size : sizes)
     each_depth([&]<class T>() {
+      for (const Placement* work : placements)
+        for (const Layer layer : layers)
+          add(std::string(work->name) + "/" + depth_name<T>() + "/" + name_of(layer), size,
+              [=](benchmark::State& state, Size s) {
+                transform<T>(state, s, layer, work->quality, {work->matrix(s)});
+              });
       for (const Work& work : works)
         for (const Layer layer : {Layer::opaque, Layer::translucent})
           add(std::string(work.name) + "/" + depth_name<T>() + "/" + name_of(layer), size,
