@@ -62,8 +62,7 @@ void add_placed_peer(const Placement& work, const char* peer, Size size, Body bo
           const ZR_CompositeModePlus mode(XferInFront, 1.0f, nullptr, false, 0);
           ZR_TransformWorld(nullptr, work.quality, 0, 0, &src, &mode, nullptr, nullptr, &matrix, 1, true, &all, &dst);
         };
-        time_peer<T>(state, s, s, ours,
-                     [&](ZR_WorldX<T>& src, ZR_WorldX<T>& dst) { body(src, dst, matrix); });
+        time_peer<T>(state, s, s, ours, [&](ZR_WorldX<T>& src, ZR_WorldX<T>& dst) { body(src, dst, matrix); });
       });
 }
 

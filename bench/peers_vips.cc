@@ -37,9 +37,8 @@ void add_affine(const Placement& work, Size size, const char* kernel) {
       VipsArrayInt* const area = vips_array_int_newv(4, 0, 0, dst.width, dst.height);
       // Pixel centres are whole numbers there.
       const auto start = [&](int i) { return m.m[i][2] + (m.m[i][0] + m.m[i][1] - 1) / 2; };
-      const int failed =
-          vips_affine(from, made, m.m[0][0], m.m[0][1], m.m[1][0], m.m[1][1], "interpolate", interpolate, "oarea", area,
-                      "odx", start(0), "ody", start(1), "premultiplied", TRUE, nullptr);
+      const int failed = vips_affine(from, made, m.m[0][0], m.m[0][1], m.m[1][0], m.m[1][1], "interpolate", interpolate,
+                                     "oarea", area, "odx", start(0), "ody", start(1), "premultiplied", TRUE, nullptr);
       vips_area_unref(VIPS_AREA(area));
       g_object_unref(interpolate);
       return failed;

@@ -185,9 +185,7 @@ struct Transform {
       const GX_LRect& to = extent.bounds;
       const GX_LRect rect = {to.left - extent.shift_x, to.top - extent.shift_y, to.right - extent.shift_x,
                              to.bottom - extent.shift_y};
-      return Composite{progress, quality, 0,    field,   &rect,  src, mode,
-                       tables,   mask,    to.left, to.top, dst}
-          .run();
+      return Composite{progress, quality, 0, field, &rect, src, mode, tables, mask, to.left, to.top, dst}.run();
     }
     const i32 samples = std::min(count == 2 ? most_counted_samples : count, most_counted_samples);
     const Bands bands(extent.bounds, threads_from_here(), least_sampled_pixels / samples);
@@ -230,6 +228,6 @@ i32 ZRHost_TransformWorld(const ZR_ProgressInfo* progress, i32 quality, u32 flag
                           const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables,
                           const ZR_MaskWorld* mask, const GX_Matrix3* matrices, i32 count, bool src2dst,
                           const GX_LRect* dst_rect, ZR_LayerDef* dst) {
-  return zr::run(zr::Transform{progress, quality, flags, field, src, mode, tables, mask, matrices, count, src2dst,
-                               dst_rect, dst});
+  return zr::run(
+      zr::Transform{progress, quality, flags, field, src, mode, tables, mask, matrices, count, src2dst, dst_rect, dst});
 }

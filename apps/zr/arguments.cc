@@ -12,9 +12,9 @@
 namespace zr::tool {
 namespace {
 
-constexpr const Command* kCommands[] = {&kRenderCommand, &kSheetCommand,   &kTransformCommand,
-                                        &kResizeCommand, &kConvertCommand, &kDisplayCommand,
-                                        &kInfoCommand,   &kGalleryCommand, &kListCommand};
+constexpr const Command* kCommands[] = {&kRenderCommand,  &kSheetCommand,   &kTransformCommand, &kResizeCommand,
+                                        &kConvertCommand, &kDisplayCommand, &kInfoCommand,      &kGalleryCommand,
+                                        &kListCommand,    &kVerifyCommand};
 constexpr const char* kVersion = "zr " ZR_TOOL_VERSION;
 
 std::string exit_code_help() {
@@ -24,6 +24,7 @@ std::string exit_code_help() {
          "  2    bad command line, or bad input such as a mistake in a scene\n"
          "  3    a file cannot be found, read or written, or stands in the way\n"
          "  4    out of memory, or more would be needed than --memory allows\n"
+         "  5    zr verify found a difference\n"
          "  130  stopped by Ctrl-C; finished frames stay, unfinished files are removed\n";
 }
 

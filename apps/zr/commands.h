@@ -20,7 +20,7 @@ struct Command {
 };
 
 extern const Command kRenderCommand, kListCommand, kGalleryCommand, kConvertCommand, kDisplayCommand, kInfoCommand,
-    kSheetCommand, kTransformCommand, kResizeCommand;
+    kSheetCommand, kTransformCommand, kResizeCommand, kVerifyCommand;
 
 std::span<const Command* const> all_commands();
 // Help that belongs to no verb: {name, text}.

@@ -13,6 +13,7 @@ enum ExitCode : int {
   kExitBadInput = 2,
   kExitFile = 3,
   kExitMemory = 4,
+  kExitDifference = 5,
   kExitInterrupted = 130,
 };
 

@@ -94,9 +94,12 @@ TYPED_TEST(LaneRows, GroundsAndAlphas) {
     const char* name;
     i32 (*row)(i32, const T*, T*);
   };
-  for (const Row& one : {Row{"premultiply", zr::premul_row<T>}, {"unmultiply", zr::unmul_row<T>},
-                         {"white fade", zr::white_fade_row<T>}, {"white unfade", zr::white_unfade_row<T>},
-                         {"grey fade", zr::grey_fade_row<T>}, {"grey unfade", zr::grey_unfade_row<T>}}) {
+  for (const Row& one : {Row{"premultiply", zr::premul_row<T>},
+                         {"unmultiply", zr::unmul_row<T>},
+                         {"white fade", zr::white_fade_row<T>},
+                         {"white unfade", zr::white_unfade_row<T>},
+                         {"grey fade", zr::grey_fade_row<T>},
+                         {"grey unfade", zr::grey_unfade_row<T>}}) {
     this->compare(one.name, [&](i32 n, T* s, T*, T* d) { one.row(n, s, d); });
     this->compare(one.name, [&](i32 n, T*, T*, T* d) { one.row(n, nullptr, d); });
     this->compare(one.name, [&](i32 n, T*, T*, T* d) { one.row(n - 1, d, d + 1); });

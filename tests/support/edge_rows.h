@@ -61,7 +61,7 @@ void fill_edgy(std::mt19937& random, i32 n, T* row) {
   const auto channel = [&]() -> zr::Channel<T> {
     const u32 word = static_cast<u32>(random());
     if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
-      constexpr f32 edges[] = {0,       1,    0.5f, -0.0f, 1e-40f,    -0.25f,    1.5f,
+      constexpr f32 edges[] = {0,      1,     0.5f, -0.0f, 1e-40f,   -0.25f,    1.5f,
                                1e-17f, 1e30f, 2,    NAN,   INFINITY, -INFINITY, 0.99999994f};
       return (word & 3) == 0 ? edges[(word >> 2) % std::size(edges)] : static_cast<f32>(word >> 8) * 0x1p-24f;
     } else {

@@ -19,7 +19,9 @@
 namespace {
 
 using Random = std::mt19937;
-i32 pick(Random& random, i32 low, i32 high) { return low + static_cast<i32>(random() % static_cast<u32>(high - low + 1)); }
+i32 pick(Random& random, i32 low, i32 high) {
+  return low + static_cast<i32>(random() % static_cast<u32>(high - low + 1));
+}
 
 GX_Matrix3 placed(f64 degrees, f64 scale, f64 x, f64 y) {
   const f64 a = degrees * 0.017453292519943295, c = scale * std::cos(a), s = scale * std::sin(a);
@@ -110,7 +112,8 @@ TEST_P(Bands, CompositesAreThoseOfOneCall) {
   Random random(11);
   each_mode_and_depth([&]<class T>(i32 xfer) {
     const i32 width = pick(random, 120, 400);
-    Drawing<T> drawing(width + pick(random, -9, 9), 120000 / width, width, 120000 / width + 41, static_cast<u32>(random()));
+    Drawing<T> drawing(width + pick(random, -9, 9), 120000 / width, width, 120000 / width + 41,
+                       static_cast<u32>(random()));
     vary(drawing, xfer, random);
     drawing.rect = {pick(random, -5, 9), pick(random, -5, 9), 5000, 5000};
     drawing.dest_x = pick(random, -7, 7), drawing.dest_y = pick(random, 0, 40);
@@ -180,11 +183,10 @@ TEST_P(Bands, ReturnsTheCodeOfTheTopmostBandThatFails) {
   static std::atomic<i32> calls;
   body = zr::slot<ZR_Slot_transfer_rect_plus>();
   calls = 0;
-  zr::TransferRectPlusFunc* const fails_below = [](const ZR_ProgressInfo* progress, i32 quality, u32 flags, i32 field,
-                                                   const GX_LRect* rect, ZR_LayerDef* src,
-                                                   const ZR_CompositeModePlus* mode,
-                                                   const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
-                                                   void* scratch[10], i32 x, i32 y, ZR_LayerDef* dst) -> i32 {
+  zr::TransferRectPlusFunc* const fails_below =
+      [](const ZR_ProgressInfo* progress, i32 quality, u32 flags, i32 field, const GX_LRect* rect, ZR_LayerDef* src,
+         const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
+         void* scratch[10], i32 x, i32 y, ZR_LayerDef* dst) -> i32 {
     ++calls;
     if (y >= 700) return 10000 + y;
     return body(progress, quality, flags, field, rect, src, mode, tables, mask, scratch, x, y, dst);

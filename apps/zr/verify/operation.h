@@ -1,0 +1,48 @@
+// What `zr verify` repeats: operations by name and depth, each with fixed inputs.
+#pragma once
+
+#include <functional>
+#include <string>
+#include <vector>
+
+#include "verify/digest.h"
+#include "verify/pictures.h"
+
+namespace zr::tool {
+
+struct Operation {
+  std::string name;  // "transfer/screen"; what stands before the '/' names the group
+  i32 depth;         // 8, 16 or 32, of what the operation reads
+  // Puts the results into the digest. Any thread count, any instruction set; nothing is left behind.
+  std::function<void(Digest&)> run;
+};
+using Operations = std::vector<Operation>;
+
+// Adds `body.template operator()<Pixel>(Digest&)` for each of the pixels.
+template <class... Pixels, class Body>
+void add_for(Operations& list, const std::string& name, Body body) {
+  (list.push_back({name, static_cast<i32>(Depth<Pixels>::bits),
+                   [body](Digest& digest) { body.template operator()<Pixels>(digest); }}),
+   ...);
+}
+template <class Body>
+void add_all(Operations& list, const std::string& name, Body body) {
+  add_for<ZR_Pixel8, ZR_Pixel16, ZR_PixelFloat>(list, name, body);
+}
+template <class Body>
+void add_8_and_16(Operations& list, const std::string& name, Body body) {
+  add_for<ZR_Pixel8, ZR_Pixel16>(list, name, body);
+}
+
+// The entries of one file each.
+void add_world_operations(Operations& list);
+void add_row_operations(Operations& list);
+void add_transfer_operations(Operations& list);
+void add_sample_operations(Operations& list);
+void add_copy_operations(Operations& list);
+void add_transform_operations(Operations& list);
+
+// All of them, by name, then depth.
+const Operations& all_operations();
+
+}  // namespace zr::tool

@@ -1,0 +1,113 @@
+// Fill, clear, copies and conversions of whole worlds.
+#include <ZR/linear_tables.h>
+
+#include "verify/depth_calls.h"
+#include "verify/operation.h"
+
+namespace zr::tool {
+namespace {
+
+// Short and long, at every place within a vector, and some that reach outside.
+constexpr GX_LRect kRects[] = {{0, 0, 1, 1},   {1, 1, 4, 2},    {3, 2, 11, 4},      {5, 4, 22, 6},    {7, 6, 71, 8},
+                               {2, 8, 131, 9}, {-5, 9, 40, 11}, {100, 10, 150, 12}, {64, 12, 65, 30}, {9, 13, 9, 15}};
+
+template <class T>
+T half_orange() {
+  return convert_colour<T>(ZR_PixelFloat{0.5f, 0.9f, 0.4f, 0.1f});
+}
+
+template <class From, class To>
+void add_conversion(Operations& list, const char* name, bool dither) {
+  list.push_back({name, Depth<From>::bits, [dither](Digest& digest) {
+                    Picture<From> src(odd_width, 25, Content::mixed, 11);
+                    Picture<To> dst(odd_width, 25, Content::untouched);
+                    ZR_ResetDitherRandomIndex();
+                    dst->CopyRectPossiblyDifferentBitdepth(&src, src.all(), dither, 0, 0, nullptr);
+                    for (const GX_LRect& rect : kRects)  // most of these begin where no vector does
+                      dst->CopyRectPossiblyDifferentBitdepth(&src, rect, dither, rect.top, rect.left / 5, nullptr);
+                    for (const i32 field : {0, 1, 2})
+                      if (dither) dst->CopyRectPossiblyDifferentBitdepthWithField(&src, kRects[4], field);
+                    dst.digest(digest);
+                  }});
+}
+
+template <class From, class To>
+void add_linear_conversion(Operations& list, const char* name) {
+  list.push_back({name, Depth<From>::bits, [](Digest& digest) {
+                    Picture<From> src(odd_width, 43, Content::mixed, 12);
+                    Picture<To> dst(odd_width, 43, Content::untouched);
+                    ZR_DepthConvertWorld(square_tables().to_linear, &src, &dst);
+                    dst.digest(digest);
+                  }});
+}
+
+template <class To>
+void add_conversions_to(Operations& list, const char* plain, const char* linear) {
+  add_conversion<ZR_Pixel8, To>(list, plain, false);
+  add_conversion<ZR_Pixel16, To>(list, plain, false);
+  add_conversion<ZR_PixelFloat, To>(list, plain, false);
+  add_linear_conversion<ZR_Pixel8, To>(list, linear);
+  add_linear_conversion<ZR_Pixel16, To>(list, linear);
+  add_linear_conversion<ZR_PixelFloat, To>(list, linear);
+}
+
+}  // namespace
+
+void add_world_operations(Operations& list) {
+  add_all(list, "fill", []<class T>(Digest& digest) {
+    Picture<T> world(odd_width, 25, Content::mixed);
+    const T colour = half_orange<T>();
+    for (const GX_LRect& rect : kRects)
+      digest.number(pick<T>(&ZR_Fill, &ZR_Fill16, &ZR_FillFloat)(nullptr, &colour, &rect, &world));
+    world->Fill(ZR_PixelFloat{1.0f, 0.25f, 0.75f, 2.0f}, &kRects[3]);
+    world.digest(digest);
+    digest.number(pick<T>(&ZR_Fill, &ZR_Fill16, &ZR_FillFloat)(nullptr, &colour, nullptr, &world));
+    world.digest(digest);
+  });
+  add_all(list, "clear", []<class T>(Digest& digest) {
+    Picture<T> world(odd_width, 25, Content::noise);
+    for (const GX_LRect& rect : kRects) world->Clear(&rect);
+    world.digest(digest);
+    world->Clear(nullptr);
+    world.digest(digest);
+  });
+  add_all(list, "clear-outside", []<class T>(Digest& digest) {
+    for (const GX_LRect& rect : kRects) {
+      Picture<T> world(odd_width, 25, Content::noise);
+      world->ClearExceptRect(rect);
+      world.digest(digest);
+    }
+  });
+  add_all(list, "clear-alpha-outside", []<class T>(Digest& digest) {
+    for (const GX_LRect& rect : kRects) {
+      Picture<T> world(odd_width, 25, Content::noise);
+      digest.number(ZR_ClearAlphaExceptRect(nullptr, &rect, &world));
+      world.digest(digest);
+    }
+  });
+  add_all(list, "fill-alpha", []<class T>(Digest& digest) {
+    Picture<T> world(odd_width, 9, Content::mixed);
+    world->FillAlpha();
+    world.digest(digest);
+  });
+  add_all(list, "invert-alpha", []<class T>(Digest& digest) {
+    Picture<T> world(odd_width, 25, Content::mixed);
+    world->InvertAlpha();
+    world.digest(digest);
+  });
+  add_all(list, "copy", []<class T>(Digest& digest) {
+    Picture<T> src(odd_width, 25, Content::mixed, 2), dst(odd_width, 25, Content::noise, 3);
+    for (const GX_LRect& rect : kRects) dst->CopyRect(&src, rect, rect.top, rect.left);
+    for (const GX_LRect& rect : kRects) dst->CopyRect(&dst, rect, rect.left + 3, rect.top + 1);
+    dst.digest(digest);
+    dst->CopyWorld(&src);
+    dst.digest(digest);
+  });
+  add_conversions_to<ZR_Pixel8>(list, "convert-to-8", "depth-convert-to-8");
+  add_conversions_to<ZR_Pixel16>(list, "convert-to-16", "depth-convert-to-16");
+  add_conversions_to<ZR_PixelFloat>(list, "convert-to-float", "depth-convert-to-float");
+  add_conversion<ZR_Pixel16, ZR_Pixel8>(list, "convert-to-8-dithered", true);
+  add_conversion<ZR_PixelFloat, ZR_Pixel8>(list, "convert-to-8-dithered", true);
+}
+
+}  // namespace zr::tool
