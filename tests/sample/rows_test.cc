@@ -88,6 +88,31 @@ constexpr Line lines[] = {{0x4321, 0x1234, 0xb3a1, 0x6789}, {0x8000, 0, 0x10000,
                           {0, 0, 0x8000, 0x4000},           {0xffff, 0xffff, 1, 0x5fff}, {0x8000, 0x8000, 0, 0},
                           {0, 0, 0x10000, 0x8000},          {0x0f00, 0x71, 0x20000, 3}};
 
+std::string text_of(const zr::SampleRun& run, size_t i) {
+  return "pixel " + std::to_string(i) + " of " + std::to_string(run.count) + " from " + std::to_string(run.x) + ',' +
+         std::to_string(run.y) + " by " + std::to_string(run.step_x) + ',' + std::to_string(run.step_y);
+}
+
+// Returns what one pixel after the other gives for what the row function has done, and a pixel behind it.
+template <class T>
+std::vector<T> compare_run(zr::LaneRowFunc<T>* row, zr::SampleFunc<T>* single, const zr::SampleRun& run,
+                           const ZR_SampPB& params) {
+  std::vector<T> got(static_cast<size_t>(run.count) + 1, T{7, 7, 7, 7}), expected = got;
+  zr::RowSum<T> sum = 5, expected_sum = 5;
+  const i32 done = row != nullptr ? row(run, params, &sum, got.data()) : 0;
+  EXPECT_TRUE(done >= 0 && done <= run.count && (row == nullptr || run.count - done < 16));
+  for (i32 i = 0; i < done; ++i) {
+    T& one = expected[static_cast<size_t>(i)];
+    single(nullptr, run.x + i * run.step_x, run.y + i * run.step_y, &params, &one);
+    expected_sum += one.alpha;
+  }
+  [&] {
+    for (size_t i = 0; i < got.size(); ++i) ASSERT_TRUE(same_pixel(got[i], expected[i])) << text_of(run, i);
+    ASSERT_TRUE(sum == expected_sum || sum != sum) << text_of(run, 0);
+  }();
+  return expected;
+}
+
 template <class T>
 void compare(ZR_LayerDef* layer, i32 quality, const Line& line, bool backwards, i32 count) {
   ZR_SampPB params{};
@@ -104,24 +129,8 @@ void compare(ZR_LayerDef* layer, i32 quality, const Line& line, bool backwards, 
     run.x = last(run.x, run.step_x) + (room_x & ~0xffff), run.step_x = -run.step_x;
     run.y = last(run.y, run.step_y) + (room_y & ~0xffff), run.step_y = -run.step_y;
   }
-  const T mark = {7, 7, 7, 7};
-  std::vector<T> got(static_cast<size_t>(count) + 1, mark), expected = got;
-  zr::RowSum<T> sum = 5, expected_sum = 5;
-  auto* const inner = zr::no_clip_row(set);
-  const i32 done = inner != nullptr ? inner(run, params, &sum, got.data()) : 0;
-  ASSERT_TRUE(done >= 0 && done <= count && (inner == nullptr || count - done < 16));
-  for (i32 i = 0; i < done; ++i) {
-    T& one = expected[static_cast<size_t>(i)];
-    set.no_clipping(nullptr, run.x + i * run.step_x, run.y + i * run.step_y, &params, &one);
-    expected_sum += one.alpha;
-  }
-  const auto where = [&](size_t i) {
-    return testing::Message() << "q" << quality << " pixel " << i << " of " << count << " line " << line.step_x << ','
-                              << line.step_y << (backwards ? " backwards" : "");
-  };
-  for (size_t i = 0; i < got.size(); ++i) ASSERT_TRUE(same_pixel(got[i], expected[i])) << where(i);
-  ASSERT_TRUE(sum == expected_sum || sum != sum) << where(0);
-
+  std::vector<T> expected = compare_run(zr::no_clip_row(set), set.no_clipping, run, params);
+  if (testing::Test::HasFatalFailure()) return;
   if (run.step_x != 0x10000 || run.step_y != 0) return;
   zr::AlphaSum<T> span_sum = 5, one_by_one = 5;
   std::vector<T> span = expected;
@@ -130,8 +139,26 @@ void compare(ZR_LayerDef* layer, i32 quality, const Line& line, bool backwards, 
     T& one = expected[static_cast<size_t>(i)];
     set.span(nullptr, 1, run.x + (i << 16), run.y, &params, &one_by_one, &one);
   }
-  for (size_t i = 0; i < span.size(); ++i) ASSERT_TRUE(same_pixel(span[i], expected[i])) << "span " << where(i);
-  ASSERT_TRUE(span_sum == one_by_one || span_sum != span_sum) << where(0);
+  for (size_t i = 0; i < span.size(); ++i) ASSERT_TRUE(same_pixel(span[i], expected[i])) << text_of(run, i);
+  ASSERT_TRUE(span_sum == one_by_one || span_sum != span_sum) << text_of(run, 0);
+}
+
+struct Box {
+  i32 x_radius, y_radius, step_x, y;
+};
+constexpr Box boxes[] = {{0x159a3, 0x13333, 0x2b347, 0x95678}, {0x10000, 0x10000, 0x20000, 0x98000},
+                         {0x8001, 0x58000, 0x4321, 0},         {0x38000, 0x8001, -0x10001, 40 << 16},
+                         {0x1c000, 0x20000, 0, 0x11111},       {0x10000, 0x10000, -0x20000, -100 << 16}};
+
+template <class T>
+void compare_boxes(ZR_LayerDef* layer, const Box& box, i32 start, i32 count) {
+  ZR_SampPB params{};
+  params.src = layer, params.x_radius = box.x_radius, params.y_radius = box.y_radius;
+  const auto set = zr::sample_functions<T>(1);
+  zr::SampleRun run = {count, start, box.y, box.step_x, 0};
+  const zr::PixelRange inside = zr::boxes_inside(run, params);
+  run.x += inside.first * run.step_x, run.count = inside.end - inside.first;
+  compare_run(zr::box_row(set), set.area, run, params);
 }
 
 TEST_F(BornLibrary, SampledRowsEqualSinglePixels) {
@@ -150,6 +177,12 @@ TEST_F(BornLibrary, SampledRowsEqualSinglePixels) {
                 compare<T>(world.layer(), quality, line, backwards, count);
                 if (testing::Test::HasFatalFailure()) return;
               }
+        for (const Box& box : boxes)
+          for (i32 count = 1; count <= 70; ++count) {
+            const i32 from = static_cast<i32>(random() % 0x80000) - 0x40000;
+            compare_boxes<T>(world.layer(), box, box.step_x < 0 ? (EdgeWorld<T>::width << 16) - from : from, count);
+            if (testing::Test::HasFatalFailure()) return;
+          }
       }
     }
   });

@@ -82,9 +82,10 @@ inline bool takes_area(const ZR_SampPB& params) { return params.x_radius > 32768
 // The samplers of a quality, and what runs in place of them along rows.
 template <class T>
 struct RowFunctions : SampleFunctions<T> {
-  LaneRowFunc<T>* inner;  // may be null
+  LaneRowFunc<T>*inner, *inner_boxes;  // may be null
 
-  explicit RowFunctions(const SampleFunctions<T>& set) : SampleFunctions<T>(set), inner(no_clip_row(set)) {}
+  explicit RowFunctions(const SampleFunctions<T>& set)
+      : SampleFunctions<T>(set), inner(no_clip_row(set)), inner_boxes(box_row(set)) {}
 };
 
 // One row by the samplers of a quality.
@@ -102,8 +103,16 @@ i32 sample_best_row(const RowFunctions<T>& samplers, const ZR_SampPB& params, co
       total += row[i].alpha;
     }
   };
+  const auto run = [&](i32 first, i32 end) {
+    return SampleRun{end - first, x_at(first), y_at(first), walk.step_x, walk.step_y};
+  };
   if (takes_area(params)) {
-    each(samplers.area, 0, count);
+    PixelRange boxes = {0, 0};
+    if (samplers.inner_boxes != nullptr && walk.straight(count)) boxes = boxes_inside(run(0, count), params);
+    each(samplers.area, 0, boxes.first);
+    if (boxes.first < boxes.end)
+      boxes.first += samplers.inner_boxes(run(boxes.first, boxes.end), params, &total, row + boxes.first);
+    each(samplers.area, boxes.first, count);
   } else if (!walk.straight(count)) {
     each(samplers.clipping, 0, count);
   } else {
@@ -122,8 +131,7 @@ i32 sample_best_row(const RowFunctions<T>& samplers, const ZR_SampPB& params, co
       total += span_sum;
     } else {
       if (samplers.inner != nullptr && first < end)
-        first += samplers.inner({end - first, x_at(first), y_at(first), walk.step_x, walk.step_y}, params, &total,
-                                row + first);
+        first += samplers.inner(run(first, end), params, &total, row + first);
       each(samplers.no_clipping, first, end);
     }
   }

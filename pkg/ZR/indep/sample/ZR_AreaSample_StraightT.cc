@@ -62,6 +62,21 @@ T mean_of(const Lanes<f64>& sum, const ZR_SampPB& params) {
 
 }  // namespace
 
+PixelRange boxes_inside(const SampleRun& run, const ZR_SampPB& params) {
+  const ZR_LayerDef& src = *params.src;
+  const i64 end = (std::min(src.width, 32767) - i64{1}) * 65536;
+  const auto inside = [&](i32 i) {
+    const i64 x = run.x + static_cast<i64>(i) * run.step_x + 32768;
+    return x >= params.x_radius && x + params.x_radius <= end;
+  };
+  PixelRange range = {0, run.count};
+  if (src.data == nullptr || run.step_y != 0 || params.x_radius <= half_a_pixel || params.y_radius <= half_a_pixel)
+    return {0, 0};
+  while (range.first < range.end && !inside(range.first)) ++range.first;
+  while (range.end > range.first && !inside(range.end - 1)) --range.end;
+  return range;
+}
+
 template <class T, i32 quality>
 i32 area_sample(const ZR_ProgressInfo* progress, i32 x, i32 y, const ZR_SampPB* params, T* dst) {
   const bool thin = params->x_radius <= half_a_pixel || params->y_radius <= half_a_pixel;

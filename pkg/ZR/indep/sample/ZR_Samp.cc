@@ -78,6 +78,14 @@ LaneRowFunc<T>* no_clip_row(const SampleFunctions<T>& samplers) {
   if (samplers.no_clipping == Own<T>::bicubic) rows = lane_bicubic_rows<T>();
   return rows != nullptr ? rows->no_clip : nullptr;
 }
+template <class T>
+LaneRowFunc<T>* box_row(const SampleFunctions<T>& samplers) {
+  const bool own = samplers.area == &ZR_AreaSample_CPlusPlus<T, 1> || samplers.area == &ZR_AreaSample_CPlusPlus<T, 2>;
+  return own ? lane_box_row<T>() : nullptr;
+}
+template LaneRowFunc<ZR_Pixel8>* box_row(const SampleFunctions<ZR_Pixel8>&);
+template LaneRowFunc<ZR_Pixel16>* box_row(const SampleFunctions<ZR_Pixel16>&);
+template LaneRowFunc<ZR_PixelFloat>* box_row(const SampleFunctions<ZR_PixelFloat>&);
 template LaneRowFunc<ZR_Pixel8>* no_clip_row(const SampleFunctions<ZR_Pixel8>&);
 template LaneRowFunc<ZR_Pixel16>* no_clip_row(const SampleFunctions<ZR_Pixel16>&);
 template LaneRowFunc<ZR_PixelFloat>* no_clip_row(const SampleFunctions<ZR_PixelFloat>&);

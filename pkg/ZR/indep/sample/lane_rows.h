@@ -35,4 +35,15 @@ const LaneRows<T>* lane_bilinear_rows();
 template <class T>
 const LaneRows<T>* lane_bicubic_rows();
 
+// Box means of steps along a row of the source (step_y is 0), for boxes of more than a pixel both ways that
+// boxes_inside() has let pass.
+template <class T>
+LaneRowFunc<T>* lane_box_row();
+
+struct PixelRange {
+  i32 first, end;
+};
+// The pixels of a run along a row whose boxes, and a pixel more, lie between the world's left and right edge.
+PixelRange boxes_inside(const SampleRun& run, const ZR_SampPB& params);
+
 }  // namespace zr

@@ -157,6 +157,54 @@ HWY_INLINE void gather_blocks(const char* base, const i64* offsets, Ints (&words
   words[3] = hn::InterleaveUpper(d, even_high, odd_high);
 }
 
+// The two words of 8 bytes at base + offset for each lane; offsets of the lower and the upper half.
+template <class Offsets>
+HWY_INLINE void gather_pairs(const char* base, Offsets low_offsets, Offsets high_offsets, Ints* first, Ints* second) {
+  const hn::Rebind<i64, Tag<f64>> d;
+  const Tag<i32> words;
+  const i64* const pairs = reinterpret_cast<const i64*>(base);
+  const auto low = hn::BitCast(words, hn::GatherOffset(d, pairs, low_offsets));
+  const auto high = hn::BitCast(words, hn::GatherOffset(d, pairs, high_offsets));
+  *first = hn::ConcatEven(words, high, low);
+  *second = hn::ConcatOdd(words, high, low);
+}
+
+// One pixel of a row for each lane, `column` and so many to the right.
+template <class T>
+class Columns {
+ public:
+  explicit HWY_INLINE Columns(Ints column) {
+    const HalfInts half;
+    const hn::Rebind<i64, Tag<f64>> d;
+    index_ = column;
+    if constexpr (sizeof(T) != 4) {
+      constexpr int shift = sizeof(T) == 8 ? 3 : 4;
+      low_ = hn::ShiftLeft<shift>(hn::PromoteTo(d, hn::LowerHalf(half, column.v)));
+      high_ = hn::ShiftLeft<shift>(hn::PromoteTo(d, hn::UpperHalf(half, column.v)));
+      hn::Store(low_, d, offsets_);
+      hn::Store(high_, d, offsets_ + lane_count() / 2);
+    }
+  }
+  HWY_INLINE Raw<T> at(const char* row, i32 k) const {
+    const char* const base = row + static_cast<std::ptrdiff_t>(k) * i32{sizeof(T)};
+    const Tag<i32> d;
+    Raw<T> p;
+    if constexpr (sizeof(T) == 4) {
+      p.w[0] = hn::GatherIndex(d, reinterpret_cast<const i32*>(base), index_.v);
+    } else if constexpr (sizeof(T) == 8) {
+      gather_pairs(base, low_, high_, &p.w[0], &p.w[1]);
+    } else {
+      gather_blocks(base, offsets_, p.w);
+    }
+    return p;
+  }
+
+ private:
+  Ints index_;
+  hn::Vec<hn::Rebind<i64, Tag<f64>>> low_, high_;
+  alignas(64) i64 offsets_[lane_count()];
+};
+
 // Positions of a vector of pixels anywhere in the source.
 template <class T>
 class Scattered {
@@ -175,6 +223,7 @@ class Scattered {
     y_ = y_ + Ints(wrap_mul(step_y_, lane_count()));
     locate();
   }
+  HWY_INLINE Ints x() const { return x_; }
   HWY_INLINE Ints fraction_x() const { return masked(x_, 65535); }
   HWY_INLINE Ints fraction_y() const { return masked(y_, 65535); }
 
@@ -185,13 +234,7 @@ class Scattered {
     const char* const base =
         data_ + static_cast<std::ptrdiff_t>(dy) * row_bytes_ + static_cast<std::ptrdiff_t>(dx) * i32{sizeof(T)};
     if constexpr (count * words == 2) {
-      const hn::Rebind<i64, Tag<f64>> d;
-      const Tag<i32> di;
-      const i64* const pairs = reinterpret_cast<const i64*>(base);
-      const auto low = hn::BitCast(di, hn::GatherOffset(d, pairs, low_));
-      const auto high = hn::BitCast(di, hn::GatherOffset(d, pairs, high_));
-      p[0].w[0] = hn::ConcatEven(di, high, low);
-      p[1].w[0] = hn::ConcatOdd(di, high, low);
+      gather_pairs(base, low_, high_, &p[0].w[0], &p[1].w[0]);
     } else {
       for (i32 i = 0; i < count; i += 4 / words) {
         Ints block[4];
