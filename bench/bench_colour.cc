@@ -51,18 +51,18 @@ void linear_in_front(benchmark::State& state, Size size) {
 }
 
 template <class T>
-std::string colour_name(const Pair& pair, const char* detail) {
-  return std::string("colour/") + depth_name<T>() + "/" + pair.name + "/" + detail;
+std::string colour_name(const char* work, const Pair& pair) {
+  return std::string(work) + "/" + depth_name<T>() + "/" + pair.name;
 }
 
 const bool registered = [] {
   const Size size = sizes[0];
   each_depth([&]<class T>() {
     for (const Pair& pair : pairs) {
-      add(colour_name<T>(pair, "zr"), size,
+      add(colour_name<T>("colour", pair), size,
           [&pair](benchmark::State& state, Size s) { transform<T>(state, s, pair, false); });
       if (&pair != pairs) continue;
-      add(colour_name<T>(pair, "zr-with-alpha"), size,
+      add(colour_name<T>("colour-with-alpha", pair), size,
           [&pair](benchmark::State& state, Size s) { transform<T>(state, s, pair, true); });
     }
     add(std::string("linear-in-front/") + depth_name<T>() + "/translucent-over-opaque", size,

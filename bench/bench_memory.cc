@@ -1,5 +1,7 @@
 // Fill, clear, copies, depth conversion and premultiply, beside memset and memcpy over the same bytes.
-#include "workloads.h"
+#include <ZR/summed_area.h>
+
+#include "composites.h"
 
 namespace bench {
 namespace {
@@ -17,8 +19,36 @@ void add_conversion(Size size, bool dither) {
       });
 }
 
+// In place, so every pass starts from a fresh copy that is not timed.
+template <class T>
+void premultiply(benchmark::State& state, Size size, Layer layer, bool forward) {
+  const auto kept = make_world<T>(size, layer), dst = make_world<T>(size, layer);
+  if (!forward) ZR_Premul(nullptr, 1, kept.get());
+  for (auto _ : state) {
+    put_back(state, *dst, *kept);
+    ZR_Premul(nullptr, forward, dst.get());
+  }
+  count_bytes<T>(state, size, 2);
+}
+
+void look_up(benchmark::State& state, Size size) {
+  const auto src = make_world<ZR_Pixel8>(size, Layer::translucent), dst = make_world<ZR_Pixel8>(size, Layer::opaque);
+  u8 table[256];
+  for (i32 i = 0; i < 256; ++i) table[i] = static_cast<u8>(255 - i);
+  for (auto _ : state) ZR_IterateLUT(nullptr, 0, 0, src.get(), nullptr, table, table, table, table, dst.get());
+  count_bytes<ZR_Pixel8>(state, size, 2);
+}
+
+template <class T>
+void sum_areas(benchmark::State& state, Size size) {
+  const auto src = make_world<T>(size, Layer::translucent);
+  for (auto _ : state) benchmark::DoNotOptimize(ZR_SummedAreaTable(src.get(), false).Width());
+  count_bytes<T>(state, size, 1);
+}
+
 const bool registered = [] {
   for (const Size size : sizes) {
+    add("look-up/8", size, look_up);
     each_depth([&]<class T>() {
       const std::string depth = depth_name<T>();
       add("memset/" + depth, size, [](benchmark::State& state, Size s) {
@@ -55,16 +85,13 @@ const bool registered = [] {
         for (auto _ : state) dst->Clear(nullptr);
         count_bytes<T>(state, s, 1);
       });
-      add("premul/" + depth, size, [](benchmark::State& state, Size s) {
-        const auto dst = make_world<T>(s, Layer::translucent);
-        for (auto _ : state) ZR_Premul(nullptr, 1, dst.get());
-        count_bytes<T>(state, s, 2);
-      });
-      add("unmul/" + depth, size, [](benchmark::State& state, Size s) {
-        const auto dst = make_world<T>(s, Layer::translucent);
-        for (auto _ : state) ZR_Premul(nullptr, 0, dst.get());
-        count_bytes<T>(state, s, 2);
-      });
+      for (const Layer layer : layers) {
+        add("premul/" + depth + "/" + name_of(layer), size,
+            [layer](benchmark::State& state, Size s) { premultiply<T>(state, s, layer, true); });
+        add("unmul/" + depth + "/" + name_of(layer), size,
+            [layer](benchmark::State& state, Size s) { premultiply<T>(state, s, layer, false); });
+      }
+      add("summed-area/" + depth, size, [](benchmark::State& state, Size s) { sum_areas<T>(state, s); });
       add("allocate/" + depth, size, [](benchmark::State& state, Size s) {
         for (auto _ : state) {
           ZR_LayerDef layer;
