@@ -4,6 +4,7 @@
 #include <cmath>
 #include <memory>
 
+#include <ZR/hostkit.h>
 #include <ZR/transfer_mode.h>
 #include <ZR/transform_world.h>
 
@@ -173,8 +174,8 @@ OwnedWorld transformed(OwnedWorld& picture, const Request& request) {
     check(ZR_FillFloat(nullptr, &*request.background, nullptr, result.layer()), "transform: --background");
   const ZR_CompositeModePlus mode(request.background ? XferInFront : XferCopy, 1.0f, nullptr, false, 0);
   const GX_LRect all = result.bounds();
-  check(ZR_TransformWorld(&abort_on_interrupt(), request.quality, 0, 0, picture.layer(), &mode, nullptr, nullptr,
-                          &matrix, 1, true, &all, result.layer()),
+  check(ZRHost_TransformWorld(&abort_on_interrupt(), request.quality, 0, 0, picture.layer(), &mode, nullptr, nullptr,
+                              &matrix, 1, true, &all, result.layer()),
         "transform");
   return result;
 }

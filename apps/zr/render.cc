@@ -1,6 +1,7 @@
 // Draws the frames of a scene through the library's layer transform.
 #include "render.h"
 
+#include <ZR/hostkit.h>
 #include <ZR/linear_tables.h>
 #include <ZR/transfer_mode.h>
 #include <ZR/transform_world.h>
@@ -28,8 +29,8 @@ void transform(OwnedWorld& source, const std::vector<GX_Matrix3>& matrices, i32 
                const ZR_CompositeModePlus& mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
                OwnedWorld& target, const std::string& what) {
   const GX_LRect all = target.bounds();
-  check(ZR_TransformWorld(&abort_on_interrupt(), quality, 0, field, source.layer(), &mode, tables, mask,
-                          matrices.data(), static_cast<i32>(matrices.size()), true, &all, target.layer()),
+  check(ZRHost_TransformWorld(&abort_on_interrupt(), quality, 0, field, source.layer(), &mode, tables, mask,
+                              matrices.data(), static_cast<i32>(matrices.size()), true, &all, target.layer()),
         what);
 }
 

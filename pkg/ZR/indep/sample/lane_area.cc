@@ -74,8 +74,8 @@ struct BoxSums {
     const Doubles alpha = lesser(sum[0] * 0.25 / quarter_area, white), inverse = Doubles(1.0) / sum[0];
     const auto colour = [&](i32 k) HWY_ATTR { return unless_zero(sum[0], sum[k] * inverse); };
     if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
-      return {{as_ints(narrowed(unless_zero(sum[0], alpha))), as_ints(narrowed(colour(1))), as_ints(narrowed(colour(2))),
-               as_ints(narrowed(colour(3)))}};
+      return {{as_ints(narrowed(unless_zero(sum[0], alpha))), as_ints(narrowed(colour(1))),
+               as_ints(narrowed(colour(2))), as_ints(narrowed(colour(3)))}};
     } else {
       const auto channel = [&](Doubles v) HWY_ATTR { return fitting_int(lesser(v + 0.5, white)); };
       return packed<T>(channel(alpha), channel(colour(1)), channel(colour(2)), channel(colour(3)));
@@ -95,9 +95,7 @@ struct LaneAxis {
         behind(masked(to, 65535)),
         whole_end(least_of(last)),
         end(most_of(last + pick(behind == 0, 0, 1))) {}
-  HWY_INLINE Ints width(i32 k) const {
-    return k == 0 ? before : pick(last > k, 0x10000, pick(last == k, behind, 0));
-  }
+  HWY_INLINE Ints width(i32 k) const { return k == 0 ? before : pick(last > k, 0x10000, pick(last == k, behind, 0)); }
 };
 
 template <class T>
