@@ -104,7 +104,7 @@ i32 box_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T
   BoxAxis down(run.y, params.y_radius);
   down.clip(src.height);
   const f64 quarter_area = (params.x_radius / 65536.0) * (params.y_radius / 65536.0);
-  return sample_vectors<T, Scattered<T>>(run, src, sum, dst, [&](const Scattered<T>& at) HWY_ATTR {
+  return sample_vectors<T, Scattered<T>>(run, src, sum, dst, [&](const Scattered<T>& at, T* out) HWY_ATTR {
     const LaneAxis across(at.x() - params.x_radius + 32768, at.x() + params.x_radius + 32768);
     const Columns<T> columns(across.first);
     BoxSums<T> sums;
@@ -132,7 +132,7 @@ i32 box_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T
       down.walk(row, [&](i32 first, i32 end) HWY_ATTR {
         for (i32 y = first; y < end; ++y) row(y, 0x10000u);
       });
-    return sums.mean(quarter_area);
+    return put(sums.mean(quarter_area), out);
   });
 }
 template LaneRowFunc<ZR_Pixel8> box_vectors<ZR_Pixel8>;

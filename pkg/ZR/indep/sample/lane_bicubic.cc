@@ -67,7 +67,7 @@ HWY_INLINE Raw<T> limited(const FloatPixels& p) {
 template <class T, class Neighbours, class Sum>
 i32 bicubic_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, T* dst) {
   const LaneCubicWeights phase_across(Ints(run.x & 0xffff)), phase_down(Ints(run.y & 0xffff));
-  return sample_vectors<T, Neighbours>(run, *params.src, sum, dst, [&](const Neighbours& at) HWY_ATTR {
+  return sample_vectors<T, Neighbours>(run, *params.src, sum, dst, [&](const Neighbours& at, T* out) HWY_ATTR {
     const LaneCubicWeights across = Neighbours::one_phase ? phase_across : LaneCubicWeights(at.fraction_x());
     FloatPixels rows[4];
     for (i32 j = 0; j < 4; ++j) {
@@ -80,7 +80,7 @@ i32 bicubic_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, T* 
       rows[j] = convolve(across.w, p);
     }
     const LaneCubicWeights down = Neighbours::one_phase ? phase_down : LaneCubicWeights(at.fraction_y());
-    return limited<T>(convolve(down.w, rows));
+    return put(limited<T>(convolve(down.w, rows)), out);
   });
 }
 

@@ -88,22 +88,58 @@ HWY_INLINE Raw<ZR_PixelFloat> float_mix(const Raw<ZR_PixelFloat> (&p)[4], const 
            colour(in_order<2>(a, p)), colour(in_order<3>(a, p))}};
 }
 
+// Where all alphas agree, pixels stay as they lie in memory: channels are pulled apart for the others only.
+template <int k>
+HWY_INLINE void put_blocks(const Ints (&v)[4][4], const LaneWeights<Floats>& weights, Bools<f32> first,
+                           ZR_PixelFloat* out) {
+  const auto weighted = [&](i32 i) HWY_ATTR { return Floats(hn::Broadcast<k>(weights.w[i].v)) * as_floats(v[i][k]); };
+  const Floats sum = ((weighted(0) + weighted(1)) + weighted(2)) + weighted(3);
+  store_blocks(Tag<f32>(), pick(first, as_floats(v[0][k]), sum).v, out + k);
+}
+HWY_INLINE Ints put_scattered_floats(const Scattered<ZR_PixelFloat>& at, const LaneWeights<Floats>& weights,
+                                     ZR_PixelFloat* out) {
+  Ints v[4][4];
+  for (i32 i = 0; i < 4; ++i) at.blocks(i & 1, i >> 1, v[i]);
+  const Ints place = hn::Iota(Tag<i32>(), 0);
+  const Bools<f32> first = {hn::RebindMask(Tag<f32>(), (masked(place, 3) == 0).mask)};
+  Bools<f32> equal = Floats(0.0f) == Floats(0.0f), one = equal;
+  for (i32 k = 0; k < 4; ++k) {
+    const Floats p = as_floats(v[0][k]);
+    equal = equal && p == as_floats(v[1][k]) && p == as_floats(v[2][k]) && p == as_floats(v[3][k]);
+    one = one && p == 1.0f;
+  }
+  if (all(equal || !first)) {
+    put_blocks<0>(v, weights, first, out);
+    put_blocks<1>(v, weights, first, out);
+    put_blocks<2>(v, weights, first, out);
+    put_blocks<3>(v, weights, first, out);
+    return as_ints(pick(one || !first, 1.0f, 0.0f));  // enough to tell whether all are 1
+  }
+  Raw<ZR_PixelFloat> p[4];
+  for (i32 i = 0; i < 4; ++i) transpose_blocks(v[i], p[i].w);
+  return put(float_mix(p, weights), out);
+}
+
 template <class T, class Neighbours, class Sum>
 i32 bilinear_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, T* dst) {
   using Real = std::conditional_t<std::is_same_v<T, ZR_Pixel16>, Doubles, Floats>;
   using Weights = LaneWeights<Real>;
   const Weights phase(run.x & 0xffff, run.y & 0xffff);
-  return sample_vectors<T, Neighbours>(run, *params.src, sum, dst, [&](const Neighbours& at) HWY_ATTR {
-    Raw<T> upper[2], lower[2];
-    at.row(0, 0, upper);
-    at.row(0, 1, lower);
-    const Raw<T> p[4] = {upper[0], upper[1], lower[0], lower[1]};
+  return sample_vectors<T, Neighbours>(run, *params.src, sum, dst, [&](const Neighbours& at, T* out) HWY_ATTR {
     const Weights weights = Neighbours::one_phase ? phase : Weights(at.fraction_x(), at.fraction_y());
-    if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
-      return float_mix(p, weights);
+    if constexpr (std::is_same_v<Neighbours, Scattered<ZR_PixelFloat>>) {
+      return put_scattered_floats(at, weights, out);
     } else {
-      const Bools<i32> whole = Neighbours::one_phase ? Ints(0) != Ints(0) : (at.fraction_x() | at.fraction_y()) == 0;
-      return integer_mix<T>(p, weights, whole);
+      Raw<T> upper[2], lower[2];
+      at.row(0, 0, upper);
+      at.row(0, 1, lower);
+      const Raw<T> p[4] = {upper[0], upper[1], lower[0], lower[1]};
+      if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
+        return put(float_mix(p, weights), out);
+      } else {
+        const Bools<i32> whole = Neighbours::one_phase ? Ints(0) != Ints(0) : (at.fraction_x() | at.fraction_y()) == 0;
+        return put(integer_mix<T>(p, weights, whole), out);
+      }
     }
   });
 }

@@ -144,17 +144,35 @@ HWY_INLINE hn::Vec<D> load_blocks(D d, const char* base, const i64* offsets) {
     return hn::Combine(d, load_blocks(half, base, offsets + hn::MaxLanes(half)), load_blocks(half, base, offsets));
   }
 }
-// The four words of 16 bytes at base + offsets[i] for each lane i.
-HWY_INLINE void gather_blocks(const char* base, const i64* offsets, Ints (&words)[4]) {
+// Four vectors of such blocks, those of lanes 4 * b + k in vector k, into one vector for each word.
+HWY_INLINE void transpose_blocks(const Ints (&v)[4], Ints (&words)[4]) {
   const Tag<i32> d;
-  const auto v0 = load_blocks(d, base, offsets), v1 = load_blocks(d, base, offsets + 1);
-  const auto v2 = load_blocks(d, base, offsets + 2), v3 = load_blocks(d, base, offsets + 3);
-  const auto even_low = hn::InterleaveLower(d, v0, v2), odd_low = hn::InterleaveLower(d, v1, v3);
-  const auto even_high = hn::InterleaveUpper(d, v0, v2), odd_high = hn::InterleaveUpper(d, v1, v3);
+  const auto even_low = hn::InterleaveLower(d, v[0].v, v[2].v), odd_low = hn::InterleaveLower(d, v[1].v, v[3].v);
+  const auto even_high = hn::InterleaveUpper(d, v[0].v, v[2].v), odd_high = hn::InterleaveUpper(d, v[1].v, v[3].v);
   words[0] = hn::InterleaveLower(d, even_low, odd_low);
   words[1] = hn::InterleaveUpper(d, even_low, odd_low);
   words[2] = hn::InterleaveLower(d, even_high, odd_high);
   words[3] = hn::InterleaveUpper(d, even_high, odd_high);
+}
+HWY_INLINE void load_all_blocks(const char* base, const i64* offsets, Ints (&v)[4]) {
+  for (i32 k = 0; k < 4; ++k) v[k] = load_blocks(Tag<i32>(), base, offsets + k);
+}
+// The four words of 16 bytes at base + offsets[i] for each lane i.
+HWY_INLINE void gather_blocks(const char* base, const i64* offsets, Ints (&words)[4]) {
+  Ints v[4];
+  load_all_blocks(base, offsets, v);
+  transpose_blocks(v, words);
+}
+// Block b to pixel 4 * b.
+template <class D>
+HWY_INLINE void store_blocks(D d, hn::Vec<D> v, ZR_PixelFloat* dst) {
+  if constexpr (hn::MaxLanes(D()) == 4) {
+    hn::StoreU(v, d, reinterpret_cast<f32*>(dst));
+  } else {
+    const hn::Half<D> half;
+    store_blocks(half, hn::LowerHalf(half, v), dst);
+    store_blocks(half, hn::UpperHalf(half, v), dst + hn::MaxLanes(half));
+  }
 }
 
 // The two words of 8 bytes at base + offset for each lane; offsets of the lower and the upper half.
@@ -231,8 +249,7 @@ class Scattered {
   template <i32 count>
   HWY_INLINE void row(i32 dx, i32 dy, Raw<T> (&p)[count]) const {
     constexpr i32 words = Raw<T>::words;
-    const char* const base =
-        data_ + static_cast<std::ptrdiff_t>(dy) * row_bytes_ + static_cast<std::ptrdiff_t>(dx) * i32{sizeof(T)};
+    const char* const base = neighbour(dx, dy);
     if constexpr (count * words == 2) {
       gather_pairs(base, low_, high_, &p[0].w[0], &p[1].w[0]);
     } else {
@@ -243,8 +260,13 @@ class Scattered {
       }
     }
   }
+  // One neighbour of each position as blocks.
+  HWY_INLINE void blocks(i32 dx, i32 dy, Ints (&v)[4]) const { load_all_blocks(neighbour(dx, dy), offsets_, v); }
 
  private:
+  HWY_INLINE const char* neighbour(i32 dx, i32 dy) const {
+    return data_ + static_cast<std::ptrdiff_t>(dy) * row_bytes_ + static_cast<std::ptrdiff_t>(dx) * i32{sizeof(T)};
+  }
   using Offsets = hn::Rebind<i64, Tag<f64>>;
 
   // Where each pixel lies from the first of the world, in bytes.
@@ -314,11 +336,19 @@ template <class T, class Sum>
 class AlphaSums {
  public:
   explicit HWY_INLINE AlphaSums(Sum* total) : total_(total), lanes_(0) {}
-  HWY_INLINE void add(const Raw<T>& p, const T* stored) {
+  HWY_INLINE void add(Ints alphas, const T* stored) {
     if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
-      for (i32 i = 0; i < lane_count(); ++i) *total_ += stored[i].alpha;
+      Sum total = *total_;
+      // Ones can be added together where all their sums are exact: a few bits of room and a short fraction.
+      constexpr Sum grid = std::is_same_v<Sum, f32> ? Sum{0x1.8p15f} : Sum{0x1.8p22};
+      if (all(as_floats(alphas) == 1.0f) && (total + grid) - grid == total && total < grid / 4) {
+        total += static_cast<Sum>(lane_count());
+      } else {
+        for (i32 i = 0; i < lane_count(); ++i) total += stored[i].alpha;
+      }
+      *total_ = total;
     } else {
-      lanes_ = lanes_ + channel_of<0>(p);
+      lanes_ = lanes_ + alphas;
       if (++vectors_ == 32768) flush();  // more would not fit
     }
   }
@@ -340,18 +370,27 @@ class AlphaSums {
   i32 vectors_ = 0;
 };
 
-// The whole vectors of a run: mix(neighbours) gives the pixels of one. Returns how many pixels that are.
-template <class T, class Neighbours, class Sum, class Mix>
-HWY_INLINE i32 sample_vectors(const SampleRun& run, const ZR_LayerDef& src, Sum* sum, T* dst, Mix mix) {
+// Stores pixels and gives their alphas back.
+template <class T>
+HWY_INLINE Ints put(const Raw<T>& p, T* dst) {
+  store(p, dst);
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+    return p.w[0];
+  else
+    return channel_of<0>(p);
+}
+
+// The whole vectors of a run: write(neighbours, dst) stores the pixels of one and returns their alphas. Returns how
+// many pixels that are.
+template <class T, class Neighbours, class Sum, class Write>
+HWY_INLINE i32 sample_vectors(const SampleRun& run, const ZR_LayerDef& src, Sum* sum, T* dst, Write write) {
   constexpr i32 lanes = lane_count();
   if (run.count < lanes) return 0;
   Neighbours at(run, src);
   AlphaSums<T, Sum> sums(sum);
   i32 i = 0;
   for (;;) {
-    const Raw<T> p = mix(at);
-    store(p, dst + i);
-    sums.add(p, dst + i);
+    sums.add(write(at, dst + i), dst + i);
     i += lanes;
     if (run.count - i < lanes) break;
     at.next();
