@@ -135,9 +135,17 @@ i32 box_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T
     return put(sums.mean(quarter_area), out);
   });
 }
-template LaneRowFunc<ZR_Pixel8> box_vectors<ZR_Pixel8>;
-template LaneRowFunc<ZR_Pixel16> box_vectors<ZR_Pixel16>;
-template LaneRowFunc<ZR_PixelFloat> box_vectors<ZR_PixelFloat>;
+
+template <class T>
+LaneRowFunc<T>* box_row() {
+  if constexpr (gains_from_lanes<T>)
+    return &box_vectors<T>;
+  else
+    return nullptr;
+}
+template LaneRowFunc<ZR_Pixel8>* box_row<ZR_Pixel8>();
+template LaneRowFunc<ZR_Pixel16>* box_row<ZR_Pixel16>();
+template LaneRowFunc<ZR_PixelFloat>* box_row<ZR_PixelFloat>();
 
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
@@ -151,7 +159,7 @@ namespace zr {
 
 template <class T>
 LaneRowFunc<T>* lane_box_row() {
-  ZR_RETURN_BEST(box_vectors<T>);
+  ZR_RETURN_BEST(box_row<T>());
   return nullptr;
 }
 template LaneRowFunc<ZR_Pixel8>* lane_box_row<ZR_Pixel8>();

@@ -86,8 +86,13 @@ i32 bicubic_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, T* 
 
 template <class T>
 const LaneRows<T>* bicubic_rows() {
-  static constexpr LaneRows<T> rows = {&bicubic_vectors<T, Scattered<T>, RowSum<T>>,
-                                       &bicubic_vectors<T, Adjacent<T>, AlphaSum<T>>};
+  static constexpr LaneRowFunc<T>* no_clip = [] {
+    if constexpr (gains_from_lanes<T>)
+      return &bicubic_vectors<T, Scattered<T>, RowSum<T>>;
+    else
+      return nullptr;
+  }();
+  static constexpr LaneRows<T> rows = {no_clip, &bicubic_vectors<T, Adjacent<T>, AlphaSum<T>>};
   return &rows;
 }
 template const LaneRows<ZR_Pixel8>* bicubic_rows<ZR_Pixel8>();

@@ -146,8 +146,13 @@ i32 bilinear_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, T*
 
 template <class T>
 const LaneRows<T>* bilinear_rows() {
-  static constexpr LaneRows<T> rows = {&bilinear_vectors<T, Scattered<T>, RowSum<T>>,
-                                       &bilinear_vectors<T, Adjacent<T>, AlphaSum<T>>};
+  static constexpr LaneRowFunc<T>* no_clip = [] {
+    if constexpr (gains_from_lanes<T>)
+      return &bilinear_vectors<T, Scattered<T>, RowSum<T>>;
+    else
+      return nullptr;
+  }();
+  static constexpr LaneRows<T> rows = {no_clip, &bilinear_vectors<T, Adjacent<T>, AlphaSum<T>>};
   return &rows;
 }
 template const LaneRows<ZR_Pixel8>* bilinear_rows<ZR_Pixel8>();

@@ -26,7 +26,7 @@ using LaneSpanFunc = i32(const SampleRun& run, const ZR_SampPB& params, AlphaSum
 
 template <class T>
 struct LaneRows {
-  LaneRowFunc<T>* no_clip;
+  LaneRowFunc<T>* no_clip;  // may be null
   LaneSpanFunc<T>* span;
 };
 // The fastest that this processor has, or null.

@@ -370,6 +370,11 @@ class AlphaSums {
   i32 vectors_ = 0;
 };
 
+// Scattered pixels of four floats fill a vector of four lanes each by itself: there single pixels are as fast or
+// faster.
+template <class T>
+inline constexpr bool gains_from_lanes = !std::is_same_v<T, ZR_PixelFloat> || lane_count() > 4;
+
 // Stores pixels and gives their alphas back.
 template <class T>
 HWY_INLINE Ints put(const Raw<T>& p, T* dst) {
