@@ -15,6 +15,8 @@ struct Operation {
   i32 depth;         // 8, 16 or 32, of what the operation reads
   // Puts the results into the digest. Any thread count, any instruction set; nothing is left behind.
   std::function<void(Digest&)> run;
+  // The rule itself asks for a processor with vectors: without them the result is another, and not compared.
+  bool vector_rule = false;
 };
 using Operations = std::vector<Operation>;
 

@@ -16,18 +16,46 @@ T half_orange() {
   return convert_colour<T>(ZR_PixelFloat{0.5f, 0.9f, 0.4f, 0.1f});
 }
 
+// A picture whose rows begin `shift` channels behind a multiple of 16 bytes, or of the size of a pixel.
+template <class T>
+class Shifted {
+ public:
+  Shifted(Picture<T>& picture, size_t shift)
+      : memory_(static_cast<size_t>(stride(picture)) * static_cast<size_t>(picture.height()) * 4 + 32),
+        world_(start(shift), picture.width(), picture.height(), stride(picture) * static_cast<i32>(sizeof(T))) {
+    world_.CopyWorld(&picture);
+  }
+  ZR_WorldX<T>* operator&() { return &world_; }
+
+ private:
+  static i32 stride(Picture<T>& picture) { return picture.width() + 2; }
+  void* start(size_t shift) {
+    const auto address = reinterpret_cast<uintptr_t>(memory_.data());
+    return memory_.data() + (16 - address % 16) % 16 / sizeof(Channel<T>) + shift;
+  }
+  std::vector<Channel<T>> memory_;
+  ZR_WorldX<T> world_;
+};
+
+struct Conversion {
+  bool dither = false;
+  std::vector<size_t> shifts = {0, 1};  // of the source rows
+};
 template <class From, class To>
-void add_conversion(Operations& list, const char* name, bool dither) {
-  list.push_back({name, Depth<From>::bits, [dither](Digest& digest) {
-                    Picture<From> src(odd_width, 25, Content::mixed, 11);
-                    Picture<To> dst(odd_width, 25, Content::untouched);
-                    ZR_ResetDitherRandomIndex();
-                    dst->CopyRectPossiblyDifferentBitdepth(&src, src.all(), dither, 0, 0, nullptr);
-                    for (const GX_LRect& rect : kRects)  // most of these begin where no vector does
-                      dst->CopyRectPossiblyDifferentBitdepth(&src, rect, dither, rect.top, rect.left / 5, nullptr);
-                    for (const i32 field : {0, 1, 2})
-                      if (dither) dst->CopyRectPossiblyDifferentBitdepthWithField(&src, kRects[4], field);
-                    dst.digest(digest);
+void add_conversion(Operations& list, const char* name, const Conversion& how) {
+  list.push_back({name, Depth<From>::bits, [how](Digest& digest) {
+                    Picture<From> picture(odd_width, 25, Content::mixed, 11);
+                    for (const size_t shift : how.shifts) {
+                      Shifted<From> src(picture, shift);
+                      Picture<To> dst(odd_width, 25, Content::untouched);
+                      dst->CopyRectPossiblyDifferentBitdepth(&src, picture.all(), how.dither, 0, 0, nullptr);
+                      for (const GX_LRect& rect : kRects)  // most of these begin where no vector does
+                        dst->CopyRectPossiblyDifferentBitdepth(&src, rect, how.dither, rect.top, rect.left / 5,
+                                                               nullptr);
+                      for (const i32 field : {0, 1, 2})
+                        if (how.dither) dst->CopyRectPossiblyDifferentBitdepthWithField(&src, kRects[4], field);
+                      dst.digest(digest);
+                    }
                   }});
 }
 
@@ -43,9 +71,13 @@ void add_linear_conversion(Operations& list, const char* name) {
 
 template <class To>
 void add_conversions_to(Operations& list, const char* plain, const char* linear) {
-  add_conversion<ZR_Pixel8, To>(list, plain, false);
-  add_conversion<ZR_Pixel16, To>(list, plain, false);
-  add_conversion<ZR_PixelFloat, To>(list, plain, false);
+  // Float rows to 8 bits that begin at a multiple of 16 have a rule of their own, see below.
+  if constexpr (std::is_same_v<To, ZR_Pixel8>)
+    add_conversion<ZR_PixelFloat, To>(list, plain, {.shifts = {1}});
+  else
+    add_conversion<ZR_PixelFloat, To>(list, plain, {});
+  add_conversion<ZR_Pixel8, To>(list, plain, {});
+  add_conversion<ZR_Pixel16, To>(list, plain, {});
   add_linear_conversion<ZR_Pixel8, To>(list, linear);
   add_linear_conversion<ZR_Pixel16, To>(list, linear);
   add_linear_conversion<ZR_PixelFloat, To>(list, linear);
@@ -106,8 +138,13 @@ void add_world_operations(Operations& list) {
   add_conversions_to<ZR_Pixel8>(list, "convert-to-8", "depth-convert-to-8");
   add_conversions_to<ZR_Pixel16>(list, "convert-to-16", "depth-convert-to-16");
   add_conversions_to<ZR_PixelFloat>(list, "convert-to-float", "depth-convert-to-float");
-  add_conversion<ZR_Pixel16, ZR_Pixel8>(list, "convert-to-8-dithered", true);
-  add_conversion<ZR_PixelFloat, ZR_Pixel8>(list, "convert-to-8-dithered", true);
+  add_conversion<ZR_Pixel16, ZR_Pixel8>(list, "convert-to-8-dithered", {.dither = true});
+  add_conversion<ZR_PixelFloat, ZR_Pixel8>(list, "convert-to-8-dithered", {.dither = true, .shifts = {1}});
+  for (const bool dither : {false, true}) {
+    add_conversion<ZR_PixelFloat, ZR_Pixel8>(list, dither ? "convert-to-8-dithered-aligned" : "convert-to-8-aligned",
+                                             {dither, {0}});
+    list.back().vector_rule = true;
+  }
 }
 
 }  // namespace zr::tool
