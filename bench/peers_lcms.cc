@@ -47,6 +47,7 @@ void plain(benchmark::State& state, Size size, const Pair& pair, u32 format, siz
 }
 
 const bool registered = [] {
+  if (!peers_wanted()) return false;
   each_depth([&]<class T>() {
     constexpr u32 bytes = sizeof(zr::Channel<T>), real = bytes == 4 ? FLOAT_SH(1) : 0;
     const struct {

@@ -47,6 +47,7 @@ void add_sampled(const Resize& work, Size size, bool interpolate) {
 }
 
 const bool registered = [] {
+  if (!peers_wanted()) return false;
   OIIO::attribute("threads", 1);
   for (const Size size : sizes)
     each_depth([&]<class T>() {

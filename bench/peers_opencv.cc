@@ -33,6 +33,7 @@ void add_resize(const Resize& work, Size size, int interpolation) {
 }
 
 const bool registered = [] {
+  if (!peers_wanted()) return false;
   cv::setNumThreads(1);
   for (const Size size : sizes)
     each_depth([&]<class T>() {

@@ -95,6 +95,7 @@ void look_up(benchmark::State& state, Size size) {
 }
 
 const bool registered = [] {
+  if (!peers_wanted()) return false;
   for (const Size size : sizes) {
     add("look-up/8/plain", size, look_up);
     each_depth([&]<class T>() {

@@ -5,17 +5,31 @@
 #include <benchmark/benchmark.h>
 
 #include <cmath>
+#include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <memory>
 #include <random>
 #include <string>
+#include <vector>
 
 namespace bench {
 
 struct Size {
   i32 width, height;
 };
-inline constexpr Size sizes[] = {{1920, 1080}, {256, 256}};
+// ZR_BENCH_SIZE=2048x1024 measures one size in place of the usual two. Widths are multiples of 16: no row padding.
+inline const std::vector<Size> sizes = [] {
+  Size size{};
+  const char* const wanted = std::getenv("ZR_BENCH_SIZE");
+  if (wanted != nullptr && std::sscanf(wanted, "%dx%d", &size.width, &size.height) == 2) return std::vector<Size>{size};
+  return std::vector<Size>{{1920, 1080}, {256, 256}};
+}();
+// ZR_BENCH_PEERS=0 leaves the peers out: runs with more threads do not need them again.
+inline bool peers_wanted() {
+  const char* const wanted = std::getenv("ZR_BENCH_PEERS");
+  return wanted == nullptr || std::strcmp(wanted, "0") != 0;
+}
 
 enum class Layer {
   opaque,       // alpha white everywhere
