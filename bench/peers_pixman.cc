@@ -1,60 +1,127 @@
-// pixman on premultiplied pixels of the same pictures, OVER and OVER through a matrix: less work than straight
+// pixman on premultiplied pixels of the same pictures, composites and OVER through a matrix: less work than straight
 // alpha, named so.
 #include <pixman.h>
 
-#include "placements.h"
-#include "workloads.h"
+#include <algorithm>
+
+#include "composites.h"
+#include "peer_check.h"
 
 namespace bench {
 namespace {
 
+// Puts alpha last, where pixman has it in float.
+void turn(ZR_WorldX<ZR_PixelFloat>& world, bool back) {
+  for (i32 y = 0; y < world.height; ++y)
+    for (i32 x = 0; x < world.width; ++x) {
+      f32* const p = &world.At(x, y)->alpha;
+      back ? std::rotate(p, p + 3, p + 4) : std::rotate(p, p + 1, p + 4);
+    }
+}
+void turn(ZR_WorldX<ZR_Pixel8>&, bool) {}
+
 // 8-bit pixels in memory order alpha, red, green, blue are big-endian ARGB words.
-pixman_image_t* image_of(ZR_World& world) {
-  return pixman_image_create_bits(PIXMAN_b8g8r8a8, world.width, world.height, static_cast<u32*>(world.data),
-                                  world.row_bytes);
+template <class T>
+pixman_image_t* image_of(ZR_WorldX<T>& world) {
+  return pixman_image_create_bits(sizeof(T) == 4 ? PIXMAN_b8g8r8a8 : PIXMAN_rgba_float, world.width, world.height,
+                                  static_cast<u32*>(world.data), world.row_bytes);
+}
+
+pixman_op_t operator_of(i32 xfer) {
+  switch (xfer) {
+    case XferInFront: return PIXMAN_OP_OVER;
+    case XferMultiply: return PIXMAN_OP_MULTIPLY;
+    case XferScreen: return PIXMAN_OP_SCREEN;
+    case XferOverlay: return PIXMAN_OP_OVERLAY;
+    case XferSoftLight: return PIXMAN_OP_SOFT_LIGHT;
+    case XferHardLight: return PIXMAN_OP_HARD_LIGHT;
+    case XferHue: return PIXMAN_OP_HSL_HUE;
+    case XferSaturation: return PIXMAN_OP_HSL_SATURATION;
+    case XferColor: return PIXMAN_OP_HSL_COLOR;
+    case XferLuminosity: return PIXMAN_OP_HSL_LUMINOSITY;
+    default: return PIXMAN_OP_CLEAR;  // no such operator
+  }
+}
+
+template <class T>
+void composite(benchmark::State& state, Size size, const Composite& work) {
+  CompositePictures<T> ours(work, size), theirs(work, size);
+  run_ours(work, ours);
+  ZR_Premul(nullptr, 1, ours.dst.get());
+  for (const auto& world : {&theirs.src, &theirs.dst, &theirs.kept}) {
+    ZR_Premul(nullptr, 1, world->get());
+    turn(**world, false);
+  }
+  turn(*theirs.mask_world, false);
+  pixman_image_t* const from = image_of(*theirs.src);
+  pixman_image_t* const mask = work.masked ? image_of(*theirs.mask_world) : nullptr;
+  pixman_image_t* const to = image_of(*theirs.dst);
+  const auto run = [&] {
+    pixman_image_composite32(operator_of(work.xfer), from, mask, to, 0, 0, 0, 0, 0, 0, size.width, size.height);
+  };
+  run();
+  const auto seen = make_world<T>(size, Layer::opaque);
+  seen->CopyWorld(theirs.dst.get());
+  turn(*seen, true);
+  if (agrees(*ours.dst, *seen)) {
+    for (auto _ : state) {
+      put_back(state, *theirs.dst, *theirs.kept);
+      run();
+    }
+    count_bytes<T>(state, size, 3);
+  } else {
+    state.SkipWithError("the peer's picture is not ours");
+  }
+  if (mask != nullptr) pixman_image_unref(mask);
+  pixman_image_unref(from);
+  pixman_image_unref(to);
+}
+
+// Draws src through a matrix from source to destination.
+void draw(ZR_WorldX<ZR_Pixel8>& src, ZR_WorldX<ZR_Pixel8>& dst, const GX_Matrix3& matrix, pixman_op_t op,
+          pixman_filter_t filter) {
+  pixman_image_t* const from = image_of(src);
+  pixman_image_t* const to = image_of(dst);
+  pixman_f_transform_t forward, back;
+  std::memcpy(forward.m, matrix.m, sizeof forward.m);
+  pixman_f_transform_invert(&back, &forward);
+  pixman_transform_t fixed;
+  pixman_transform_from_pixman_f_transform(&fixed, &back);
+  pixman_image_set_transform(from, &fixed);
+  pixman_image_set_filter(from, filter, nullptr, 0);
+  pixman_image_composite32(op, from, nullptr, to, 0, 0, 0, 0, 0, 0, dst.width, dst.height);
+  pixman_image_unref(from);
+  pixman_image_unref(to);
+}
+
+void add_resize(const Resize& work, Size size, pixman_filter_t filter) {
+  add_resize_peer<ZR_Pixel8>(work, "pixman", size, [=, &work](auto& src, auto& dst) {
+    draw(src, dst, {{{work.scale, 0, 0}, {0, work.scale, 0}, {0, 0, 1}}}, PIXMAN_OP_SRC, filter);
+  });
+}
+void add_placed(const Placement& work, Size size, pixman_filter_t filter) {
+  add_placed_peer<ZR_Pixel8>(work, "pixman-premultiplied", size, [=](auto& src, auto& dst, const GX_Matrix3& matrix) {
+    draw(src, dst, matrix, PIXMAN_OP_OVER, filter);
+  });
 }
 
 const bool registered = [] {
-  for (const Size size : sizes)
-    for (const Layer layer : layers)
-      for (const Layer ground : {Layer::opaque, Layer::translucent})
-        add(std::string("in-front/8/") + name_of(layer) + "-over-" + name_of(ground) + "/pixman-premultiplied", size,
-            [=](benchmark::State& state, Size s) {
-              const auto src = make_world<ZR_Pixel8>(s, layer, 1);
-              const auto dst = make_world<ZR_Pixel8>(s, ground, 2);
-              ZR_Premul(nullptr, 1, src.get());
-              ZR_Premul(nullptr, 1, dst.get());
-              pixman_image_t* const from = image_of(*src);
-              pixman_image_t* const to = image_of(*dst);
-              for (auto _ : state)
-                pixman_image_composite32(PIXMAN_OP_OVER, from, nullptr, to, 0, 0, 0, 0, 0, 0, s.width, s.height);
-              pixman_image_unref(from);
-              pixman_image_unref(to);
-              count_bytes<ZR_Pixel8>(state, s, 3);
-            });
-  for (const Size size : sizes)
-    for (const Layer layer : {Layer::opaque, Layer::translucent})
-      add(std::string("transform-turned-bilinear/8/") + name_of(layer) + "/pixman-premultiplied", size,
-          [=](benchmark::State& state, Size s) {
-            const auto src = make_world<ZR_Pixel8>(s, layer, 1);
-            const auto dst = make_world<ZR_Pixel8>(s, Layer::opaque, 2);
-            ZR_Premul(nullptr, 1, src.get());
-            pixman_image_t* const from = image_of(*src);
-            pixman_image_t* const to = image_of(*dst);
-            const GX_Matrix3 m = placement(turned_degrees, enlarged, s.width, s.height);
-            pixman_f_transform_t forward, back;
-            std::memcpy(forward.m, m.m, sizeof forward.m);
-            pixman_f_transform_invert(&back, &forward);
-            pixman_transform_t fixed;
-            pixman_transform_from_pixman_f_transform(&fixed, &back);
-            pixman_image_set_transform(from, &fixed);
-            pixman_image_set_filter(from, PIXMAN_FILTER_BILINEAR, nullptr, 0);
-            for (auto _ : state)
-              pixman_image_composite32(PIXMAN_OP_OVER, from, nullptr, to, 0, 0, 0, 0, 0, 0, s.width, s.height);
-            pixman_image_unref(from);
-            pixman_image_unref(to);
-            count_bytes<ZR_Pixel8>(state, s, 3);
-          });
+  if (!peers_wanted()) return false;
+  for (const Size size : sizes) {
+    each_composite([&](const Composite& work) {
+      if (operator_of(work.xfer) == PIXMAN_OP_CLEAR) return;
+      add(work.name<ZR_Pixel8>() + "/pixman-premultiplied", size,
+          [=](benchmark::State& state, Size s) { composite<ZR_Pixel8>(state, s, work); });
+      add(work.name<ZR_PixelFloat>() + "/pixman-premultiplied", size,
+          [=](benchmark::State& state, Size s) { composite<ZR_PixelFloat>(state, s, work); });
+    });
+    add_placed(turned_draft, size, PIXMAN_FILTER_NEAREST);
+    add_placed(turned_bilinear, size, PIXMAN_FILTER_BILINEAR);
+    add_placed(moved_half_pixel, size, PIXMAN_FILTER_BILINEAR);
+    add_resize(nearest_half, size, PIXMAN_FILTER_NEAREST);
+    add_resize(nearest_double, size, PIXMAN_FILTER_NEAREST);
+    add_resize(bilinear_larger, size, PIXMAN_FILTER_BILINEAR);
+  }
   return true;
 }();
 
