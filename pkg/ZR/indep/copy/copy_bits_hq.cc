@@ -37,6 +37,26 @@ struct SampledAxis {
   i32 count() const { return std::max(wrap_sub(end, first), 0); }
 };
 
+// What runs in place of a sampler along a part of a row, if anything does.
+template <class T>
+struct InnerRow {
+  LaneRowFunc<T>* row = nullptr;
+  bool boxes = false;  // it averages boxes; else it is bilinear
+
+  // The pixels of a row for which it may: all that they read lies inside.
+  PixelRange range(const SampleRun& run, const ZR_SampPB& params) const {
+    if (row == nullptr) return {0, 0};
+    if (boxes) return boxes_inside(run, params);
+    const ZR_LayerDef& src = *params.src;
+    if (src.data == nullptr || run.step_x < 1 || run.y < 0 || (run.y >> 16) + 1 >= src.height) return {0, 0};
+    const i64 step = run.step_x, end = (std::min(src.width, 32768) - i64{1}) * 65536;
+    const auto first_at = [&](i64 x) {
+      return x <= run.x ? 0 : std::min<i64>((x - run.x + step - 1) / step, run.count);
+    };
+    return {static_cast<i32>(first_at(0)), static_cast<i32>(first_at(end))};
+  }
+};
+
 struct SampledCopy {
   SampledAxis x, y;
 
@@ -48,8 +68,8 @@ struct SampledCopy {
 
   // Both counts start at the first pixel of the axis and stay inside the destination.
   template <class T>
-  i32 run(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst, SampleFunc<T>* sample, i32 columns,
-          i32 rows) const {
+  i32 run(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst, SampleFunc<T>* sample,
+          const InnerRow<T>& inner, i32 columns, i32 rows) const {
     if (sample == nullptr) return ZR_Err_Internal;  // a slot that a module emptied
     ZR_SampPB params = {};
     params.x_radius = x.radius;
@@ -60,11 +80,21 @@ struct SampledCopy {
     i32 at_y = y.start;
     for (i32 row = 0; row < rows; ++row) {
       T* const pixels = out.At(x.first, y.first + row);
-      i32 at_x = x.start;
-      for (i32 k = 0; k < columns; ++k) {
-        sample(nullptr, at_x, at_y, &params, pixels + k);
-        at_x = wrap_add(at_x, x.step);
+      const auto each = [&](i32 first, i32 end) {
+        i32 at_x = wrap_add(x.start, wrap_mul(first, x.step));
+        for (i32 k = first; k < end; ++k, at_x = wrap_add(at_x, x.step))
+          sample(nullptr, at_x, at_y, &params, pixels + k);
+      };
+      const PixelRange range = inner.range({columns, x.start, at_y, x.step, 0}, params);
+      i32 done = 0;
+      if (range.first < range.end) {
+        each(0, range.first);
+        const i32 from = wrap_add(x.start, wrap_mul(range.first, x.step));
+        RowSum<T> alphas = 0;
+        done = range.first +
+               inner.row({range.end - range.first, from, at_y, x.step, 0}, params, &alphas, pixels + range.first);
       }
+      each(done, columns);
       if ((row & 63) == 0 && progress != nullptr && progress->abort != nullptr) {
         if (const i32 stop = progress->abort(progress->refcon); stop != 0) return stop;
       }
@@ -73,17 +103,6 @@ struct SampledCopy {
     return ZR_Err_None;
   }
 };
-
-// The straight samplers of a depth: what the slots hold now, and the library's own for float.
-template <class T>
-SampleFunc<T>* straight_sampler(bool area) {
-  if constexpr (std::is_same_v<T, ZR_Pixel8>)
-    return area ? slot<ZR_Slot_area_straight8>() : slot<ZR_Slot_bilinear_straight8>();
-  else if constexpr (std::is_same_v<T, ZR_Pixel16>)
-    return area ? slot<ZR_Slot_area_straight16>() : slot<ZR_Slot_bilinear_straight16>();
-  else
-    return area ? &area_sample<ZR_PixelFloat, 1> : &ZR_SubpixelBilinearFloat;
-}
 
 GX_LRect rect_or_all(const GX_LRect* rect, const ZR_LayerDef& world) {
   return rect != nullptr ? *rect : GX_LRect{0, 0, world.width, world.height};
@@ -111,7 +130,12 @@ i32 copy_straight(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef
     if (!take_rect(src_rect, src->width, src->height, &from) || !take_rect(dst_rect, dst->width, dst->height, &to) ||
         !copy.prepare(from, to, *dst))
       return ZR_Err_None;
-    return copy.run<T>(progress, src, dst, straight_sampler<T>(copy.shrinks()), copy.x.count(), copy.y.count());
+    // What the slots hold now, and the library's own for float.
+    const SampleFunctions<T> samplers = sample_functions<T>(1);
+    const bool boxes = copy.shrinks();
+    const InnerRow<T> inner = {boxes ? box_row(samplers) : clipping_row(samplers), boxes};
+    return copy.run<T>(progress, src, dst, boxes ? samplers.area : samplers.clipping, inner, copy.x.count(),
+                       copy.y.count());
   });
 }
 
@@ -132,7 +156,7 @@ i32 copy_premul(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* 
   SampleFunc<ZR_Pixel8>* const sample =
       copy.shrinks() ? slot<ZR_Slot_area_premul8>() : slot<ZR_Slot_bilinear_premul8>();
   // Rows and columns are counted in 16 bits: 32768 of them count as none.
-  return copy.run<ZR_Pixel8>(progress, src, dst, sample, static_cast<i16>(copy.x.count()),
+  return copy.run<ZR_Pixel8>(progress, src, dst, sample, {}, static_cast<i16>(copy.x.count()),
                              static_cast<i16>(copy.y.count()));
 }
 

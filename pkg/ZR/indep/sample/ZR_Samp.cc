@@ -50,23 +50,23 @@ SampleFunctions<ZR_PixelFloat> sample_functions<ZR_PixelFloat>(i32 quality) {
 
 namespace {
 
-// The library's own samplers of a depth that read without clipping.
+// The library's own samplers of a depth: without clipping, and bilinear with it.
 template <class T>
 struct Own;
 template <>
 struct Own<ZR_Pixel8> {
   static constexpr SampleFunc<ZR_Pixel8>*bilinear = &ZR_SubpixelSampleNoClip_Straight,
-                   *bicubic = &ZR_SubpixelNoClipBicubic8;
+                   *bicubic = &ZR_SubpixelNoClipBicubic8, *clipping = &ZR_SubpixelSample_Straight;
 };
 template <>
 struct Own<ZR_Pixel16> {
   static constexpr SampleFunc<ZR_Pixel16>*bilinear = &ZR_SubpixelSampleNoClip_Straight16,
-                   *bicubic = &ZR_SubpixelNoClipBicubic16;
+                   *bicubic = &ZR_SubpixelNoClipBicubic16, *clipping = &ZR_SubpixelSample_Straight16;
 };
 template <>
 struct Own<ZR_PixelFloat> {
   static constexpr SampleFunc<ZR_PixelFloat>*bilinear = &ZR_SubpixelNoClipBilinearFloat,
-                   *bicubic = &ZR_SubpixelNoClipBicubicFloat;
+                   *bicubic = &ZR_SubpixelNoClipBicubicFloat, *clipping = &ZR_SubpixelBilinearFloat;
 };
 
 }  // namespace
@@ -79,6 +79,11 @@ LaneRowFunc<T>* no_clip_row(const SampleFunctions<T>& samplers) {
   return rows != nullptr ? rows->no_clip : nullptr;
 }
 template <class T>
+LaneRowFunc<T>* clipping_row(const SampleFunctions<T>& samplers) {
+  const LaneRows<T>* const rows = samplers.clipping == Own<T>::clipping ? lane_bilinear_rows<T>() : nullptr;
+  return rows != nullptr ? rows->no_clip : nullptr;
+}
+template <class T>
 LaneRowFunc<T>* box_row(const SampleFunctions<T>& samplers) {
   const bool own = samplers.area == &ZR_AreaSample_CPlusPlus<T, 1> || samplers.area == &ZR_AreaSample_CPlusPlus<T, 2>;
   return own ? lane_box_row<T>() : nullptr;
@@ -86,6 +91,9 @@ LaneRowFunc<T>* box_row(const SampleFunctions<T>& samplers) {
 template LaneRowFunc<ZR_Pixel8>* box_row(const SampleFunctions<ZR_Pixel8>&);
 template LaneRowFunc<ZR_Pixel16>* box_row(const SampleFunctions<ZR_Pixel16>&);
 template LaneRowFunc<ZR_PixelFloat>* box_row(const SampleFunctions<ZR_PixelFloat>&);
+template LaneRowFunc<ZR_Pixel8>* clipping_row(const SampleFunctions<ZR_Pixel8>&);
+template LaneRowFunc<ZR_Pixel16>* clipping_row(const SampleFunctions<ZR_Pixel16>&);
+template LaneRowFunc<ZR_PixelFloat>* clipping_row(const SampleFunctions<ZR_PixelFloat>&);
 template LaneRowFunc<ZR_Pixel8>* no_clip_row(const SampleFunctions<ZR_Pixel8>&);
 template LaneRowFunc<ZR_Pixel16>* no_clip_row(const SampleFunctions<ZR_Pixel16>&);
 template LaneRowFunc<ZR_PixelFloat>* no_clip_row(const SampleFunctions<ZR_PixelFloat>&);

@@ -30,6 +30,9 @@ SampleFunctions<ZR_PixelFloat> sample_functions<ZR_PixelFloat>(i32 quality);
 // the library's own, and where the processor has no lanes. Fetched as the set is.
 template <class T>
 LaneRowFunc<T>* no_clip_row(const SampleFunctions<T>& samplers);
+// The same for its bilinear sampler with clipping, where all four neighbours lie inside.
+template <class T>
+LaneRowFunc<T>* clipping_row(const SampleFunctions<T>& samplers);
 // The same for its area sampler and the pixels of boxes_inside().
 template <class T>
 LaneRowFunc<T>* box_row(const SampleFunctions<T>& samplers);
