@@ -50,7 +50,10 @@ TEST(Verify, NamesADamagedLine) {
 
   const Outcome machine = verify("--json --manifest " + (folder / "m.txt") + kQuick);
   EXPECT_EQ(machine.code, 5);
-  const auto object = nlohmann::json::parse(machine.out.substr(0, machine.out.rfind('}') + 1));
+  // What went to stderr may stand before or behind it.
+  const size_t begin = machine.out.find('{'), end = machine.out.rfind('}');
+  ASSERT_LT(begin, end) << machine.out;
+  const auto object = nlohmann::json::parse(machine.out.substr(begin, end - begin + 1));
   EXPECT_EQ(object.at("agree"), false);
   const auto& difference = object.at("differences").at(0);
   EXPECT_EQ(difference.at("operation"), "transfer/screen");
