@@ -9,7 +9,6 @@
 #include <cstdlib>
 #include <cstring>
 #include <memory>
-#include <random>
 #include <string>
 #include <vector>
 
@@ -49,7 +48,7 @@ constexpr const char* depth_name() {
 template <class T>
 std::unique_ptr<ZR_WorldX<T>> make_world(Size size, Layer layer, u32 seed = 1) {
   auto world = std::make_unique<ZR_WorldX<T>>(size.width, size.height, 0);
-  std::mt19937 random(seed);
+  u64 random = seed;
   const auto channel = [](f32 v) {
     if constexpr (std::is_same_v<T, ZR_PixelFloat>)
       return v;
@@ -59,11 +58,20 @@ std::unique_ptr<ZR_WorldX<T>> make_world(Size size, Layer layer, u32 seed = 1) {
   const f32 radius = 0.4f * static_cast<f32>(size.height);
   for (i32 y = 0; y < size.height; ++y)
     for (i32 x = 0; x < size.width; ++x) {
-      const auto unit = [&] { return static_cast<f32>(random() >> 8) * 0x1p-24f; };
+      // One mixed counter gives the four channels of a pixel: peers and sizes take many pictures.
+      u64 bits = random += 0x9e3779b97f4a7c15;
+      bits = (bits ^ bits >> 30) * 0xbf58476d1ce4e5b9;
+      bits = (bits ^ bits >> 27) * 0x94d049bb133111eb;
+      const auto unit = [&] {
+        const f32 v = static_cast<f32>(bits & 0xffff) * 0x1p-16f;
+        bits >>= 16;
+        return v;
+      };
       f32 alpha = 1.0f;
       if (layer == Layer::translucent) alpha = unit();
       if (layer == Layer::cut_out) {
-        const f32 distance = std::hypot(static_cast<f32>(x - size.width / 2), static_cast<f32>(y - size.height / 2));
+        const auto dx = static_cast<f32>(x - size.width / 2), dy = static_cast<f32>(y - size.height / 2);
+        const f32 distance = std::sqrt(dx * dx + dy * dy);
         alpha = std::fmin(1.0f, std::fmax(0.0f, (radius - distance) / 8.0f + 0.5f));
       }
       *world->At(x, y) = T{channel(alpha), channel(unit()), channel(unit()), channel(unit())};
