@@ -33,8 +33,6 @@ bool resembles(const ZR_WorldX<T>& ours, const ZR_WorldX<T>& theirs) {
       }
     }
   const f64 var_a = sum_aa - sum_a * sum_a / n, var_b = sum_bb - sum_b * sum_b / n;
-  fprintf(stderr, "n %g a %g b %g corr %g\n", n, sum_a / n, sum_b / n,
-          (sum_ab - sum_a * sum_b / n) / std::sqrt(var_a * var_b));
   return std::fabs(sum_a - sum_b) < 0.05 * n && sum_ab - sum_a * sum_b / n > 0.8 * std::sqrt(var_a * var_b);
 }
 
@@ -52,9 +50,16 @@ bool agrees(const ZR_WorldX<T>& ours, const ZR_WorldX<T>& theirs) {
   return sum < 0.005 * 4 * ours.width * ours.height * f64{zr::Depth<T>::white};
 }
 
-// Both routines are called with (src, dst); only `theirs` is timed.
-template <class T, class Ours, class Theirs>
-void time_peer(benchmark::State& state, Size from, Size to, Ours ours, Theirs theirs) {
+// For peers that take our channels in our order.
+struct OurOrder {
+  template <class T>
+  void operator()(ZR_WorldX<T>&, bool) const {}
+};
+
+// Both routines are called with (src, dst); only `theirs` is timed. `reorder(world, back)` brings a world into the
+// peer's order of channels, or back.
+template <class T, class Ours, class Theirs, class Reorder = OurOrder>
+void time_peer(benchmark::State& state, Size from, Size to, Ours ours, Theirs theirs, Reorder reorder = {}) {
   // Some peers take no row padding.
   std::vector<T> pixels(static_cast<size_t>(to.width) * static_cast<size_t>(to.height));
   ZR_WorldX<T> dst(pixels.data(), to.width, to.height, to.width * static_cast<i32>(sizeof(T)));
@@ -62,18 +67,23 @@ void time_peer(benchmark::State& state, Size from, Size to, Ours ours, Theirs th
     const auto squares = make_squares<T>(from);
     const auto expected = make_world<T>(to, Layer::opaque, 2);
     ours(*squares, *expected);
+    reorder(*squares, false);
+    reorder(dst, false);
     theirs(*squares, dst);
+    reorder(dst, true);
     if (!resembles(*expected, dst)) return state.SkipWithError("the peer's picture is not ours");
   }
   const auto src = make_world<T>(from, Layer::opaque, 1);
+  reorder(*src, false);
+  reorder(dst, false);
   for (auto _ : state) theirs(*src, dst);
   state.SetBytesProcessed(static_cast<i64>(state.iterations()) *
                           (i64{from.width} * from.height + i64{to.width} * to.height) * static_cast<i64>(sizeof(T)));
 }
 
 // Registers `body(src, dst)` as the peer of a placement, for opaque layers: peers do not look at alpha.
-template <class T, class Body>
-void add_placed_peer(const Placement& work, const char* peer, Size size, Body body) {
+template <class T, class Body, class Reorder = OurOrder>
+void add_placed_peer(const Placement& work, const char* peer, Size size, Body body, Reorder reorder = {}) {
   add(std::string(work.name) + "/" + depth_name<T>() + "/opaque/" + peer, size,
       [=, &work](benchmark::State& state, Size s) {
         const GX_Matrix3 matrix = work.matrix(s);
@@ -82,7 +92,8 @@ void add_placed_peer(const Placement& work, const char* peer, Size size, Body bo
           const ZR_CompositeModePlus mode(XferInFront, 1.0f, nullptr, false, 0);
           ZR_TransformWorld(nullptr, work.quality, 0, 0, &src, &mode, nullptr, nullptr, &matrix, 1, true, &all, &dst);
         };
-        time_peer<T>(state, s, s, ours, [&](ZR_WorldX<T>& src, ZR_WorldX<T>& dst) { body(src, dst, matrix); });
+        time_peer<T>(
+            state, s, s, ours, [&](ZR_WorldX<T>& src, ZR_WorldX<T>& dst) { body(src, dst, matrix); }, reorder);
       });
 }
 

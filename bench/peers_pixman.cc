@@ -10,20 +10,27 @@
 namespace bench {
 namespace {
 
-// Puts alpha last, where pixman has it in float.
-void turn(ZR_WorldX<ZR_PixelFloat>& world, bool back) {
-  for (i32 y = 0; y < world.height; ++y)
-    for (i32 x = 0; x < world.width; ++x) {
-      f32* const p = &world.At(x, y)->alpha;
-      back ? std::rotate(p, p + 3, p + 4) : std::rotate(p, p + 1, p + 4);
-    }
-}
-void turn(ZR_WorldX<ZR_Pixel8>&, bool) {}
+// The orders of channels that pixman is fastest in: blue, green, red, alpha in bytes; red, green, blue, alpha in float.
+struct TheirOrder {
+  void operator()(ZR_WorldX<ZR_PixelFloat>& world, bool back) const {
+    each_pixel(world, [=](f32* p) { back ? std::rotate(p, p + 3, p + 4) : std::rotate(p, p + 1, p + 4); });
+  }
+  void operator()(ZR_WorldX<ZR_Pixel8>& world, bool) const {
+    each_pixel(world, [](u8* p) { std::reverse(p, p + 4); });
+  }
 
-// 8-bit pixels in memory order alpha, red, green, blue are big-endian ARGB words.
+ private:
+  template <class T, class Body>
+  static void each_pixel(ZR_WorldX<T>& world, Body body) {
+    for (i32 y = 0; y < world.height; ++y)
+      for (i32 x = 0; x < world.width; ++x) body(&world.At(x, y)->alpha);
+  }
+};
+constexpr TheirOrder turn;
+
 template <class T>
 pixman_image_t* image_of(ZR_WorldX<T>& world) {
-  return pixman_image_create_bits(sizeof(T) == 4 ? PIXMAN_b8g8r8a8 : PIXMAN_rgba_float, world.width, world.height,
+  return pixman_image_create_bits(sizeof(T) == 4 ? PIXMAN_a8r8g8b8 : PIXMAN_rgba_float, world.width, world.height,
                                   static_cast<u32*>(world.data), world.row_bytes);
 }
 
@@ -100,9 +107,11 @@ void add_resize(const Resize& work, Size size, pixman_filter_t filter) {
   });
 }
 void add_placed(const Placement& work, Size size, pixman_filter_t filter) {
-  add_placed_peer<ZR_Pixel8>(work, "pixman-premultiplied", size, [=](auto& src, auto& dst, const GX_Matrix3& matrix) {
-    draw(src, dst, matrix, PIXMAN_OP_OVER, filter);
-  });
+  for (const auto& [peer, op] :
+       {std::pair{"pixman-premultiplied", PIXMAN_OP_OVER}, {"pixman-warp-only", PIXMAN_OP_SRC}})
+    add_placed_peer<ZR_Pixel8>(
+        work, peer, size,
+        [=, op = op](auto& src, auto& dst, const GX_Matrix3& matrix) { draw(src, dst, matrix, op, filter); }, turn);
 }
 
 const bool registered = [] {
