@@ -15,6 +15,12 @@ struct Primitive : Depth<T> {
   // As it comes back from a channel: integers modulo its width.
   static constexpr Number<T> stored(Number<T> v) { return static_cast<Channel<T>>(v); }
 };
+template <>
+struct Primitive<ZR_Pixel8> : Depth<ZR_Pixel8> {
+  static constexpr i32 stored(i32 v) { return static_cast<u8>(v); }
+  // Formulas work out both sides of a choice: a quotient that is not taken may be one of any numbers.
+  static i32 div(i32 n, i32 r) { return ZRp_G_fcd_table[static_cast<u16>(r * 256 + n)]; }
+};
 
 constexpr i32 pick(bool condition, i32 a, i32 b) { return condition ? a : b; }
 constexpr f32 pick(bool condition, f32 a, f32 b) { return condition ? a : b; }
