@@ -1,4 +1,6 @@
 // Box means along a row, on lanes: all pixels of a row share their source rows.
+#include <bit>
+
 #include "sample/ZR_AreaSample_StraightT.h"
 #include "sample/lane_rows.h"
 
@@ -98,9 +100,123 @@ struct LaneAxis {
   HWY_INLINE Ints width(i32 k) const { return k == 0 ? before : pick(last > k, 0x10000, pick(last == k, behind, 0)); }
 };
 
+// Two rows of neighbouring pairs: each destination pixel is the mean of a square of four whole pixels.
+template <class T>
+class Pairs {
+ public:
+  static constexpr bool one_phase = true;
+
+  // Whether the boxes of a run are such squares, and all rows lie inside.
+  static bool fit(const SampleRun& run, const ZR_SampPB& params) {
+    constexpr i32 two_pixels = 0x20000;
+    const auto whole = [](i32 middle) { return (middle & 65535) == 32768; };
+    const i32 top = run.y >> 16;
+    return run.step_x == two_pixels && params.x_radius == two_pixels / 2 && params.y_radius == two_pixels / 2 &&
+           whole(run.x) && whole(run.y) && top >= 0 && top + 1 < std::min(params.src->height, 32767);
+  }
+  HWY_INLINE Pairs(const SampleRun& run, const ZR_LayerDef& src)
+      : at_(static_cast<const char*>(src.data) + static_cast<std::ptrdiff_t>(run.y >> 16) * src.row_bytes +
+            static_cast<std::ptrdiff_t>(run.x >> 16) * i32{sizeof(T)}),
+        row_bytes_(src.row_bytes) {}
+  HWY_INLINE void next() { at_ += 2 * lane_count() * i32{sizeof(T)}; }
+
+  HWY_INLINE const f32* row(i32 y) const { return reinterpret_cast<const f32*>(at_ + y * std::ptrdiff_t{row_bytes_}); }
+  // The four pixels of each square in reading order.
+  HWY_INLINE void load(Raw<T> (&square)[4]) const {
+    load_row(at_, square[0], square[1]);
+    load_row(at_ + row_bytes_, square[2], square[3]);
+  }
+
+ private:
+  static HWY_INLINE void load_row(const char* from, Raw<T>& left, Raw<T>& right) {
+    const Tag<i32> d;
+    const Raw<T> low = load_pixels<T>(from), high = load_pixels<T>(from + lane_count() * i32{sizeof(T)});
+    for (i32 i = 0; i < Raw<T>::words; ++i) {
+      left.w[i] = hn::ConcatEven(d, high.w[i].v, low.w[i].v);
+      right.w[i] = hn::ConcatOdd(d, high.w[i].v, low.w[i].v);
+    }
+  }
+  const char* at_;
+  i32 row_bytes_;
+};
+
+// Means of squares of opaque pixels: what the quotient of sums comes to. 255 * s / 1020, rounded by doubles, is
+// s / 4 rounded half up for all sums of four bytes; with a white of 32768 both quotients are exact.
+template <class T>
+HWY_INLINE Raw<T> opaque_means(const Raw<T> (&square)[4]) {
+  const auto mean = [&](auto k) HWY_ATTR {
+    constexpr int c = decltype(k)::value;
+    return shifted_right<2>((channel_of<c>(square[0]) + channel_of<c>(square[1])) +
+                            (channel_of<c>(square[2]) + channel_of<c>(square[3])) + 2);
+  };
+  return packed<T>(mean(std::integral_constant<int, 0>()), mean(std::integral_constant<int, 1>()),
+                   mean(std::integral_constant<int, 2>()), mean(std::integral_constant<int, 3>()));
+}
+
+// A vector of every other float pixel.
+template <class D>
+HWY_INLINE hn::Vec<D> load_every_other(D d, const f32* from) {
+  if constexpr (hn::MaxLanes(D()) == 4) {
+    return hn::LoadU(d, from);
+  } else {
+    const hn::Half<D> half;
+    return hn::Combine(d, load_every_other(half, from + 2 * hn::MaxLanes(half)), load_every_other(half, from));
+  }
+}
+// The same means of float pixels, whose channels stay side by side. False, with dst written in part, where a pixel
+// is not opaque.
+HWY_INLINE bool opaque_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* dst) {
+  constexpr i32 pixels = lane_count() / 4;
+  const Tag<f32> d;
+  const auto is_alpha = hn::Eq(hn::And(hn::Iota(Tag<i32>(), 0), hn::Set(Tag<i32>(), 3)), hn::Zero(Tag<i32>()));
+  const auto colours = hn::Not(hn::RebindMask(d, is_alpha));
+  for (i32 i = 0; i < lane_count(); i += pixels) {
+    Doubles total = 0.0;
+    auto opaque = colours;  // is not asked of colours
+    bool all_opaque = true;
+    for (i32 k = 0; k < 4; ++k) {
+      const Floats v = load_every_other(d, at.row(k / 2) + (2 * i + k % 2) * 4);
+      all_opaque = all_opaque && hn::AllTrue(d, hn::Or(opaque, hn::Eq(v.v, hn::Set(d, 1.0f))));
+      total = total + to_double(v);
+    }
+    if (!all_opaque) return false;
+    hn::StoreU(narrowed(total * 0.25).v, d, reinterpret_cast<f32*>(dst + i));
+  }
+  return true;
+}
+
+template <class T>
+HWY_INLINE Ints alpha_bits(const Raw<T>& p) {
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+    return p.w[0];
+  else
+    return channel_of<0>(p);
+}
+
+template <class T>
+i32 square_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
+  return sample_vectors<T, Pairs<T>>(run, *params.src, sum, dst, [&](const Pairs<T>& at, T* out) HWY_ATTR {
+    if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+      if (opaque_means(at, out)) return Ints(std::bit_cast<i32>(1.0f));
+    Raw<T> square[4];
+    at.load(square);
+    const Ints alphas[] = {alpha_bits(square[0]), alpha_bits(square[1]), alpha_bits(square[2]), alpha_bits(square[3])};
+    const Ints any = (alphas[0] | alphas[1]) | (alphas[2] | alphas[3]);
+    if (all(any == 0)) return put(Raw<T>{}, out);
+    if constexpr (!std::is_same_v<T, ZR_PixelFloat>) {
+      const Ints every = (alphas[0] & alphas[1]) & (alphas[2] & alphas[3]);
+      if (all(any == i32{Depth<T>::white} && every == i32{Depth<T>::white})) return put(opaque_means(square), out);
+    }
+    BoxSums<T> sums;
+    for (const Raw<T>& p : square) sums.add(p, [](Doubles v) HWY_ATTR { return v; });
+    return put(sums.mean(1.0), out);
+  });
+}
+
 template <class T>
 i32 box_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
   const ZR_LayerDef& src = *params.src;
+  if (Pairs<T>::fit(run, params)) return square_vectors(run, params, sum, dst);
   BoxAxis down(run.y, params.y_radius);
   down.clip(src.height);
   const f64 quarter_area = (params.x_radius / 65536.0) * (params.y_radius / 65536.0);

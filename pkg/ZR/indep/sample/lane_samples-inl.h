@@ -75,6 +75,7 @@ struct Raw {
 };
 HWY_INLINE Floats as_floats(Ints v) { return hn::BitCast(Tag<f32>(), v.v); }
 HWY_INLINE Ints as_ints(Floats v) { return hn::BitCast(Tag<i32>(), v.v); }
+HWY_INLINE Ints operator&(Ints a, Ints b) { return hn::And(a.v, b.v); }
 HWY_INLINE Ints operator|(Ints a, Ints b) { return hn::Or(a.v, b.v); }
 HWY_INLINE Ints operator^(Ints a, Ints b) { return hn::Xor(a.v, b.v); }
 
@@ -122,6 +123,20 @@ HWY_INLINE Raw<T> pick(Bools<i32> c, const Raw<T>& a, const Raw<T>& b) {
   return r;
 }
 
+// A vector of pixels that lie side by side.
+template <class T>
+HWY_INLINE Raw<T> load_pixels(const void* from) {
+  const Tag<i32> d;
+  const i32* const words = static_cast<const i32*>(from);
+  Raw<T> p;
+  if constexpr (Raw<T>::words == 1)
+    p.w[0] = hn::LoadU(d, words);
+  else if constexpr (Raw<T>::words == 2)
+    hn::LoadInterleaved2(d, words, p.w[0].v, p.w[1].v);
+  else
+    hn::LoadInterleaved4(d, words, p.w[0].v, p.w[1].v, p.w[2].v, p.w[3].v);
+  return p;
+}
 HWY_INLINE void store(const Raw<ZR_Pixel8>& p, ZR_Pixel8* dst) {
   hn::StoreU(p.w[0].v, Tag<i32>(), reinterpret_cast<i32*>(dst));
 }
@@ -309,19 +324,9 @@ class Adjacent {
 
   template <i32 count>
   HWY_INLINE void row(i32 dx, i32 dy, Raw<T> (&p)[count]) const {
-    const i32* const first = reinterpret_cast<const i32*>(at_ + static_cast<std::ptrdiff_t>(dy) * row_bytes_ +
-                                                          static_cast<std::ptrdiff_t>(dx) * i32{sizeof(T)});
-    const Tag<i32> d;
-    for (i32 i = 0; i < count; ++i) {
-      Ints(&w)[Raw<T>::words] = p[i].w;
-      const i32* const from = first + i * Raw<T>::words;
-      if constexpr (Raw<T>::words == 1)
-        w[0] = hn::LoadU(d, from);
-      else if constexpr (Raw<T>::words == 2)
-        hn::LoadInterleaved2(d, from, w[0].v, w[1].v);
-      else
-        hn::LoadInterleaved4(d, from, w[0].v, w[1].v, w[2].v, w[3].v);
-    }
+    const char* const first =
+        at_ + static_cast<std::ptrdiff_t>(dy) * row_bytes_ + static_cast<std::ptrdiff_t>(dx) * i32{sizeof(T)};
+    for (i32 i = 0; i < count; ++i) p[i] = load_pixels<T>(first + i * i32{sizeof(T)});
   }
 
  private:
