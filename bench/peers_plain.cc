@@ -94,6 +94,19 @@ void look_up(benchmark::State& state, Size size) {
   count_bytes<ZR_Pixel8>(state, size, 2);
 }
 
+// A cleared frame from the C library: large ones are fresh pages each time.
+template <class T>
+void allocate(benchmark::State& state, Size size) {
+  const size_t bytes = count_of(size) * sizeof(T);
+  for (auto _ : state) {
+    void* const frame = std::aligned_alloc(64, bytes);
+    benchmark::DoNotOptimize(std::memset(frame, 0, bytes));
+    benchmark::ClobberMemory();
+    std::free(frame);
+  }
+  count_bytes<T>(state, size, 1);
+}
+
 const bool registered = [] {
   if (!peers_wanted()) return false;
   for (const Size size : sizes) {
@@ -107,6 +120,7 @@ const bool registered = [] {
         for (const bool forward : {true, false})
           add(std::string(forward ? "premul/" : "unmul/") + depth_name<T>() + "/" + name_of(layer) + "/plain", size,
               [=](benchmark::State& state, Size s) { premultiply<T>(state, s, layer, forward); });
+      add(std::string("allocate/") + depth_name<T>() + "/plain", size, allocate<T>);
       each_depth([&]<class To>() {
         if constexpr (!std::is_same_v<T, To>)
           add(std::string("convert/") + depth_name<T>() + "-to-" + depth_name<To>() + "/plain", size, convert<T, To>);
