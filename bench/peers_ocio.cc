@@ -24,9 +24,17 @@ struct Pair {
   f64 matrix[9];  // of linear colours; row after row
 };
 constexpr Pair pairs[] = {
-    {"srgb-to-p3", PRISMA_Profile_sRGB, PRISMA_Profile_DisplayP3, srgb, srgb,
+    {"srgb-to-p3",
+     PRISMA_Profile_sRGB,
+     PRISMA_Profile_DisplayP3,
+     srgb,
+     srgb,
      {0.8224621, 0.1775380, 0, 0.0331941, 0.9668058, 0, 0.0170827, 0.0723974, 0.9105199}},
-    {"adobe-to-srgb", PRISMA_Profile_AdobeRGB, PRISMA_Profile_sRGB, adobe, srgb,
+    {"adobe-to-srgb",
+     PRISMA_Profile_AdobeRGB,
+     PRISMA_Profile_sRGB,
+     adobe,
+     srgb,
      {1.3983557, -0.3983557, 0, 0, 1, 0, 0, -0.0429290, 1.0429290}},
     {"srgb-to-linear", PRISMA_Profile_sRGB, PRISMA_Profile_LinearSRGB, srgb, straight, {1, 0, 0, 0, 1, 0, 0, 0, 1}}};
 

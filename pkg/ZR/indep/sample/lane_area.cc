@@ -10,7 +10,7 @@
 
 #include "simd/lanes-inl.h"
 #if ZR_HAS_LANES
-#include "sample/lane_samples-inl.h"
+#include "sample/lane_box_columns-inl.h"
 
 HWY_BEFORE_NAMESPACE();
 namespace zr {
@@ -214,9 +214,8 @@ i32 square_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum
 }
 
 template <class T>
-i32 box_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
+i32 scattered_boxes(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
   const ZR_LayerDef& src = *params.src;
-  if (Pairs<T>::fit(run, params)) return square_vectors(run, params, sum, dst);
   BoxAxis down(run.y, params.y_radius);
   down.clip(src.height);
   const f64 quarter_area = (params.x_radius / 65536.0) * (params.y_radius / 65536.0);
@@ -250,6 +249,65 @@ i32 box_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T
       });
     return put(sums.mean(quarter_area), out);
   });
+}
+
+// Boxes whose sums can be taken down the columns first, a stretch of the row at a time.
+template <class T>
+class BoxStretches {
+ public:
+  HWY_INLINE BoxStretches(const SampleRun& run, const ZR_SampPB& params)
+      : params_(params), down_(run.y, params.y_radius), length_(2 * i64{params.x_radius}) {
+    down_.clip(params.src->height);
+    const i64 height = down_.length(), columns = (length_ >> 16) + 2;
+    // 32 pixels, so that the sums are exact. The positions of a stretch stay within the columns' 16 bits.
+    if (run.step_x < 0x8000 || height <= 0 || length_ * height > i64{32} << 32 || columns >= box_columns) return;
+    pixels_ = static_cast<i32>(((box_columns - columns) << 16) / run.step_x) / lane_count() * lane_count();
+  }
+  bool fit() const { return pixels_ > 0; }
+  i32 pixels() const { return std::min(pixels_, box_columns); }
+
+  // False where the pixels under the boxes do not fit.
+  HWY_INLINE bool write(const SampleRun& run, f64 quarter_area, RowSum<T>* sum, T* dst) const {
+    HWY_ALIGN f64 columns[4 * box_columns];
+    HWY_ALIGN f64 sums[4 * box_columns];
+    const i32 from = run.x - params_.x_radius + 32768, first = from >> 16;
+    const i32 to = from + (run.count - 1) * run.step_x + static_cast<i32>(length_);
+    const i32 count = std::max(((to + 65535) >> 16) - first, static_cast<i32>(hn::MaxLanes(Words16())) / 4);
+    if (first + count > params_.src->width || !sum_columns<T>(*params_.src, down_, first, count, columns)) return false;
+    sum_boxes(columns, run, from & 65535, static_cast<i32>(length_), Products<T>::colour_unit, sums);
+    write_vectors(run.count, BoxTotals(sums), sum, dst, [&](const BoxTotals& at, T* out) HWY_ATTR {
+      BoxSums<T> totals;
+      at.load(totals.sum);
+      return put(totals.mean(quarter_area), out);
+    });
+    return true;
+  }
+
+ private:
+  const ZR_SampPB& params_;
+  BoxAxis down_;
+  i64 length_;
+  i32 pixels_ = 0;  // of the destination, a whole number of vectors
+};
+
+template <class T>
+i32 box_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
+  if (Pairs<T>::fit(run, params)) return square_vectors(run, params, sum, dst);
+  if constexpr (!std::is_same_v<T, ZR_PixelFloat>) {
+    const BoxStretches<T> stretches(run, params);
+    if (stretches.fit()) {
+      const f64 quarter_area = (params.x_radius / 65536.0) * (params.y_radius / 65536.0);
+      i32 done = 0;
+      while (run.count - done >= lane_count()) {
+        const i32 count = std::min(stretches.pixels(), (run.count - done) / lane_count() * lane_count());
+        const SampleRun part = {count, run.x + done * run.step_x, run.y, run.step_x, 0};
+        if (!stretches.write(part, quarter_area, sum, dst + done)) scattered_boxes(part, params, sum, dst + done);
+        done += count;
+      }
+      return done;
+    }
+  }
+  return scattered_boxes(run, params, sum, dst);
 }
 
 template <class T>

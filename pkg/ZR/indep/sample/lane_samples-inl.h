@@ -393,20 +393,22 @@ HWY_INLINE Ints put(const Raw<T>& p, T* dst) {
 // The whole vectors of a run: write(neighbours, dst) stores the pixels of one and returns their alphas. Returns how
 // many pixels that are.
 template <class T, class Neighbours, class Sum, class Write>
-HWY_INLINE i32 sample_vectors(const SampleRun& run, const ZR_LayerDef& src, Sum* sum, T* dst, Write write) {
+HWY_INLINE i32 write_vectors(i32 count, Neighbours at, Sum* sum, T* dst, Write write) {
   constexpr i32 lanes = lane_count();
-  if (run.count < lanes) return 0;
-  Neighbours at(run, src);
   AlphaSums<T, Sum> sums(sum);
   i32 i = 0;
   for (;;) {
     sums.add(write(at, dst + i), dst + i);
     i += lanes;
-    if (run.count - i < lanes) break;
+    if (count - i < lanes) break;
     at.next();
   }
   sums.flush();
   return i;
+}
+template <class T, class Neighbours, class Sum, class Write>
+HWY_INLINE i32 sample_vectors(const SampleRun& run, const ZR_LayerDef& src, Sum* sum, T* dst, Write write) {
+  return run.count < lane_count() ? 0 : write_vectors(run.count, Neighbours(run, src), sum, dst, write);
 }
 
 }  // namespace HWY_NAMESPACE
