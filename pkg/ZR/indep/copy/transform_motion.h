@@ -9,6 +9,7 @@
 
 #include "copy/transform_bounds.h"
 #include "copy/transform_samplers.h"
+#include "sample/motion_line.h"
 #include "world/guard.h"
 
 namespace zr {
@@ -79,36 +80,6 @@ class Workspace {
   void* own_[2] = {};
 };
 
-// The samples of one pixel, evenly spaced from where the first matrix puts it to where the last one does. All
-// of them together step over at most half of the number circle, so that between two inside samples every one
-// is inside, also where the line wraps.
-class SampleLine {
- public:
-  SampleLine(i32 x0, i32 y0, i32 x1, i32 y1, i32 samples)
-      : x0_(x0),
-        y0_(y0),
-        x1_(x1),
-        y1_(y1),
-        dx_(wrap_sub(x1, x0) / (samples - 1)),
-        dy_(wrap_sub(y1, y0) / (samples - 1)) {}
-
-  // Position of sample k counted from the first, and of the k-th before the last; they differ by what the
-  // division dropped.
-  GX_LPoint from_first(i32 k) const { return {wrap_add(x0_, wrap_mul(k, dx_)), wrap_add(y0_, wrap_mul(k, dy_))}; }
-  GX_LPoint from_last(i32 k) const { return {wrap_sub(x1_, wrap_mul(k, dx_)), wrap_sub(y1_, wrap_mul(k, dy_))}; }
-  // No sample sees the world, however wide its kernel.
-  bool misses(i32 width, i32 height) const {
-    constexpr i64 reach = 3 * i64{65536};
-    return std::max(x0_, x1_) <= -reach || std::max(y0_, y1_) <= -reach ||
-           std::min(x0_, x1_) >= i64{width} * 65536 + reach || std::min(y0_, y1_) >= i64{height} * 65536 + reach;
-  }
-  i32 dx() const { return dx_; }
-  i32 dy() const { return dy_; }
-
- private:
-  i32 x0_, y0_, x1_, y1_, dx_, dy_;
-};
-
 // Both ends of the shutter, walked together.
 struct MotionWalk {
   SourceWalk first, last;
@@ -119,6 +90,21 @@ struct MotionWalk {
     const auto at = [&](i32 start, i32 step) { return wrap_add(wrap_add(start, offset), wrap_mul(i, step)); };
     return {at(first.x, first.step_x), at(first.y, first.step_y), at(last.x, last.step_x), at(last.y, last.step_y),
             samples};
+  }
+  // A row of `count` pixels for lanes, from pixel i on.
+  MotionRun run(i32 i, i32 count, i32 offset, const f64 (*weights)[4]) const {
+    const auto part = [&](const SourceWalk& walk) {
+      return SampleRun{count - i, wrap_add(wrap_add(walk.x, offset), wrap_mul(i, walk.step_x)),
+                       wrap_add(wrap_add(walk.y, offset), wrap_mul(i, walk.step_y)), walk.step_x, walk.step_y};
+    };
+    return {part(first), part(last), samples, weights};
+  }
+  // Its pixels of which all samples lie in a rectangle of the source.
+  PixelRange inside(i32 count, i32 offset, const GX_LRect& rect) const {
+    const MotionRun all = run(0, count, offset, nullptr);
+    const PixelRange a = run_within(all.first, rect), b = run_within(all.last, rect);
+    const i32 begin = std::max(a.first, b.first), end = std::min(a.end, b.end);
+    return begin < end ? PixelRange{begin, end} : PixelRange{0, 0};
   }
   void next_row() {
     first.next_row();
@@ -135,14 +121,27 @@ struct MotionWalk {
 template <class T>
 class DraftMotionRow final : public RowSampler<T> {
  public:
-  DraftMotionRow(const ZR_WorldX<T>& src, const MotionWalk& walk, i32 count) : src_(src), walk_(walk), count_(count) {}
+  DraftMotionRow(const ZR_WorldX<T>& src, const ZR_SampPB& params, const MotionWalk& walk, i32 count)
+      : src_(src), params_(params), walk_(walk), count_(count), lanes_(nearest_rows_of<T>(src)) {}
 
   i32 sample(T* row, RowSum<T>* sum) override {
     RowSum<T> total = 0;
-    for (i32 i = 0; i < count_; ++i) {
-      row[i] = pixel(walk_.line(i, 32768));
-      total += row[i].alpha;
+    const auto each = [&](i32 first, i32 end) {
+      for (i32 i = first; i < end; ++i) {
+        row[i] = pixel(walk_.line(i, 32768));
+        total += row[i].alpha;
+      }
+    };
+    i32 done = 0;
+    if (lanes_ != nullptr && walk_.samples <= most_lane_samples) {
+      const GX_LRect all = {0, 0, std::min(src_.width, 32768), std::min(src_.height, 32768)};
+      const PixelRange inner = walk_.inside(count_, 32768, all);
+      each(0, inner.first);
+      done = inner.first;
+      if (inner.first < inner.end)
+        done += lanes_->motion(walk_.run(inner.first, inner.end, 32768, nullptr), params_, &total, row + inner.first);
     }
+    each(done, count_);
     *sum = total;
     return ZR_Err_None;
   }
@@ -171,8 +170,10 @@ class DraftMotionRow final : public RowSampler<T> {
   }
 
   const ZR_WorldX<T>& src_;
+  ZR_SampPB params_;
   MotionWalk walk_;
   i32 count_;
+  const LaneNearest<T>* lanes_;  // may be null
 };
 
 // Bilinear, bicubic or area samples along a straight line.
@@ -182,6 +183,7 @@ class BestMotionRow final : public RowSampler<T> {
   BestMotionRow(const SampleFunctions<T>& samplers, const ZR_SampPB& params, const MotionWalk& walk, i32 count,
                 void* const scratch[10])
       : samplers_(samplers), params_(params), walk_(walk), count_(count) {
+    if (walk.samples <= most_lane_samples) lanes_ = motion_rows(samplers);
     const std::size_t samples = static_cast<std::size_t>(walk.samples);
     held_ = workspace_.take<T>(scratch[8], Workspace::block8_bytes, samples);
     if (walk.keeps_phases()) weights_ = workspace_.take<f64[4]>(scratch[9], Workspace::block9_bytes, samples);
@@ -192,11 +194,23 @@ class BestMotionRow final : public RowSampler<T> {
     if (weights_ != nullptr) compute_weights();
     const bool area = takes_area(params_);
     RowSum<T> total = 0;
-    for (i32 i = 0; i < count_; ++i) {
-      const SampleLine line = walk_.line(i, 0);
-      row[i] = area ? box_pixel(line) : pixel(line);
-      total += row[i].alpha;
+    const auto each = [&](i32 first, i32 end) {
+      for (i32 i = first; i < end; ++i) {
+        const SampleLine line = walk_.line(i, 0);
+        row[i] = area ? box_pixel(line) : pixel(line);
+        total += row[i].alpha;
+      }
+    };
+    i32 done = 0;
+    LaneMotionFunc<T>* const lanes = area ? nullptr : weights_ != nullptr ? lanes_.weighted : lanes_.each;
+    if (lanes != nullptr) {
+      const PixelRange inner = walk_.inside(count_, 0, lanes_.inside(*params_.src));
+      each(0, inner.first);
+      done = inner.first;
+      if (inner.first < inner.end)
+        done += lanes(walk_.run(inner.first, inner.end, 0, weights_), params_, &total, row + inner.first);
     }
+    each(done, count_);
     *sum = total;
     return error_;
   }
@@ -255,6 +269,7 @@ class BestMotionRow final : public RowSampler<T> {
   }
 
   SampleFunctions<T> samplers_;
+  MotionRows<T> lanes_;
   ZR_SampPB params_;
   MotionWalk walk_;
   i32 count_;
@@ -272,7 +287,10 @@ class ComplexMotionRow final : public RowSampler<T> {
   ComplexMotionRow(const SampleFunctions<T>& samplers, const ZR_SampPB& params, const MatrixList& list,
                    const GX_LRect& bounds, void* const scratch[10])
       : samplers_(samplers), count_(bounds.right - bounds.left), matrices_(list.count) {
-    sums_ = workspace_.take<MotionSum<T>>(scratch[8], Workspace::block8_bytes, static_cast<std::size_t>(count_));
+    if (matrices_ <= most_lane_samples) lanes_ = lane_motion_sums<T>();
+    const auto pixels = static_cast<std::size_t>(count_);
+    sum_bytes_ = lanes_ != nullptr ? lanes_->bytes(count_) : pixels * sizeof(MotionSum<T>);
+    sums_ = workspace_.take<char>(scratch[8], Workspace::block8_bytes, sum_bytes_);
     placed_ = workspace_.take<Placed>(scratch[9], Workspace::block9_bytes, static_cast<std::size_t>(matrices_));
     for (i32 k = 0; k < matrices_; ++k) {
       Placed& placed = placed_[k];
@@ -290,7 +308,7 @@ class ComplexMotionRow final : public RowSampler<T> {
 
   i32 sample(T* row, RowSum<T>* sum) override {
     i32 error = ZR_Err_None;
-    std::fill_n(sums_, count_, MotionSum<T>{});
+    std::memset(sums_, 0, sum_bytes_);
     for (i32 k = 0; k < matrices_; ++k) {
       const Placed& placed = placed_[k];
       if (!placed.regular) continue;  // a transparent sample adds nothing
@@ -298,11 +316,19 @@ class ComplexMotionRow final : public RowSampler<T> {
       note(sample_best_row<T>(samplers_, placed.params, placed.walk, count_, row, &alphas), &error);
       if constexpr (!std::is_same_v<T, ZR_PixelFloat>)
         if (alphas == 0) continue;
-      for (i32 i = 0; i < count_; ++i) sums_[i].add(row[i]);
+      if (lanes_ != nullptr)
+        lanes_->add(count_, row, sums_);
+      else
+        for (i32 i = 0; i < count_; ++i) single_sums()[i].add(row[i]);
+    }
+    *sum = 0;
+    if (lanes_ != nullptr) {
+      lanes_->mean(count_, matrices_, sums_, sum, row);
+      return error;
     }
     RowSum<T> total = 0;
     for (i32 i = 0; i < count_; ++i) {
-      row[i] = sums_[i].mean(matrices_);
+      row[i] = single_sums()[i].mean(matrices_);
       total += row[i].alpha;
     }
     *sum = total;
@@ -319,10 +345,14 @@ class ComplexMotionRow final : public RowSampler<T> {
     SourceWalk walk;
     bool regular;
   };
+  MotionSum<T>* single_sums() const { return reinterpret_cast<MotionSum<T>*>(sums_); }
+
   RowFunctions<T> samplers_;
   i32 count_, matrices_;
   Workspace workspace_;
-  MotionSum<T>* sums_ = nullptr;
+  const LaneMotionSums<T>* lanes_ = nullptr;  // may be null
+  char* sums_ = nullptr;                      // theirs, or those of single pixels
+  std::size_t sum_bytes_ = 0;
   Placed* placed_ = nullptr;
 };
 

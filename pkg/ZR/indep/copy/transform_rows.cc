@@ -123,7 +123,7 @@ i32 draw_layer(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR
     const bool is_draft = quality == 0;
     if (!shutter.moves) {
       if (is_draft)
-        sampler = &draft.emplace(*src, walk, width);
+        sampler = &draft.emplace(*src, params, walk, width);
       else
         sampler = &best.emplace(sample_functions<T>(quality), params, walk, width);
     } else {
@@ -131,7 +131,7 @@ i32 draw_layer(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR
       params.motion_steps = samples - 1;
       const MotionWalk motion = {walk, source_walk(shutter.last.inverse, bounds.left, bounds.top), samples};
       if (is_draft)
-        sampler = &draft_motion.emplace(*src, motion, width);
+        sampler = &draft_motion.emplace(*src, params, motion, width);
       else if (count > 2 && is_complex_motion(list, shutter))
         sampler = &complex_motion.emplace(sample_functions<T>(quality), params, list, bounds, scratch);
       else

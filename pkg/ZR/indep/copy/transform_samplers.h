@@ -5,7 +5,9 @@
 #include <ZR/world.h>
 
 #include <algorithm>
+#include <cstdlib>
 #include <cstring>
+#include <limits>
 
 #include "copy/matrix_steps.h"
 #include "sample/sample_functions.h"
@@ -27,37 +29,56 @@ inline void note(i32 result, i32* error) {
   if (result != 0 && *error == 0) *error = result;
 }
 
+// What samples vectors of nearest pixels of a world, or null.
+template <class T>
+const LaneNearest<T>* nearest_rows_of(const ZR_LayerDef& src) {
+  const bool fits = std::abs(i64{src.row_bytes} * src.height) < std::numeric_limits<i32>::max();
+  return fits ? lane_nearest_rows<T>() : nullptr;
+}
+
 // Nearest pixels.
 template <class T>
 class DraftRow final : public RowSampler<T> {
  public:
-  DraftRow(const ZR_WorldX<T>& src, const SourceWalk& walk, i32 count) : src_(src), walk_(walk), count_(count) {}
+  DraftRow(const ZR_WorldX<T>& src, const ZR_SampPB& params, const SourceWalk& walk, i32 count)
+      : src_(src), params_(params), walk_(walk), count_(count), lanes_(nearest_rows_of<T>(src)) {}
 
   i32 sample(T* row, RowSum<T>* sum) override {
+    RowSum<T> total = 0;
+    const auto add = [&](i32 first, i32 end) {
+      for (i32 i = first; i < end; ++i) total += row[i].alpha;
+    };
     if (!walk_.straight(count_)) {
       for (i32 i = 0; i < count_; ++i) row[i] = tested(i);
+      add(0, count_);
     } else {
       const InsideRun run = nearest_run(walk_, count_, src_.width, src_.height);
       std::fill(row, row + run.first, T{});
-      copy(run.first, run.end - run.first, row + run.first);
+      const bool copies = walk_.step_x == 0x10000 && walk_.step_y == 0;
+      i32 first = run.first;
+      if (lanes_ != nullptr && !copies && first < run.end) {
+        const SampleRun inner = {run.end - first, x_at(first), y_at(first), walk_.step_x, walk_.step_y};
+        first += lanes_->row(inner, params_, &total, row + first);
+      }
+      copy(first, run.end - first, row + first);
       std::fill(row + run.end, row + count_, T{});
+      add(first, run.end);
     }
-    RowSum<T> total = 0;
-    for (i32 i = 0; i < count_; ++i) total += row[i].alpha;
     *sum = total;
     return ZR_Err_None;
   }
   void next_row() override { walk_.next_row(); }
 
  private:
+  // Of pixel i, with half a pixel added.
+  i32 x_at(i32 i) const { return wrap_add(wrap_add(walk_.x, wrap_mul(i, walk_.step_x)), 32768); }
+  i32 y_at(i32 i) const { return wrap_add(wrap_add(walk_.y, wrap_mul(i, walk_.step_y)), 32768); }
   T tested(i32 i) const {
-    const i32 x = nearest_index(wrap_add(walk_.x, wrap_mul(i, walk_.step_x)));
-    const i32 y = nearest_index(wrap_add(walk_.y, wrap_mul(i, walk_.step_y)));
+    const i32 x = x_at(i) >> 16, y = y_at(i) >> 16;
     return x >= 0 && x < src_.width && y >= 0 && y < src_.height ? *src_.At(x, y) : T{};
   }
   void copy(i32 first, i32 n, T* out) const {
-    i32 x = wrap_add(wrap_add(walk_.x, wrap_mul(first, walk_.step_x)), 32768);
-    i32 y = wrap_add(wrap_add(walk_.y, wrap_mul(first, walk_.step_y)), 32768);
+    i32 x = x_at(first), y = y_at(first);
     if (walk_.step_y == 0) {
       const T* const from = n > 0 ? src_.Row(y >> 16) : nullptr;
       if (walk_.step_x == 0x10000 && n > 0) {
@@ -72,8 +93,10 @@ class DraftRow final : public RowSampler<T> {
   }
 
   const ZR_WorldX<T>& src_;
+  ZR_SampPB params_;
   SourceWalk walk_;
   i32 count_;
+  const LaneNearest<T>* lanes_;  // may be null
 };
 
 // A box wider than a pixel on either axis is averaged rather than sampled at a point.

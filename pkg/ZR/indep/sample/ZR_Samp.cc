@@ -50,26 +50,76 @@ SampleFunctions<ZR_PixelFloat> sample_functions<ZR_PixelFloat>(i32 quality) {
 
 namespace {
 
-// The library's own samplers of a depth: without clipping, and bilinear with it.
+// The library's own samplers of a depth.
 template <class T>
 struct Own;
 template <>
 struct Own<ZR_Pixel8> {
   static constexpr SampleFunc<ZR_Pixel8>*bilinear = &ZR_SubpixelSampleNoClip_Straight,
                    *bicubic = &ZR_SubpixelNoClipBicubic8, *clipping = &ZR_SubpixelSample_Straight;
+  static constexpr SamplePlusFunc<ZR_Pixel8>*bilinear_flag = &ZR_SubpixelSamplePlus_Straight,
+                   *bicubic_flag = &ZR_SubpixelSpanSampleAllInBicubic8;
+  static constexpr SampleTranslateFunc<ZR_Pixel8>* translate = &ZR_SubpixelSampleTranslateNoClip_Straight;
 };
 template <>
 struct Own<ZR_Pixel16> {
   static constexpr SampleFunc<ZR_Pixel16>*bilinear = &ZR_SubpixelSampleNoClip_Straight16,
                    *bicubic = &ZR_SubpixelNoClipBicubic16, *clipping = &ZR_SubpixelSample_Straight16;
+  static constexpr SamplePlusFunc<ZR_Pixel16>*bilinear_flag = &ZR_SubpixelSamplePlus_Straight16,
+                   *bicubic_flag = &ZR_SubpixelSpanSampleAllInBicubic16;
+  static constexpr SampleTranslateFunc<ZR_Pixel16>* translate = &ZR_SubpixelSampleTranslateNoClip_Straight16;
 };
 template <>
 struct Own<ZR_PixelFloat> {
   static constexpr SampleFunc<ZR_PixelFloat>*bilinear = &ZR_SubpixelNoClipBilinearFloat,
                    *bicubic = &ZR_SubpixelNoClipBicubicFloat, *clipping = &ZR_SubpixelBilinearFloat;
+  static constexpr SamplePlusFunc<ZR_PixelFloat>*bilinear_flag = &ZR_SubpixelSpanSampleAllInBilinearFloat,
+                   *bicubic_flag = &ZR_SubpixelSpanSampleAllInBicubicFloat;
+  static constexpr SampleTranslateFunc<ZR_PixelFloat>* translate = &ZR_SubpixelSampleTranslateNoClipBilinearFloat;
 };
 
 }  // namespace
+
+PixelRange run_within(const SampleRun& run, const GX_LRect& rect) {
+  PixelRange range = {0, run.count};
+  // The part of an axis between two edges, and how many steps reach the first position that is not below an edge.
+  const auto narrow = [&](i64 at, i64 step, i64 low, i64 high) {
+    const auto steps_over = [](i64 way, i64 one) { return way <= 0 ? 0 : (way + one - 1) / one; };
+    i64 first = 0, end = run.count;
+    if (step == 0) {
+      if (at < low || at >= high) end = 0;
+    } else if (step > 0) {
+      first = steps_over(low - at, step), end = std::min(end, steps_over(high - at, step));
+    } else {
+      first = steps_over(at - (high - 1), -step), end = std::min(end, steps_over(at - (low - 1), -step));
+    }
+    range.first = static_cast<i32>(std::min<i64>(std::max<i64>(range.first, first), run.count));
+    range.end = static_cast<i32>(std::min<i64>(range.end, end));
+  };
+  narrow(run.x, run.step_x, i64{rect.left} * 65536, i64{rect.right} * 65536);
+  narrow(run.y, run.step_y, i64{rect.top} * 65536, i64{rect.bottom} * 65536);
+  if (range.first >= range.end) range = {0, 0};
+  return range;
+}
+
+template <class T>
+MotionRows<T> motion_rows(const SampleFunctions<T>& samplers) {
+  MotionRows<T> rows;
+  const LaneRows<T>* lanes = nullptr;
+  if (samplers.no_clipping == Own<T>::bilinear && samplers.inside_flag == Own<T>::bilinear_flag)
+    lanes = lane_bilinear_rows<T>(), rows.before = 0, rows.behind = 1;
+  else if (samplers.no_clipping == Own<T>::bicubic && samplers.inside_flag == Own<T>::bicubic_flag)
+    lanes = lane_bicubic_rows<T>(), rows.before = rows.behind = 2;
+  if (lanes == nullptr) return rows;
+  rows.each = lanes->motion;
+  const bool own_weights = samplers.translate == Own<T>::translate &&
+                           slot<ZR_Slot_sample_compute_weight>() == &ZR_SubpixelSampleComputeWeight;
+  if (own_weights) rows.weighted = lanes->weighted_motion;
+  return rows;
+}
+template MotionRows<ZR_Pixel8> motion_rows(const SampleFunctions<ZR_Pixel8>&);
+template MotionRows<ZR_Pixel16> motion_rows(const SampleFunctions<ZR_Pixel16>&);
+template MotionRows<ZR_PixelFloat> motion_rows(const SampleFunctions<ZR_PixelFloat>&);
 
 template <class T>
 LaneRowFunc<T>* no_clip_row(const SampleFunctions<T>& samplers) {

@@ -7,7 +7,7 @@
 
 #include "simd/lanes-inl.h"
 #if ZR_HAS_LANES
-#include "sample/lane_samples-inl.h"
+#include "sample/lane_motion-inl.h"
 
 HWY_BEFORE_NAMESPACE();
 namespace zr {
@@ -64,35 +64,51 @@ HWY_INLINE Raw<T> limited(const FloatPixels& p) {
   }
 }
 
+template <class T, class Neighbours>
+HWY_INLINE Raw<T> convolved_at(const Neighbours& at, const LaneCubicWeights& across, const LaneCubicWeights& down) {
+  FloatPixels rows[4];
+  for (i32 j = 0; j < 4; ++j) {
+    Raw<T> raw[4];
+    at.row(-1, j - 1, raw);
+    FloatPixels p[4];
+    for (i32 i = 0; i < 4; ++i)
+      p[i] = {{real_channel_of<Floats, 0>(raw[i]), real_channel_of<Floats, 1>(raw[i]),
+               real_channel_of<Floats, 2>(raw[i]), real_channel_of<Floats, 3>(raw[i])}};
+    rows[j] = convolve(across.w, p);
+  }
+  return limited<T>(convolve(down.w, rows));
+}
+
 template <class T, class Neighbours, class Sum>
 i32 bicubic_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, T* dst) {
   const LaneCubicWeights phase_across(Ints(run.x & 0xffff)), phase_down(Ints(run.y & 0xffff));
   return sample_vectors<T, Neighbours>(run, *params.src, sum, dst, [&](const Neighbours& at, T* out) HWY_ATTR {
-    const LaneCubicWeights across = Neighbours::one_phase ? phase_across : LaneCubicWeights(at.fraction_x());
-    FloatPixels rows[4];
-    for (i32 j = 0; j < 4; ++j) {
-      Raw<T> raw[4];
-      at.row(-1, j - 1, raw);
-      FloatPixels p[4];
-      for (i32 i = 0; i < 4; ++i)
-        p[i] = {{real_channel_of<Floats, 0>(raw[i]), real_channel_of<Floats, 1>(raw[i]),
-                 real_channel_of<Floats, 2>(raw[i]), real_channel_of<Floats, 3>(raw[i])}};
-      rows[j] = convolve(across.w, p);
-    }
-    const LaneCubicWeights down = Neighbours::one_phase ? phase_down : LaneCubicWeights(at.fraction_y());
-    return put(limited<T>(convolve(down.w, rows)), out);
+    if constexpr (Neighbours::one_phase)
+      return put(convolved_at<T>(at, phase_across, phase_down), out);
+    else
+      return put(convolved_at<T>(at, LaneCubicWeights(at.fraction_x()), LaneCubicWeights(at.fraction_y())), out);
+  });
+}
+
+template <class T>
+i32 bicubic_motion(const MotionRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
+  Scattered<T> at(*params.src);
+  return motion_vectors<T, false>(run, sum, dst, [&](Ints x, Ints y) HWY_ATTR {
+    at.move_to(x, y);
+    return convolved_at<T>(at, LaneCubicWeights(at.fraction_x()), LaneCubicWeights(at.fraction_y()));
   });
 }
 
 template <class T>
 const LaneRows<T>* bicubic_rows() {
-  static constexpr LaneRowFunc<T>* no_clip = [] {
-    if constexpr (gains_from_lanes<T>)
-      return &bicubic_vectors<T, Scattered<T>, RowSum<T>>;
-    else
-      return nullptr;
+  static constexpr LaneRows<T> rows = [] {
+    LaneRows<T> r = {nullptr, &bicubic_vectors<T, Adjacent<T>, AlphaSum<T>>, nullptr, nullptr};
+    if constexpr (gains_from_lanes<T>) {
+      r.no_clip = &bicubic_vectors<T, Scattered<T>, RowSum<T>>;
+      r.motion = &bicubic_motion<T>;
+    }
+    return r;
   }();
-  static constexpr LaneRows<T> rows = {no_clip, &bicubic_vectors<T, Adjacent<T>, AlphaSum<T>>};
   return &rows;
 }
 template const LaneRows<ZR_Pixel8>* bicubic_rows<ZR_Pixel8>();

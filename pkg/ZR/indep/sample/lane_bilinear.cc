@@ -7,7 +7,7 @@
 
 #include "simd/lanes-inl.h"
 #if ZR_HAS_LANES
-#include "sample/lane_samples-inl.h"
+#include "sample/lane_motion-inl.h"
 
 HWY_BEFORE_NAMESPACE();
 namespace zr {
@@ -23,6 +23,11 @@ struct LaneWeights {
     w[1] = fx - w[3];
     w[2] = fy - w[3];
     w[0] = Real(1.0f) - w[1] - w[2] - w[3];
+  }
+  // Of the caller.
+  explicit HWY_INLINE LaneWeights(const f64* numbers) {
+    using Number = std::conditional_t<std::is_same_v<Real, Floats>, f32, f64>;
+    for (i32 i = 0; i < 4; ++i) w[i] = Real(static_cast<Number>(numbers[i]));
   }
 };
 
@@ -120,39 +125,82 @@ HWY_INLINE Ints put_scattered_floats(const Scattered<ZR_PixelFloat>& at, const L
   return put(float_mix(p, weights), out);
 }
 
+template <class T>
+using RealOf = std::conditional_t<std::is_same_v<T, ZR_Pixel16>, Doubles, Floats>;
+
+template <class T, class Neighbours>
+HWY_INLINE Raw<T> mixed_at(const Neighbours& at, const LaneWeights<RealOf<T>>& weights, Bools<i32> takes_first) {
+  Raw<T> upper[2], lower[2];
+  at.row(0, 0, upper);
+  at.row(0, 1, lower);
+  const Raw<T> p[4] = {upper[0], upper[1], lower[0], lower[1]};
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+    return float_mix(p, weights);
+  else
+    return integer_mix<T>(p, weights, takes_first);
+}
+
 template <class T, class Neighbours, class Sum>
 i32 bilinear_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, T* dst) {
-  using Real = std::conditional_t<std::is_same_v<T, ZR_Pixel16>, Doubles, Floats>;
-  using Weights = LaneWeights<Real>;
+  using Weights = LaneWeights<RealOf<T>>;
   const Weights phase(run.x & 0xffff, run.y & 0xffff);
   return sample_vectors<T, Neighbours>(run, *params.src, sum, dst, [&](const Neighbours& at, T* out) HWY_ATTR {
     const Weights weights = Neighbours::one_phase ? phase : Weights(at.fraction_x(), at.fraction_y());
-    if constexpr (std::is_same_v<Neighbours, Scattered<ZR_PixelFloat>>) {
+    if constexpr (std::is_same_v<Neighbours, Scattered<ZR_PixelFloat>>)
       return put_scattered_floats(at, weights, out);
-    } else {
-      Raw<T> upper[2], lower[2];
-      at.row(0, 0, upper);
-      at.row(0, 1, lower);
-      const Raw<T> p[4] = {upper[0], upper[1], lower[0], lower[1]};
-      if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
-        return put(float_mix(p, weights), out);
-      } else {
-        const Bools<i32> whole = Neighbours::one_phase ? Ints(0) != Ints(0) : (at.fraction_x() | at.fraction_y()) == 0;
-        return put(integer_mix<T>(p, weights, whole), out);
-      }
-    }
+    else
+      return put(mixed_at<T>(at, weights, Neighbours::one_phase ? Ints(0) != Ints(0) : at.whole()), out);
   });
+}
+
+// Integer depths say of whole positions that they are not inside, and copy them.
+template <class T>
+inline constexpr bool copies_whole = !std::is_same_v<T, ZR_PixelFloat>;
+
+template <class T>
+i32 bilinear_motion(const MotionRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
+  Scattered<T> at(*params.src);
+  return motion_vectors<T, copies_whole<T>>(run, sum, dst, [&](Ints x, Ints y) HWY_ATTR {
+    at.move_to(x, y);
+    return mixed_at<T>(at, LaneWeights<RealOf<T>>(at.fraction_x(), at.fraction_y()), at.whole());
+  });
+}
+
+// Every sample has one phase for all pixels, and its neighbours lie side by side.
+template <class T>
+i32 bilinear_weighted_motion(const MotionRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
+  constexpr i32 lanes = lane_count();
+  const i32 n = run.samples;
+  const SampleLine line(run.first.x, run.first.y, run.last.x, run.last.y, n);
+  const InnerSamples inner = copies_whole<T> ? inner_samples(line) : InnerSamples{1, n - 1};
+  AlphaSums<T, RowSum<T>> alphas(sum);
+  i32 i = 0;
+  for (; run.first.count - i >= lanes; i += lanes) {
+    MotionSums<T> sums;
+    for (i32 k = 0; k < n; ++k) {
+      const GX_LPoint p = k < inner.end ? line.from_first(k) : line.from_last(n - 1 - k);
+      const Adjacent<T> at({lanes, p.x + i * 0x10000, p.y, 0x10000, 0}, *params.src);
+      using Weights = LaneWeights<RealOf<T>>;
+      const bool walked = k >= inner.first && k < inner.end;
+      const Weights weights = walked ? Weights(run.weights[k]) : Weights(at.fraction_x(), at.fraction_y());
+      sums.add(mixed_at<T>(at, weights, at.whole()));
+    }
+    alphas.add(put(sums.mean(n), dst + i), dst + i);
+  }
+  alphas.flush();
+  return i;
 }
 
 template <class T>
 const LaneRows<T>* bilinear_rows() {
-  static constexpr LaneRowFunc<T>* no_clip = [] {
-    if constexpr (gains_from_lanes<T>)
-      return &bilinear_vectors<T, Scattered<T>, RowSum<T>>;
-    else
-      return nullptr;
+  static constexpr LaneRows<T> rows = [] {
+    LaneRows<T> r = {nullptr, &bilinear_vectors<T, Adjacent<T>, AlphaSum<T>>, nullptr, &bilinear_weighted_motion<T>};
+    if constexpr (gains_from_lanes<T>) {
+      r.no_clip = &bilinear_vectors<T, Scattered<T>, RowSum<T>>;
+      r.motion = &bilinear_motion<T>;
+    }
+    return r;
   }();
-  static constexpr LaneRows<T> rows = {no_clip, &bilinear_vectors<T, Adjacent<T>, AlphaSum<T>>};
   return &rows;
 }
 template const LaneRows<ZR_Pixel8>* bilinear_rows<ZR_Pixel8>();

@@ -251,6 +251,13 @@ class Scattered {
     y_ = Ints(run.y) + place * step_y_;
     locate();
   }
+  // For move_to() alone.
+  explicit HWY_INLINE Scattered(const ZR_LayerDef& src)
+      : data_(static_cast<const char*>(src.data)), row_bytes_(src.row_bytes), step_x_(0), step_y_(0) {}
+  HWY_INLINE void move_to(Ints x, Ints y) {
+    x_ = x, y_ = y;
+    locate();
+  }
   HWY_INLINE void next() {
     x_ = x_ + Ints(wrap_mul(step_x_, lane_count()));
     y_ = y_ + Ints(wrap_mul(step_y_, lane_count()));
@@ -259,6 +266,7 @@ class Scattered {
   HWY_INLINE Ints x() const { return x_; }
   HWY_INLINE Ints fraction_x() const { return masked(x_, 65535); }
   HWY_INLINE Ints fraction_y() const { return masked(y_, 65535); }
+  HWY_INLINE Bools<i32> whole() const { return masked(x_ | y_, 65535) == 0; }
 
   // `count` pixels of each position's row `dy`, from its column `dx` on.
   template <i32 count>
@@ -321,6 +329,7 @@ class Adjacent {
   HWY_INLINE void next() { at_ += lane_count() * i32{sizeof(T)}; }
   HWY_INLINE Ints fraction_x() const { return x_ & 0xffff; }
   HWY_INLINE Ints fraction_y() const { return y_ & 0xffff; }
+  HWY_INLINE Bools<i32> whole() const { return Ints((x_ | y_) & 0xffff) == 0; }
 
   template <i32 count>
   HWY_INLINE void row(i32 dx, i32 dy, Raw<T> (&p)[count]) const {

@@ -1,6 +1,8 @@
 // The six samplers of a depth and quality, with their types.
 #pragma once
 
+#include <algorithm>
+
 #include "sample/lane_rows.h"
 #include "world/slot_table.h"
 
@@ -36,6 +38,20 @@ LaneRowFunc<T>* clipping_row(const SampleFunctions<T>& samplers);
 // The same for its area sampler and the pixels of boxes_inside().
 template <class T>
 LaneRowFunc<T>* box_row(const SampleFunctions<T>& samplers);
+
+// What takes whole vectors of pixels in motion: nothing where a sampler of the set is not the library's own.
+template <class T>
+struct MotionRows {
+  LaneMotionFunc<T>*each = nullptr, *weighted = nullptr;  // either may be null
+  i32 before = 0, behind = 0;  // pixels that have to lie between a sample's and the world's edge on either side
+
+  // Pixels whose position lies in here.
+  GX_LRect inside(const ZR_LayerDef& src) const {
+    return {before, before, std::min(src.width, 32768) - behind, std::min(src.height, 32768) - behind};
+  }
+};
+template <class T>
+MotionRows<T> motion_rows(const SampleFunctions<T>& samplers);
 
 // The box mean with bilinear (1) or bicubic (2) point samples where the box is thin.
 template <class T, i32 quality>
