@@ -33,8 +33,8 @@ class Products8 {
     alignas(16) static constexpr u16 one[8] = {1, 0, 0, 0, 1, 0, 0, 0};
     const auto v = hn::PromoteTo(d, hn::LoadU(hn::Rebind<u8, Words16>(), reinterpret_cast<const u8*>(from)));
     const auto alpha = hn::TableLookupBytes(hn::BitCast(bytes, v), hn::LoadDup128(bytes, first_of_four));
-    return hn::Mul(
-        v, hn::Or(hn::AndNot(hn::LoadDup128(d, alpha_lanes), hn::BitCast(d, alpha)), hn::LoadDup128(d, one)));
+    return hn::Mul(v,
+                   hn::Or(hn::AndNot(hn::LoadDup128(d, alpha_lanes), hn::BitCast(d, alpha)), hn::LoadDup128(d, one)));
   }
 };
 // Opaque pixels: colours times white are colours in units of white. Others do not fit.
@@ -80,9 +80,8 @@ HWY_INLINE bool sum_columns(const ZR_LayerDef& src, const BoxAxis& down, i32 fir
                                       static_cast<std::ptrdiff_t>(y) * src.row_bytes) +
            first;
   };
-  down.walk(
-      [&](i32 y, u32 extent) { parts[part_count] = row_at(y), heights[part_count++] = static_cast<u16>(extent); },
-      [&](i32 y, i32 end) { whole_row = row_at(y), whole_count = end - y; });
+  down.walk([&](i32 y, u32 extent) { parts[part_count] = row_at(y), heights[part_count++] = static_cast<u16>(extent); },
+            [&](i32 y, i32 end) { whole_row = row_at(y), whole_count = end - y; });
   for (i32 at = 0;; at = std::min(at + pixels, columns - pixels)) {  // the last vector overlaps the one before
     // Whole parts and parts of 2^-16, of the lower and the upper half of the lanes.
     auto low_whole = hn::Zero(wide), high_whole = low_whole, low_part = low_whole, high_part = low_whole;
@@ -102,7 +101,8 @@ HWY_INLINE bool sum_columns(const ZR_LayerDef& src, const BoxAxis& down, i32 fir
     }
     const auto store = [&](auto whole, auto part, f64* to) HWY_ATTR {
       const Tag<i32> ints;
-      const Doubles sum = to_double(Ints(hn::BitCast(ints, whole))) * 65536.0 + to_double(Ints(hn::BitCast(ints, part)));
+      const Doubles sum =
+          to_double(Ints(hn::BitCast(ints, whole))) * 65536.0 + to_double(Ints(hn::BitCast(ints, part)));
       hn::StoreU(sum.low, Tag<f64>(), to);
       hn::StoreU(sum.high, Tag<f64>(), to + lane_count() / 2);
     };

@@ -46,10 +46,7 @@ struct MotionSums<ZR_Pixel8> {
     const Floats n(static_cast<f32>(samples));
     const auto one = [&](Ints sum) HWY_ATTR {
       return masked(choose(
-                        opaque,
-                        [&]() HWY_ATTR {
-                          return Primitive<ZR_Pixel8>::fold(fitting_int(to_float(sum) / n));
-                        },
+                        opaque, [&]() HWY_ATTR { return Primitive<ZR_Pixel8>::fold(fitting_int(to_float(sum) / n)); },
                         [&]() HWY_ATTR { return quotient(sum, divisor); }),
                     255);
     };
@@ -160,15 +157,13 @@ struct MotionSums<ZR_PixelFloat> {
 template <bool copies_whole>
 HWY_INLINE Ints late_samples(Ints x0, Ints y0, Ints x1, Ints y1, Ints dx, Ints dy, i32 samples) {
   if constexpr (copies_whole) {
-    const Bools<i32> unusual =
-        masked(x1 | y1, 65535) == 0 || masked((x0 | y0) | (dx | dy), 65535) == 0;
+    const Bools<i32> unusual = masked(x1 | y1, 65535) == 0 || masked((x0 | y0) | (dx | dy), 65535) == 0;
     if (!none(unusual)) {
       constexpr i32 lanes = lane_count();
       alignas(64) i32 at[4][lanes];
       const Tag<i32> d;
       hn::Store(x0.v, d, at[0]), hn::Store(y0.v, d, at[1]), hn::Store(x1.v, d, at[2]), hn::Store(y1.v, d, at[3]);
-      for (i32 i = 0; i < lanes; ++i)
-        at[0][i] = inner_samples({at[0][i], at[1][i], at[2][i], at[3][i], samples}).end;
+      for (i32 i = 0; i < lanes; ++i) at[0][i] = inner_samples({at[0][i], at[1][i], at[2][i], at[3][i], samples}).end;
       return hn::Load(d, at[0]);
     }
   }

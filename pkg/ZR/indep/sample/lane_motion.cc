@@ -136,7 +136,7 @@ const LaneMotionSums<T>* motion_sums() {
   return &rows;
 }
 
-#define ZR_INSTANTIATE(T)                            \
+#define ZR_INSTANTIATE(T)                           \
   template const LaneNearest<T>* nearest_rows<T>(); \
   template const LaneMotionSums<T>* motion_sums<T>();
 ZR_INSTANTIATE(ZR_Pixel8)
@@ -165,7 +165,7 @@ const LaneMotionSums<T>* lane_motion_sums() {
   return nullptr;
 }
 
-#define ZR_INSTANTIATE(T)                                 \
+#define ZR_INSTANTIATE(T)                                \
   template const LaneNearest<T>* lane_nearest_rows<T>(); \
   template const LaneMotionSums<T>* lane_motion_sums<T>();
 ZR_INSTANTIATE(ZR_Pixel8)
