@@ -1,6 +1,7 @@
 // The C++ interface of libzr, whole.
 #pragma once
 
+#include <ZR/blur.h>
 #include <ZR/callback_block.h>
 #include <ZR/colour_settings.h>
 #include <ZR/colour_transform.h>

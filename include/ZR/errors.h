@@ -6,13 +6,15 @@
 inline constexpr u32 ZR_ModuleCode = 0x25u << 16;
 inline constexpr i32 ZR_ReportSeverity = 8;
 
-// One number for each place that reports.
+// One number for each place that reports (8 serves two).
 enum ZR_CallSite : u32 {
   ZR_Site_Plain = 0x00,
   ZR_Site_GetCallbackAddr = 0x01,
   ZR_Site_DisposeEffectWorld = 0x03,
   ZR_Site_UnimplementedMode = 0x06,
   ZR_Site_ChannelOrder = 0x08,
+  ZR_Site_Convolve = 0x08,
+  ZR_Site_GaussianKernel = 0x0a,
   ZR_Site_Fill = 13,
   ZR_Site_Iterate = 14,
   ZR_Site_BatchSampling = 0x2e,
@@ -55,6 +57,7 @@ enum ZR_CallSite : u32 {
   ZR_Site_ColourTransform = 0x86,
   ZR_Site_DepthConvert = 0x87,
   ZR_Site_TransformWorld = 0x88,
+  ZR_Site_Blur = 0x89,
   ZR_Site_UnknownDepth = 0x3e7,
 };
 

@@ -84,6 +84,9 @@ struct ZR_API ZR_World : public ZR_AnyPixelContainer, public ZR_LayerDef {
   void FillOutEffectWorld(ZR_LayerDef* out) const;           // a plain record of this world; null: nothing
   bool RefersTo(const ZR_World* other) const;                // this reference's first pixel lies in `other`
 
+  // Where the top left pixel lies among the worlds of a filter; (0, 0) in a new world. Only the blurs read it.
+  GX_LPoint origin = {0, 0};
+
  protected:
   ZR_World() : ZR_LayerDef{} {}
 };

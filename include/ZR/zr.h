@@ -249,6 +249,7 @@ ZR_API i32 transform_world_adapter(const ZR_ProgressInfo* progress, i32 quality,
 #endif
 
 #include <ZR/copy_bits.h>
+#include <ZR/filter.h>
 #include <ZR/sample.h>
 #include <ZR/transform_world.h>
 

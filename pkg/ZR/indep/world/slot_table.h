@@ -49,6 +49,10 @@ using SampleFourTranslateFunc = i32(const ZR_ProgressInfo*, const i32* xy, const
 using SampleWeightFunc = i32(u16 fx, u16 fy, f64* w);
 using CopyBitsFunc = i32(const ZR_ProgressInfo*, ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect,
                          const GX_LRect* dst_rect);
+using ConvolveFunc = i32(const ZR_ProgressInfo*, ZR_LayerDef* src, const GX_LRect*, u32 flags, i32 size,
+                         const i32* a_kernel, const i32* r_kernel, const i32* g_kernel, const i32* b_kernel,
+                         ZR_LayerDef* dst);
+using FastBlurFunc = i32(const ZR_ProgressInfo*, ZR_LayerDef* src, f64 radius, ZR_LayerDef* dst);
 using CompositeBehindRowFunc = void(i32 n, u8 opacity, const ZR_Pixel8* src, ZR_Pixel8* dst);
 using IterateFunc = i32(ZR_InData*, i32 progress_base, i32 progress_final, ZR_LayerDef* src, const GX_LRect*,
                         void* refcon, ZR_PixelFunc, ZR_LayerDef* dst);
@@ -100,6 +104,9 @@ ZR_SLOT(module48, ModuleOwnFunc)
 ZR_SLOT(copy_bits_draft, CopyBitsFunc)
 ZR_SLOT(copy_bits_hq_straight, CopyBitsFunc)
 ZR_SLOT(copy_bits_hq_premul, CopyBitsFunc)
+ZR_SLOT(fast_blur_straight, FastBlurFunc)
+ZR_SLOT(fast_blur_premul, FastBlurFunc)
+ZR_SLOT(convolve, ConvolveFunc)
 ZR_SLOT(nn_sample8, SampleFunc<ZR_Pixel8>)
 ZR_SLOT(nn_sample16, SampleFunc<ZR_Pixel16>)
 ZR_SLOT(bilinear_straight8, SampleFunc<ZR_Pixel8>)
