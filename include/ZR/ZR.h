@@ -17,5 +17,6 @@
 #include <ZR/summed_area.h>
 #include <ZR/transfer_mode.h>
 #include <ZR/vec_pixel.h>
+#include <ZR/viewer_blit.h>
 #include <ZR/world.h>
 #include <ZR/zr.h>

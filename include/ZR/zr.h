@@ -248,8 +248,11 @@ ZR_API i32 transform_world_adapter(const ZR_ProgressInfo* progress, i32 quality,
 }
 #endif
 
+#include <ZR/alpha_guess.h>
 #include <ZR/copy_bits.h>
+#include <ZR/drawing.h>
 #include <ZR/filter.h>
+#include <ZR/pixel_measures.h>
 #include <ZR/sample.h>
 #include <ZR/transform_world.h>
 
