@@ -22,8 +22,7 @@ void put(PrivateRoutine routine, Function* function) {
   G_private[static_cast<size_t>(routine)] = reinterpret_cast<void*>(function);
 }
 
-// Null so far: gaussian_kernel, gaussian_value, extract_planes, insert_planes, paint_spot and the sixteen
-// colour functions.
+// Null so far: extract_planes, insert_planes, paint_spot and the sixteen colour functions.
 void fill() {
   using P = PrivateRoutine;
   put(P::batch_sampling, &batch_sampling_ended);
@@ -31,6 +30,8 @@ void fill() {
   put(P::blend_premul, &ZR_Blend_Premul);
   put(P::fill8, &ZR_Fill);
   put(P::fill16, &ZR_Fill16);
+  put(P::gaussian_kernel, &ZR_GaussianKernel);
+  put(P::gaussian_value, &ZRp_GaussianValue);
   put(P::premul, &ZR_Premul);
   put(P::premul_color, &ZR_PremulColor);
   put(P::premul_color16, &ZR_PremulColor16);

@@ -2,6 +2,7 @@
 #include "host/slot_defaults.h"
 
 #include <ZR/copy_bits.h>
+#include <ZR/filter.h>
 
 #include "composite/composite_rect.h"
 #include "composite/ground_rows.h"
@@ -53,6 +54,9 @@ void fill_default_slots() {
   set_slot<ZR_Slot_copy_bits_draft>(&ZR_CopyBits_Draft_Static);
   set_slot<ZR_Slot_copy_bits_hq_straight>(&ZR_CopyBits_HQ_Straight_Static);
   set_slot<ZR_Slot_copy_bits_hq_premul>(&ZR_CopyBits_HQ_Premul_Static);
+  set_slot<ZR_Slot_fast_blur_straight>(&ZR_FastBlur_Straight);
+  set_slot<ZR_Slot_fast_blur_premul>(&ZR_FastBlur_Premul);
+  set_slot<ZR_Slot_convolve>(&ZR_Convolve);
   set_slot<ZR_Slot_transform_world>(&ZR_TransformWorld_S);
   set_slot<ZR_Slot_iterate>(&iterate_body);
   set_slot<ZR_Slot_iterate_origin>(&iterate_origin_body);

@@ -1,0 +1,149 @@
+// Convolution with whole-numbered kernels: the checks of a call, and rows one after the other.
+#include <ZR/blur.h>
+#include <ZR/errors.h>
+
+#include <algorithm>
+#include <limits>
+#include <type_traits>
+
+#include "filter/convolve_rows.h"
+#include "world/guard.h"
+
+namespace zr {
+namespace {
+
+constexpr i32 largest_kernel = 65535;
+constexpr i64 taps_before_poll = 2049;
+
+template <class T>
+constexpr u64 greatest_channel = std::is_same_v<T, ZR_Pixel8> ? 255 : 65535;
+
+// One channel's result from its sum.
+inline u8 narrowed(const Convolution<ZR_Pixel8>& c, i64 v) {
+  return static_cast<u8>(std::clamp<i64>(c.wraps ? static_cast<i16>(static_cast<u16>(v)) : v, 0, 255));
+}
+inline u16 narrowed(const Convolution<ZR_Pixel16>&, i64 v) { return static_cast<u16>(std::clamp<i64>(v, 0, 32768)); }
+
+template <class T>
+Channel<T> convolved(const Convolution<T>& c, i32 channel, i64 left, KernelRows rows, i32 first, i32 end, i64 top,
+                     const Channel<T> T::*member) {
+  const i32* const kernel = c.kernels[channel];
+  const i64 divisor = c.divisors[channel];
+  std::conditional_t<std::is_same_v<T, ZR_PixelFloat>, f64, i64> sum = 0;
+  for (i32 v = rows.first; v < rows.end; ++v) {
+    const T* const row = c.source_row(top + v) + left;
+    const i32* const taps = kernel + static_cast<i64>(v) * c.width;
+    for (i32 u = first; u < end; ++u) {
+      if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+        sum += static_cast<f64>(row[u].*member * static_cast<f32>(taps[u]));
+      else
+        sum += static_cast<i64>(row[u].*member) * taps[u];
+    }
+  }
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+    return static_cast<f32>(sum) / static_cast<f32>(divisor);
+  else
+    return narrowed(c, sum / divisor);
+}
+
+// False, reported, where a sum of a kernel could leave 64 bits.
+template <class T>
+bool find_divisors(Convolution<T>* c, bool normalised) {
+  const i64 taps = static_cast<i64>(c->width) * c->height;
+  for (i32 k = 0; k < 4; ++k) {
+    i64 sum = 0;
+    u64 size = 0;
+    for (i64 i = 0; i < taps; ++i) {
+      const i64 tap = c->kernels[k][i];
+      sum += tap;
+      size += static_cast<u64>(tap < 0 ? -tap : tap);
+    }
+    if (size > static_cast<u64>(std::numeric_limits<i64>::max()) / greatest_channel<T>) return false;
+    c->divisors[k] = normalised ? (sum != 0 ? sum : 1) : taps * 256;
+    c->tap_sums[k] = size;
+  }
+  return true;
+}
+
+template <class T>
+i32 convolve(const ZR_ProgressInfo* progress, const ZR_LayerDef* src, u32 flags, i32 size, const i32* a, const i32* r,
+             const i32* g, const i32* b, ZR_LayerDef* dst) {
+  if (src->data == nullptr || dst->data == nullptr || a == nullptr || r == nullptr || g == nullptr || b == nullptr ||
+      size < 1 || size % 2 == 0)
+    return ZR_ReportBadCallbackParam(ZR_Site_Convolve);
+  if (size > largest_kernel) return failed_verification(ZR_Site_Convolve, "a kernel of ZR_Convolve is too large");
+  Convolution<T> c{};
+  const bool one_row = (flags & ZR_ConvolveFlag_1D) != 0, upright = (flags & ZR_ConvolveFlag_Vertical) != 0;
+  c.width = one_row && upright ? 1 : size;
+  c.height = one_row && !upright ? 1 : size;
+  const i32* const kernels[] = {a, r, g, b};
+  std::copy(kernels, kernels + 4, c.kernels);
+  c.wraps = (flags & ZR_ConvolveFlag_NoClamp) != 0;
+  c.src = static_cast<const char*>(src->data);
+  c.src_row_bytes = src->row_bytes;
+  c.src_width = src->width;
+  c.src_height = src->height;
+  if (!find_divisors(&c, (flags & ZR_ConvolveFlag_Normalised) != 0))
+    return failed_verification(ZR_Site_Convolve, "sums of a kernel of ZR_Convolve do not fit 64 bits");
+
+  i64 work = 0;
+  for (i32 y = 0; y < dst->height; ++y) {
+    T* const row = reinterpret_cast<T*>(static_cast<char*>(dst->data) + static_cast<i64>(y) * dst->row_bytes);
+    convolve_pixels(c, y, 0, dst->width, row);
+    work += static_cast<i64>(c.width) * c.height * dst->width;
+    if (progress == nullptr || progress->progress == nullptr || work < taps_before_poll) continue;
+    if (const i32 stop = progress->progress(progress->refcon, y + 1, dst->height); stop != 0) return stop;
+    work = 0;
+  }
+  return ZR_Err_None;
+}
+
+}  // namespace
+
+template <class T>
+void convolve_pixels(const Convolution<T>& c, i32 y, i32 first, i32 end, T* dst_row) {
+  const KernelRows rows = kernel_rows_at(c, y);
+  const i64 top = static_cast<i64>(y) - c.height / 2;
+  for (i32 x = first; x < end; ++x) {
+    const i64 left = static_cast<i64>(x) - c.width / 2;
+    const i32 from = static_cast<i32>(std::clamp<i64>(-left, 0, c.width));
+    const i32 to = static_cast<i32>(std::clamp<i64>(c.src_width - left, from, c.width));
+    const auto one = [&](i32 channel, const Channel<T> T::*member) {
+      return convolved<T>(c, channel, left, rows, from, to, top, member);
+    };
+    dst_row[x] = {one(0, &T::alpha), one(1, &T::red), one(2, &T::green), one(3, &T::blue)};
+  }
+}
+template void convolve_pixels(const Convolution<ZR_Pixel8>&, i32, i32, i32, ZR_Pixel8*);
+template void convolve_pixels(const Convolution<ZR_Pixel16>&, i32, i32, i32, ZR_Pixel16*);
+template void convolve_pixels(const Convolution<ZR_PixelFloat>&, i32, i32, i32, ZR_PixelFloat*);
+
+}  // namespace zr
+
+template <class T>
+i32 ZRp_Convolve(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const GX_LRect*, u32 flags, i32 size, const i32* a,
+                 const i32* r, const i32* g, const i32* b, ZR_LayerDef* dst) {
+  return zr::guarded([&]() -> i32 {
+    if (src == nullptr || dst == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_Convolve);
+    return zr::convolve<T>(progress, src, flags, size, a, r, g, b, dst);
+  });
+}
+template ZR_API i32 ZRp_Convolve<ZR_Pixel8>(const ZR_ProgressInfo*, ZR_LayerDef*, const GX_LRect*, u32, i32, const i32*,
+                                            const i32*, const i32*, const i32*, ZR_LayerDef*);
+template ZR_API i32 ZRp_Convolve<ZR_Pixel16>(const ZR_ProgressInfo*, ZR_LayerDef*, const GX_LRect*, u32, i32,
+                                             const i32*, const i32*, const i32*, const i32*, ZR_LayerDef*);
+template ZR_API i32 ZRp_Convolve<ZR_PixelFloat>(const ZR_ProgressInfo*, ZR_LayerDef*, const GX_LRect*, u32, i32,
+                                                const i32*, const i32*, const i32*, const i32*, ZR_LayerDef*);
+
+i32 ZR_Convolve(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const GX_LRect* rect, u32 flags, i32 size,
+                const i32* a_kernel, const i32* r_kernel, const i32* g_kernel, const i32* b_kernel, ZR_LayerDef* dst) {
+  return zr::guarded([&]() -> i32 {
+    if (src == nullptr || dst == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_Convolve);
+    const i32 depth = ZRp_WorldDepth(src);
+    if (depth != ZRp_WorldDepth(dst))
+      return zr::failed_verification(ZR_Site_Convolve, "ZR_Convolve requires source and dst worlds to be same depth");
+    return zr::on_depth(depth, zr::unknown_depth_text, [&]<class T>() -> i32 {
+      return ZRp_Convolve<T>(progress, src, rect, flags, size, a_kernel, r_kernel, g_kernel, b_kernel, dst);
+    });
+  });
+}
