@@ -59,6 +59,13 @@ enum ZR_CallSite : u32 {
   ZR_Site_TransformWorld = 0x88,
   ZR_Site_Blur = 0x89,
   ZR_Site_UnknownDepth = 0x3e7,
+  ZR_Site_GuessAlpha = 0x90,
+  ZR_Site_MatteRow = 0x91,
+  ZR_Site_MatteColour = 0x92,
+  ZR_Site_DrawLine = 0x93,
+  ZR_Site_PaintSpot = 0x94,
+  ZR_Site_Wireframe = 0x95,
+  ZR_Site_Planes = 0x96,
 };
 
 // Indices of the library's own texts.

@@ -60,3 +60,9 @@ void GX_TransformFloatRect(const GX_Matrix3* matrix, const GX_FloatRect* rect, G
 void GX_TransformVector3(const GX_Matrix3* matrix, const f64 in[3], f64 out[3]);
 // One point, always divided.
 void GX_Matrix3_TransformPointAndDivide(const GX_Matrix3* matrix, const GX_FloatPoint* in, GX_FloatPoint* out);
+
+// Runs of small points, in place; null leaves them as they are. Rounded to nearest, ties away from zero, and held to
+// the range of 16 bits; NaN gives 0. The first divides as GX_TransformFloatPoints does, the second always: its matrix
+// is that of a plane turned in space.
+void GX_TransformPoints(const GX_Matrix3* matrix, ZR_WireframePoint* points, i32 count);
+void GX_3DTransform2DPoints(const GX_Matrix3* matrix, ZR_WireframePoint* points, i32 count);

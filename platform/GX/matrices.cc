@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <limits>
 
 namespace {
 
@@ -15,6 +16,18 @@ GX_FloatPoint transform(const GX_Matrix3& a, const GX_FloatPoint& p, bool divide
   if (!divide) return {x, y};
   const f64 w = a.m[2][0] * p.x + a.m[2][1] * p.y + a.m[2][2];
   return {x / w, y / w};
+}
+
+i16 small_coordinate(f64 v) {
+  constexpr f64 lowest = std::numeric_limits<i16>::min(), highest = std::numeric_limits<i16>::max();
+  return std::isnan(v) ? i16{0} : static_cast<i16>(std::clamp(std::round(v), lowest, highest));
+}
+
+void transform_small(const GX_Matrix3& a, ZR_WireframePoint* points, i32 count, bool divide) {
+  for (i32 i = 0; i < count; ++i) {
+    const GX_FloatPoint p = transform(a, {static_cast<f64>(points[i].x), static_cast<f64>(points[i].y)}, divide);
+    points[i] = {small_coordinate(p.x), small_coordinate(p.y)};
+  }
 }
 
 }  // namespace
@@ -84,4 +97,12 @@ void GX_TransformVector3(const GX_Matrix3* matrix, const f64 in[3], f64 out[3]) 
 
 void GX_Matrix3_TransformPointAndDivide(const GX_Matrix3* matrix, const GX_FloatPoint* in, GX_FloatPoint* out) {
   *out = transform(*matrix, *in, true);
+}
+
+void GX_TransformPoints(const GX_Matrix3* matrix, ZR_WireframePoint* points, i32 count) {
+  if (matrix != nullptr) transform_small(*matrix, points, count, !is_affine(*matrix));
+}
+
+void GX_3DTransform2DPoints(const GX_Matrix3* matrix, ZR_WireframePoint* points, i32 count) {
+  if (matrix != nullptr) transform_small(*matrix, points, count, true);
 }

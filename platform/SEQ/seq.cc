@@ -64,6 +64,20 @@ i32 SEQ_Insert(SEQ_List* list, i32 index, const void* record) {
   return ZR_Err_None;
 }
 
+i32 SEQ_AppendClear(SEQ_List* list, i32 count) {
+  if (list == nullptr || count < 0) return ZR_Err_BadParam;
+  if (list->locks > 0) return ZR_Err_Internal;
+  if (count > std::numeric_limits<i32>::max() - list->count) return ZR_Err_OutOfMemory;
+  const i32 wanted = list->count + count;
+  if (wanted > list->capacity) {
+    if (const i32 error = reserve(list, wanted); error != 0) return error;
+  }
+  const auto first = static_cast<std::size_t>(list->count) * list->record_bytes;
+  if (count > 0) std::memset(list->records + first, 0, static_cast<std::size_t>(count) * list->record_bytes);
+  list->count = wanted;
+  return ZR_Err_None;
+}
+
 i32 SEQ_GetCount(const SEQ_List* list) { return list != nullptr ? list->count : 0; }
 
 void* SEQ_GetAddress(SEQ_List* list, i32 index) {

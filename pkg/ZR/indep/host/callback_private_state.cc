@@ -22,7 +22,23 @@ void put(PrivateRoutine routine, Function* function) {
   G_private[static_cast<size_t>(routine)] = reinterpret_cast<void*>(function);
 }
 
-// Null so far: extract_planes, insert_planes, paint_spot and the sixteen colour functions.
+// In the order of the callback block.
+void fill_colour_functions() {
+  const auto put_pair = [](int index, auto* straight, auto* premul) {
+    put(static_cast<PrivateRoutine>(static_cast<int>(PrivateRoutine::colour_straight_first) + index), straight);
+    put(static_cast<PrivateRoutine>(static_cast<int>(PrivateRoutine::colour_premul_first) + index), premul);
+  };
+  put_pair(0, &ZR_RGBtoHLS_Straight, &ZR_RGBtoHLS_Premul);
+  put_pair(1, &ZR_HLStoRGB_Straight, &ZR_HLStoRGB_Premul);
+  put_pair(2, &ZR_RGBtoYIQ_Straight, &ZR_RGBtoYIQ_Premul);
+  put_pair(3, &ZR_YIQtoRGB_Straight, &ZR_YIQtoRGB_Premul);
+  put_pair(4, &ZR_Luminance_Straight, &ZR_Luminance_Premul);
+  put_pair(5, &ZR_Hue_Straight, &ZR_Hue_Premul);
+  put_pair(6, &ZR_Lightness_Straight, &ZR_Lightness_Premul);
+  put_pair(7, &ZR_Saturation_Straight, &ZR_Saturation_Premul);
+}
+
+// In the order of the private table.
 void fill() {
   using P = PrivateRoutine;
   put(P::batch_sampling, &batch_sampling_ended);
@@ -50,6 +66,10 @@ void fill() {
   put(P::platform_query, &platform_query);
   put(P::get_pixel_data8, &ZR_GetPixelData8);
   put(P::get_pixel_data16, &ZR_GetPixelData16);
+  put(P::extract_planes, &ZR_ExtractPlanes);
+  put(P::insert_planes, &ZR_InsertPlanes);
+  put(P::paint_spot, &ZR_PaintSpot);
+  fill_colour_functions();
   fill_ansi_functions(&G_private[static_cast<size_t>(P::ansi_first)]);
 }
 

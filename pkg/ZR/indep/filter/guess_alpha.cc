@@ -1,0 +1,153 @@
+// Guessing whether colours are premultiplied, and with which matte, by one pass over the pixels.
+#include <ZR/alpha_guess.h>
+#include <ZR/depth.h>
+
+#include <cstdio>
+#include <cstdlib>
+
+#include "filter/guess_rows.h"
+#include "filter/raster_lock.h"
+#include "world/guard.h"
+
+namespace zr {
+namespace {
+
+constexpr i32 white = Depth<ZR_Pixel8>::white;
+
+i32 apart(u8 a, u8 b) { return std::abs(a - b); }
+
+// What a pass over the pixels notes.
+class AlphaScan {
+ public:
+  // By lanes where runs are long; pixel by pixel the result is the same.
+  void row(const ZR_Pixel8* row, i32 n, const GuessRuns* runs) {
+    i32 i = 0, patience = 0;
+    while (i < n) {
+      pixel(row[i++]);
+      if (runs == nullptr || --patience > 0) continue;
+      const i32 length = run(row + i, n - i, *runs);
+      i += length;
+      // Where pixels of both kinds mix, looking for runs costs more than it finds.
+      patience = length == 0 ? 16 : 0;
+    }
+  }
+
+  // One of the codes; the matte is stored with ZR_AlphaGuess_Premultiplied.
+  ZR_AlphaGuess decide(ZR_Pixel8* matte) const {
+    if (covered_ == 0) return ZR_AlphaGuess_Unknown;
+    const ZR_Pixel8& s = faintest_;
+    const i32 m = s.alpha;
+    const auto premultiplied = [matte](u8 red, u8 green, u8 blue) {
+      *matte = {static_cast<u8>(white), red, green, blue};
+      return ZR_AlphaGuess_Premultiplied;
+    };
+    if (clear_ > 0 && clear_white_ == clear_ && white - s.red <= m && white - s.green <= m && white - s.blue <= m)
+      return premultiplied(white, white, white);
+    if (clear_ > 0 && clear_black_ == clear_ && !colour_exceeds_alpha_) return premultiplied(0, 0, 0);
+    if (!clear_colours_vary_ && covered_colours_vary_) {
+      const u8 red = peak(counts_[0]), green = peak(counts_[1]), blue = peak(counts_[2]);
+      if (apart(red, s.red) <= m + 1 && apart(green, s.green) <= m + 1 && apart(blue, s.blue) <= m + 1)
+        return premultiplied(red, green, blue);
+    }
+    return ZR_AlphaGuess_Straight;
+  }
+
+ private:
+  void pixel(const ZR_Pixel8& p) {
+    if (p.alpha == 0) {
+      if (clear_ > 0 && (apart(p.red, last_clear_.red) >= 3 || apart(p.green, last_clear_.green) >= 3 ||
+                         apart(p.blue, last_clear_.blue) >= 3))
+        clear_colours_vary_ = true;
+      count_clear(p, 1);
+      last_clear_ = p;
+    } else {
+      if (covered_ > 0 &&
+          (p.red != last_covered_.red || p.green != last_covered_.green || p.blue != last_covered_.blue))
+        covered_colours_vary_ = true;
+      if (covered_ == 0 || p.alpha < faintest_.alpha) faintest_ = p;
+      if (p.alpha < p.red || p.alpha < p.green || p.alpha < p.blue) colour_exceeds_alpha_ = true;
+      ++covered_;
+      last_covered_ = p;
+    }
+  }
+
+  // Takes the run that goes on behind row[-1], which is counted; its length.
+  i32 run(const ZR_Pixel8* row, i32 n, const GuessRuns& runs) {
+    if (row[-1].alpha == 0) {
+      const i32 length = runs.same(row, n);
+      count_clear(row[-1], length);
+      return length;
+    }
+    const i32 length = runs.covered(row, n, faintest_.alpha, &covered_colours_vary_, &colour_exceeds_alpha_);
+    covered_ += length;
+    last_covered_ = row[length - 1];
+    return length;
+  }
+
+  void count_clear(const ZR_Pixel8& p, i32 pixels) {
+    clear_ += pixels;
+    if (p.red == white && p.green == white && p.blue == white) clear_white_ += pixels;
+    if (p.red == 0 && p.green == 0 && p.blue == 0) clear_black_ += pixels;
+    counts_[0][p.red] += pixels;
+    counts_[1][p.green] += pixels;
+    counts_[2][p.blue] += pixels;
+  }
+
+  // Of equal counts the lowest entry wins.
+  static u8 peak(const i32 (&counts)[256]) {
+    i32 best = 0;
+    for (i32 i = 1; i < 256; ++i)
+      if (counts[i] > counts[best]) best = i;
+    return static_cast<u8>(best);
+  }
+
+  i32 counts_[3][256] = {};  // of the colours of transparent pixels
+  i32 clear_ = 0, clear_white_ = 0, clear_black_ = 0, covered_ = 0;
+  ZR_Pixel8 last_clear_{}, last_covered_{};
+  ZR_Pixel8 faintest_{};  // the first of the smallest alpha above 0
+  bool clear_colours_vary_ = false, covered_colours_vary_ = false, colour_exceeds_alpha_ = false;
+};
+
+i32 guess(const ZR_WorldX<ZR_Pixel8>& world, i32* code, ZR_Pixel8* matte) {
+  AlphaScan scan;
+  const GuessRuns* const runs = lane_guess_runs();
+  for (i32 y = 0; y < world.height; ++y) scan.row(world.Row(y), world.width, runs);
+  *matte = {};
+  *code = scan.decide(matte);
+  return ZR_Err_None;
+}
+
+i32 wrong_depth() { return failed_verification(ZR_Site_GuessAlpha, "ZR_GuessAlpha only works on 8bpc worlds"); }
+
+}  // namespace
+}  // namespace zr
+
+extern "C" {
+
+i32 ZR_GuessAlpha(void*, ZR_LayerDef* world, RS_World** raster, i32* code, ZR_Pixel8* matte) {
+  return zr::guarded([&]() -> i32 {
+    if (code == nullptr || matte == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_GuessAlpha);
+    if (world != nullptr) {
+      if (ZRp_WorldDepth(world) != zr::Depth<ZR_Pixel8>::bits) return zr::wrong_depth();
+      if (world->data == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_GuessAlpha);
+      return zr::guess(ZR_WorldX<ZR_Pixel8>(world, false), code, matte);
+    }
+    const zr::RasterLock lock(raster);
+    if (lock.error() != 0) return lock.error();
+    if (ZR_DepthOfRSWorld(raster) != zr::Depth<ZR_Pixel8>::bits) return zr::wrong_depth();
+    return zr::guess(ZR_WorldX<ZR_Pixel8>(raster, nullptr), code, matte);
+  });
+}
+
+i32 ZR_GuessAlphaMessage(void* ref, ZR_LayerDef* world, RS_World** raster, i32* code, ZR_Pixel8* matte,
+                         char message[256]) {
+  constexpr size_t message_bytes = 256;
+  if (message != nullptr) message[0] = '\0';
+  const i32 error = ZR_GuessAlpha(ref, world, raster, code, matte);
+  if (error != 0 || *code != ZR_AlphaGuess_Unknown || message == nullptr) return error;
+  const char* const text = HB_ZLookupLStrCache(ZR_G_zref, ZR_Str_CannotGuessAlpha, 0, 0);
+  if (text != nullptr) std::snprintf(message, message_bytes, "%s", text);
+  return ZR_Err_None;
+}
+
+}  // extern "C"
