@@ -4,7 +4,7 @@
 #include <algorithm>
 #include <cstring>
 
-#include "composite/linear_light.h"
+#include "composite/depth_convert_rows.h"
 #include "world/guard.h"
 
 namespace zr {
@@ -13,53 +13,11 @@ namespace {
 constexpr const char* unknown_text = "Unknown bit depth attempting to depth convert.";
 
 template <class To, class From>
-Channel<To> convert_channel(Channel<From> c, const ZR_LinearBlendingTables& tables) {
-  constexpr bool to_float = std::is_same_v<To, ZR_PixelFloat>, from_float = std::is_same_v<From, ZR_PixelFloat>;
-  if constexpr (to_float) {
-    if constexpr (std::is_same_v<From, ZR_Pixel8>)
-      return widen_16_to_float(tables.to_linear[c]);
-    else
-      return widen_16_to_float(to_linear_16(c, tables));
-  } else if constexpr (from_float) {
-    const u16 stored = from_linear_16(narrow_float_colour<ZR_Pixel16>(c), tables);
-    if constexpr (std::is_same_v<To, ZR_Pixel8>)
-      return narrow_16_to_8(stored);
-    else
-      return stored;
-  } else if constexpr (std::is_same_v<From, ZR_Pixel8>) {
-    return widen_8_to_16(c);
-  } else {
-    return narrow_16_to_8(c);
-  }
-}
-
-template <class To, class From>
-Channel<To> convert_alpha(Channel<From> a) {
-  if constexpr (std::is_same_v<To, ZR_PixelFloat>) {
-    if constexpr (std::is_same_v<From, ZR_Pixel8>)
-      return widen_8_to_float(a);
-    else
-      return widen_16_to_float(a);
-  } else if constexpr (std::is_same_v<From, ZR_PixelFloat>) {
-    return narrow_float_alpha<To>(a);
-  } else if constexpr (std::is_same_v<From, ZR_Pixel8>) {
-    return widen_8_to_16(a);
-  } else {
-    return narrow_16_to_8(a);
-  }
-}
-
-template <class To, class From>
 void convert_row(i32 n, const From* src, To* dst, const ZR_LinearBlendingTables& tables) {
-  if constexpr (std::is_same_v<To, From>) {
+  if constexpr (std::is_same_v<To, From>)
     std::memmove(dst, src, static_cast<size_t>(n) * sizeof(To));
-  } else {
-    for (i32 x = 0; x < n; ++x) {
-      const From p = src[x];
-      dst[x] = {convert_alpha<To, From>(p.alpha), convert_channel<To, From>(p.red, tables),
-                convert_channel<To, From>(p.green, tables), convert_channel<To, From>(p.blue, tables)};
-    }
-  }
+  else
+    depth_convert_row(n, src, dst, tables);
 }
 
 constexpr i32 band_rows = 16;

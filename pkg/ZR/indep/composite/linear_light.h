@@ -3,7 +3,7 @@
 
 #include <ZR/depth.h>
 
-#include <cmath>
+#include "composite/raised.h"
 
 namespace zr {
 
@@ -43,8 +43,6 @@ inline u16 from_linear_16(u16 channel, const ZR_LinearBlendingTables& tables) {
   if (between == 0) return entry[0];
   return static_cast<u16>(entry[0] + ((between * (entry[1] - entry[0]) + 4) >> 3));
 }
-// Float colours by exponent; the sign is kept.
-inline f32 raised(f32 c, f32 exponent) { return c < 0.0f ? -std::pow(-c, exponent) : std::pow(c, exponent); }
 
 inline ZR_Pixel16 to_linear(const ZR_Pixel8& p, const ZR_LinearBlendingTables& tables) {
   return {widen_8_to_16(p.alpha), tables.to_linear[p.red], tables.to_linear[p.green], tables.to_linear[p.blue]};

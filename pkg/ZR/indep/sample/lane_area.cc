@@ -16,11 +16,6 @@ HWY_BEFORE_NAMESPACE();
 namespace zr {
 namespace HWY_NAMESPACE {
 
-HWY_INLINE Doubles to_double(Floats v) {
-  const Tag<f64> d;
-  const HalfFloats half;
-  return {hn::PromoteTo(d, hn::LowerHalf(half, v.v)), hn::PromoteTo(d, hn::UpperHalf(half, v.v))};
-}
 // 0 where the divisor is.
 HWY_INLINE Doubles unless_zero(Doubles divisor, Doubles v) {
   const auto zero = hn::Zero(Tag<f64>());
