@@ -1,5 +1,5 @@
-// Whole rows between the three depths. Plain loops over channels, in the shape that compilers vectorise; compiled
-// once for each instruction set.
+// Whole rows between the three depths. Plain loops over channels, in the shape that compilers vectorise, compiled
+// once for each instruction set; floats are narrowed by lanes.
 #include "world/depth_rows.h"
 
 #include <ZR/depth.h>
@@ -14,6 +14,8 @@
 #define HWY_TARGET_INCLUDE "world/depth_rows.cc"
 #include <hwy/foreach_target.h>
 #include <hwy/highway.h>
+
+#include "simd/lane_depth-inl.h"
 
 HWY_BEFORE_NAMESPACE();
 namespace zr {
@@ -69,6 +71,71 @@ void narrow_float_dithered(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst, Rule
   each_channel_with_drawn<f32>(n, src, dst, draw, [rule](f32 c, f32 offset) { return rule(c + offset); });
 }
 
+// The plain loops serve single numbers; the compiled baseline is what these run as.
+#define ZR_NARROWS_BY_LANES (ZR_HAS_LANES && HWY_TARGET != HWY_STATIC_TARGET)
+#if ZR_NARROWS_BY_LANES
+// Channels by rule(vector of floats), which gives integers; what does not fit the channel saturates.
+template <class To, class Rule>
+HWY_INLINE void narrow_lanes(i32 n, const ZR_PixelFloat* src, To* dst, Rule rule) {
+  using C = Channel<To>;
+  constexpr i32 vectors = 4, lanes = lane_count(), block = vectors * lanes;
+  const auto one = [&](const f32* in, C* out) HWY_ATTR {
+    const hn::Rebind<C, Tag<i32>> narrow;
+    for (i32 k = 0; k < vectors; ++k)
+      hn::StoreU(hn::DemoteTo(narrow, rule(Floats(hn::LoadU(Tag<f32>(), in + k * lanes))).v), narrow, out + k * lanes);
+  };
+  const f32* const in = reinterpret_cast<const f32*>(src);
+  C* const out = reinterpret_cast<C*>(dst);
+  i32 i = 0;
+  for (; i <= 4 * n - block; i += block) one(in + i, out + i);
+  if (i >= 4 * n) return;
+  const auto rest = static_cast<std::size_t>(4 * n - i);
+  f32 last[block] = {};
+  C made[block];
+  std::memcpy(last, in + i, rest * sizeof(f32));
+  one(last, made);
+  std::memcpy(out + i, made, rest * sizeof(C));
+}
+
+// Clamped, with NaN as 0.
+template <class To>
+HWY_INLINE Floats clamped(Floats scaled) {
+  return pick(scaled > 0.0f, Floats(hn::Min(scaled.v, Floats(static_cast<f32>(Depth<To>::white)).v)), 0.0f);
+}
+// Nearest even; what does not fit, and NaN, gives the lowest number.
+HWY_INLINE Ints nearest_int(Floats a) {
+#if HWY_TARGET == HWY_AVX3
+  return Ints::V{_mm512_cvtps_epi32(a.v.raw)};
+#elif HWY_TARGET == HWY_AVX2
+  return Ints::V{_mm256_cvtps_epi32(a.v.raw)};
+#elif HWY_TARGET == HWY_SSE4
+  return Ints::V{_mm_cvtps_epi32(a.v.raw)};
+#else
+  return pick(Bools<i32>{hn::RebindMask(Tag<i32>(), (a < 2147483648.0f).mask)}, Ints(hn::NearestInt(a.v)),
+              std::numeric_limits<i32>::min());
+#endif
+}
+
+template <class To>
+void narrow_scalar(i32 n, const ZR_PixelFloat* src, To* dst) {
+  constexpr i32 bits = static_cast<i32>(std::numeric_limits<Channel<To>>::max());
+  const Bools<f32> is_alpha = {
+      hn::RebindMask(Tag<f32>(), (masked(Ints(hn::Iota(Tag<i32>(), 0)), 3) == 0).mask)};
+  narrow_lanes(n, src, dst, [=](Floats c) HWY_ATTR {
+    const Floats scaled = c * static_cast<f32>(Depth<To>::white);
+    return masked(to_int(pick(is_alpha, scaled, clamped<To>(scaled)) + 0.5f), bits);
+  });
+}
+template <class To>
+void narrow_clamped(i32 n, const ZR_PixelFloat* src, To* dst) {
+  narrow_lanes(n, src, dst, [](Floats c) HWY_ATTR {
+    return fitting_int(clamped<To>(c * static_cast<f32>(Depth<To>::white)) + 0.5f);
+  });
+}
+inline void narrow_nearest(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst) {
+  narrow_lanes(n, src, dst, [](Floats c) HWY_ATTR { return nearest_int(c * 255.0f); });
+}
+#else
 template <class To>
 void narrow_scalar(i32 n, const ZR_PixelFloat* src, To* dst) {
   // Limits by the channel's place, alpha first, so that alpha and colours run through one expression.
@@ -80,6 +147,15 @@ void narrow_scalar(i32 n, const ZR_PixelFloat* src, To* dst) {
   }
   each_channel(n, src, dst, [&](f32 c, i32 k) { return narrow_float<To>(c, floor[k], ceiling[k]); });
 }
+
+template <class To>
+void narrow_clamped(i32 n, const ZR_PixelFloat* src, To* dst) {
+  each_channel(n, src, dst, [](f32 c, i32) { return narrow_float_colour<To>(c); });
+}
+inline void narrow_nearest(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst) {
+  each_channel(n, src, dst, [](f32 c, i32) { return narrow_float_to_8_nearest(c); });
+}
+#endif
 
 inline bool takes_vector_rule(const ZR_PixelFloat* row) {
   return HB_G_CPU_DataP[2] != 0 && reinterpret_cast<std::uintptr_t>(row) % 16 == 0;
@@ -108,7 +184,7 @@ void convert(i32 n, const From* src, To* dst, bool dither) {
     else  // with dither the scalar rule clamps alpha too
       narrow_float_dithered(n, src, dst, [](f32 c) { return narrow_float_colour<To>(c); });
   } else if (takes_vector_rule(src)) {
-    each_channel(n, src, dst, [](f32 c, i32) { return narrow_float_to_8_nearest(c); });
+    narrow_nearest(n, src, dst);
   } else {
     narrow_scalar(n, src, dst);
   }
@@ -116,7 +192,7 @@ void convert(i32 n, const From* src, To* dst, bool dither) {
 
 template <class To>
 void narrow(i32 n, const ZR_PixelFloat* src, To* dst) {
-  each_channel(n, src, dst, [](f32 c, i32) { return narrow_float_colour<To>(c); });
+  narrow_clamped(n, src, dst);
 }
 
 template void convert(i32, const ZR_Pixel8*, ZR_Pixel16*, bool);
