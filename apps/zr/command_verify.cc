@@ -215,7 +215,6 @@ Run declare(CLI::App& verb) {
       "for several thread counts, and compares the results to the last bit with a manifest: lines of operation, depth\n"
       "and a 128-bit hash. What differs is named by operation, depth, instruction set and threads; the exit code is\n"
       "then 5. A missing line, and a line without operation, count as differences.\n\n"
-      "Linear light of float pixels is left out: it is the C library's pow, which may differ between processors.\n"
       "Aligned float rows on their way to 8 bits have a rule of their own where there are vectors, so they are\n"
       "compared on all sets but scalar. All NaNs count as one value.\n\n"
       "Examples:\n"

@@ -4,6 +4,7 @@
 
 #include <vector>
 
+#include "composite/depth_convert_rows.h"
 #include "composite/ground_rows.h"
 #include "composite/linear_rows.h"
 #include "support/born_library.h"
@@ -80,9 +81,8 @@ TYPED_TEST(LaneRows, InnerBlends) {
       this->compare((name + " onto what it reads next").c_str(), [&](i32 n, T*, T*, T* d) {
         if (n > 3) run.template operator()<false, false>(n - 3, d, d, d + 3);
       });
-      if constexpr (!std::is_same_v<T, ZR_PixelFloat>)
-        this->compare((name + " in linear light").c_str(),
-                      [&](i32 n, T* s, T* m, T* d) { run.template operator()<true, true>(n, s, m, d); });
+      this->compare((name + " in linear light").c_str(),
+                    [&](i32 n, T* s, T* m, T* d) { run.template operator()<true, true>(n, s, m, d); });
       if (this->HasFatalFailure()) return;
     }
   }
@@ -113,13 +113,25 @@ TYPED_TEST(LaneRows, GroundsAndAlphas) {
 
 TYPED_TEST(LaneRows, Depths) {
   using T = TypeParam;
+  constexpr bool of_floats = std::is_same_v<T, ZR_PixelFloat>;
+  const ZR_LinearBlendingTables gamma = gamma_tables(1.8);
   const auto to = [&]<class Out>() {
     if constexpr (!std::is_same_v<T, Out>) {
-      this->template compare<Out>("conversion", [](i32 n, T* s, T*, Out* d) { zr::convert_row(n, s, d, false); });
+      // Rows of floats to 8 bits have another rule where there are vectors, unless they begin between two pixels.
+      if constexpr (of_floats && std::is_same_v<Out, ZR_Pixel8>)
+        this->template compare<Out>("conversion", [](i32 n, T* s, T*, Out* d) {
+          zr::convert_row(n - 1, reinterpret_cast<const T*>(reinterpret_cast<const f32*>(s) + 1), d, false);
+        });
+      else
+        this->template compare<Out>("conversion", [](i32 n, T* s, T*, Out* d) { zr::convert_row(n, s, d, false); });
+      if constexpr (of_floats)
+        this->template compare<Out>("clamped", [](i32 n, T* s, T*, Out* d) { zr::narrow_row(n, s, d); });
+      this->template compare<Out>("linear floats", [&](i32 n, T* s, T*, Out* d) {
+        zr::depth_convert_row(n, s, d, gamma);
+      });
     }
   };
-  // The vector rule of floats is a rule of its own, not a variant.
-  if constexpr (!std::is_same_v<T, ZR_PixelFloat>) to.template operator()<ZR_Pixel8>();
+  to.template operator()<ZR_Pixel8>();
   to.template operator()<ZR_Pixel16>();
   to.template operator()<ZR_PixelFloat>();
 }

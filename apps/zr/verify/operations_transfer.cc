@@ -75,7 +75,6 @@ void transfer_masked(Digest& digest, i32 mode, const ZR_LinearBlendingTables* ta
   }
 }
 
-// Of float pixels this would be the C library's pow, which processors may answer differently.
 template <class T>
 void transfer_linear(Digest& digest, i32 mode) {
   const ZR_LinearBlendingTables* const tables = &square_tables();
@@ -93,7 +92,7 @@ void single_pixels(Digest& digest, i32 mode) {
   const auto fainter =
       pick<T>(&ZR_Get_Xfer1_Opacity2_table8, &ZR_Get_Xfer1_Opacity2_table16, &ZR_Get_Xfer1_Opacity2_tableF)(mode);
   const T opacity = convert_colour<T>(ZR_PixelFloat{0.5f, 0.9f, 0, 0});
-  for (const auto* tables : {stored, std::is_same_v<T, ZR_PixelFloat> ? stored : &square_tables()}) {
+  for (const auto* tables : {stored, &square_tables()}) {
     Picture<T> src(odd_width, 3, Content::mixed, 25), dst(odd_width, 3, Content::mixed, 26);
     for (i32 x = 0; x < odd_width; ++x) {
       if (plain != nullptr) plain(*src->At(x, 0), tables, dst->At(x, 0));
@@ -115,8 +114,7 @@ void add_transfer_operations(Operations& list) {
     add_all(list, "transfer/" + name, [mode]<class T>(Digest& digest) { transfer_plain<T>(digest, mode); });
     add_all(list, "transfer-mask/" + name,
             [mode]<class T>(Digest& digest) { transfer_masked<T>(digest, mode, nullptr); });
-    add_8_and_16(list, "transfer-linear/" + name,
-                 [mode]<class T>(Digest& digest) { transfer_linear<T>(digest, mode); });
+    add_all(list, "transfer-linear/" + name, [mode]<class T>(Digest& digest) { transfer_linear<T>(digest, mode); });
     if (mode >= 0) add_all(list, "pixel/" + name, [mode]<class T>(Digest& digest) { single_pixels<T>(digest, mode); });
   }
 }

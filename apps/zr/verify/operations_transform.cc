@@ -115,7 +115,7 @@ void add_transform_operations(Operations& list) {
       for (const Affine& place : {kTurned, Affine{1, 0, 0, 1, 7.5, 2.5}, Affine{0.37, 0, 0, 0.37, 0, 0}})
         draw<T>(digest, {.field = field, .area = {9, 3, 100, 31}}, {around(place)}, Content::mixed);
   });
-  add_8_and_16(list, "transform-linear", []<class T>(Digest& digest) {
+  add_all(list, "transform-linear", []<class T>(Digest& digest) {
     draw<T>(digest, {.tables = &square_tables()}, {around(kTurned)}, Content::mixed);
     draw<T>(digest, {.tables = &square_tables()}, motion(kStill, kSheared, 3), Content::mixed);
   });
