@@ -2,25 +2,16 @@
 #include <ZR/errors.h>
 #include <ZR/world.h>
 
-#include <array>
-
 #include "iterate/iterate.h"
 #include "iterate/iterate_area.h"
+#include "iterate/lane_lut_rows.h"
 #include "world/guard.h"
 
 namespace zr {
 namespace {
 
-constexpr std::array<u8, 256> identity = [] {
-  std::array<u8, 256> table{};
-  for (u32 i = 0; i < table.size(); ++i) table[i] = static_cast<u8>(i);
-  return table;
-}();
-
 // Refused: no pixels, and 16-bit pixels. A float world is not; its rows are walked as bytes.
 bool refused(const ZR_LayerDef* world) { return world == nullptr || world->data == nullptr || (world->flags & 1) != 0; }
-
-const u8* or_identity(const u8* table) { return table != nullptr ? table : identity.data(); }
 
 }  // namespace
 
@@ -36,16 +27,12 @@ i32 iterate_lut_body(ZR_InData* in_data, i32 progress_base, i32 progress_final, 
     walk.cut(0, 0, in_world.width, in_world.height);
     if (walk.columns() == 0 || walk.rows() == 0) return static_cast<i32>(ZR_Err_None);
 
-    const u8 *const a = or_identity(a_lut), *const r = or_identity(r_lut), *const g = or_identity(g_lut),
-                    *const b = or_identity(b_lut);
+    const ByteTables tables(a_lut, r_lut, g_lut, b_lut);
     RowProgress progress(in_data, progress_base, progress_final);
     for (i64 y = walk.top; y < walk.bottom; ++y) {
       const ZR_Pixel8* const in = in_world.At(static_cast<i32>(walk.left), static_cast<i32>(y));
       ZR_Pixel8* const out = out_world.At(static_cast<i32>(walk.left), static_cast<i32>(y));
-      for (i64 i = 0; i < walk.columns(); ++i) {
-        const ZR_Pixel8 p = in[i];
-        out[i] = {a[p.alpha], r[p.red], g[p.green], b[p.blue]};
-      }
+      tables.row(walk.columns(), in, out);
       if (progress.row_done(y - walk.top)) break;
     }
     return progress.result();
