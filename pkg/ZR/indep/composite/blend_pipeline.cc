@@ -4,9 +4,11 @@
 #include <algorithm>
 #include <array>
 
+#include "composite/ground_rows.h"
 #include "composite/row_overlap.h"
 #include "composite/transfer_modes-inl.h"
 #include "world/guard.h"
+#include "world/premul_rows.h"
 #include "world/slot_table.h"
 
 namespace zr {
@@ -90,12 +92,39 @@ ZR_BlendModeDescriptor<T>::ZR_BlendModeDescriptor(const ZR_BlendingMode<T>& mode
 namespace zr {
 namespace {
 
+// The rows of our own that a class runs around its main function, of which one pass can take the place.
+template <class T>
+bool has_own_rows(const ZR_BlendModeDescriptor<T>& plan, RowClass row_class) {
+  if (plan.union_alpha != &union_alpha_row<T> || plan.use_union_alpha == 0) return false;
+  switch (row_class) {
+    case RowClass::black_ground: return plan.fade == &premul_row<T> && plan.unfade == &unmul_row<T>;
+    case RowClass::white_ground: return plan.fade == &white_fade_row<T> && plan.unfade == &white_unfade_row<T>;
+    case RowClass::grey_ground: return plan.fade == &grey_fade_row<T> && plan.unfade == &grey_unfade_row<T>;
+    default: return false;
+  }
+}
+
+// The one pass in which this row can run, or null: no routine is another's, and the rows have nothing in common.
+template <class T>
+ZR_InnerBlendingFunc<T> one_pass(const ZR_BlendModeDescriptor<T>& plan, i32 n, const T* src, const T* mask,
+                                 const T* dst) {
+  const u32 row = static_cast<u32>(plan.mode.mode) - static_cast<u32>(first_mode);
+  if (row >= row_classes.size() || !has_own_rows(plan, row_classes[row].row_class)) return nullptr;
+  const bool own_main = plan.main == inner_rows<T, true>()[row] ||  // with no mask they are the same
+                        (mask == nullptr && plan.main == inner_rows<T, false>()[row]);
+  if (!own_main || plan.tables != nullptr || src == dst || !rows_apart(n, src, dst)) return nullptr;
+  if (mask != nullptr && (mask == dst || !rows_apart(n, mask, dst))) return nullptr;
+  return whole_ground_row<T>(static_cast<i32>(row));
+}
+
 // Several passes go over a piece of the row at a time, which stays in the nearest cache between them.
 template <class T>
 constexpr i32 piece_pixels = 8192 / sizeof(T);
 
 template <class T>
 i32 run_on_ground(const ZR_BlendModeDescriptor<T>& plan, i32 n, const T* src, const T* mask, T* dst) {
+  if (const ZR_InnerBlendingFunc<T> whole = one_pass(plan, n, src, mask, dst))
+    return whole(n, &plan.mode, nullptr, src, mask, dst);
   const bool in_pieces = rows_apart(n, src, dst) && (mask == nullptr || rows_apart(n, mask, dst));
   const i32 piece = in_pieces ? piece_pixels<T> : n;
   i32 error = 0;

@@ -6,8 +6,10 @@
 #define ZR_COMPOSITE_LANE_ROWS_INL_H
 #endif
 
+#include "composite/lane_ground_rows.h"
 #include "composite/mode_kinds-inl.h"
 #include "simd/lane_row-inl.h"
+#include "world/lane_premul_rows.h"
 
 HWY_BEFORE_NAMESPACE();
 namespace zr {
@@ -17,31 +19,52 @@ namespace HWY_NAMESPACE {
 template <class Mode>
 inline constexpr bool has_lanes = Mode::kind != ModeKind::row_only&& Mode::kind != ModeKind::copy;
 
-// Modes that work on a whole colour want its channels apart.
+// What a mode computes with, and how its pixels lie: modes that work on a whole colour want its channels apart, and
+// lumas want 32 bits.
 template <class Mode, class T>
-using PackOf = std::conditional_t<Mode::kind == ModeKind::colour || Mode::kind == ModeKind::alpha_only ||
-                                      std::is_same_v<Mode, KeyProtect> || std::is_same_v<Mode, BlueThreshold>,
-                                  Apart, AlikePack<T>>;
+struct Lanes {
+  static constexpr bool whole_colour = Mode::kind == ModeKind::colour || Mode::kind == ModeKind::alpha_only;
+  static constexpr bool narrow = std::is_same_v<T, ZR_Pixel8> && !whole_colour;
+  static constexpr bool apart = whole_colour || std::is_same_v<Mode, KeyProtect> || std::is_same_v<Mode, BlueThreshold>;
+  using Math = ModeMath<std::conditional_t<narrow, NarrowPixel8, T>>;
+  using Pack = std::conditional_t<narrow, Narrow, std::conditional_t<apart, Apart, AlikePack<T>>>;
+};
+
+// The source of one vector of pixels, and what covers it.
+template <class M>
+struct Source {
+  typename M::Wide opacity;
+  bool opaque;  // opacity is white
+  bool masked = false;
+  Px<M> pixel{};
+  typename M::Wide cover{};
+
+  // False when a channel is illegal. mask may be null.
+  template <class Pack, class T>
+  HWY_INLINE bool load(const T* src, const T* mask) {
+    pixel = Pack::template load<M>(src);
+    if (!legal(pixel)) return false;
+    masked = mask != nullptr;
+    if (!masked) return true;
+    cover = Pack::template load<M>(mask).alpha;
+    return legal_alpha<M>(cover);
+  }
+  HWY_INLINE auto covered(typename M::Wide c) const {
+    if (masked) return M::covered(c, opacity, cover);
+    return opaque ? c : M::mul(c, opacity);
+  }
+};
 
 // The pixels of one vector; false when a channel is illegal, and then nothing is written. mask may be null.
 template <class Mode, class T>
-HWY_INLINE bool blend_lanes(typename ModeMath<T>::Wide opacity, bool opaque, bool keep_alpha, const T* src,
-                            const T* mask, T* dst) {
-  using M = ModeMath<T>;
+HWY_INLINE bool blend_lanes(Source<typename Lanes<Mode, T>::Math> source, bool keep_alpha, const T* src, const T* mask,
+                            T* dst) {
+  using M = typename Lanes<Mode, T>::Math;
+  using Pack = typename Lanes<Mode, T>::Pack;
   using Wide = typename M::Wide;
-  using Pack = PackOf<Mode, T>;
-  Px<M> s = Pack::template load<M>(src);
-  if (!legal(s)) return false;
-  Wide cover = M::white;
-  if (mask != nullptr) {
-    cover = Pack::template load<M>(mask).alpha;
-    if (!legal_alpha<M>(cover)) return false;
-  }
-  const auto covered = [&](Wide c) HWY_ATTR {
-    if (mask != nullptr) return M::covered(c, opacity, cover);
-    return opaque ? c : M::mul(c, opacity);
-  };
-  if constexpr (scales_source<Mode>) s = scaled<M>(s, covered);
+  if (!source.template load<Pack>(src, mask)) return false;
+  const auto covered = [&](Wide c) HWY_ATTR { return source.covered(c); };
+  const Px<M> s = scales_source<Mode> ? scaled<M>(source.pixel, covered) : source.pixel;
   const Wide A = scales_source<Mode> ? s.alpha : covered(s.alpha);
   const auto clear = A == 0;
   if (passes_clear<Mode> && all(clear)) return true;
@@ -58,16 +81,15 @@ HWY_INLINE bool blend_lanes(typename ModeMath<T>::Wide opacity, bool opaque, boo
 template <class T, class Mode>
 i32 lane_row(i32 n, const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingTables* tables, const T* src, const T* mask,
              T* dst) {
-  using M = ModeMath<T>;
+  using M = typename Lanes<Mode, T>::Math;
   const auto single =
       (mask != nullptr ? zr::single_rows<T, true>() : zr::single_rows<T, false>())[Mode::number - first_mode];
   if (mode->opacity > M::white || runs_into(src, dst, n) || (mask != nullptr && runs_into(mask, dst, n)))
     return single(n, mode, tables, src, mask, dst);
-  const typename M::Wide opacity = mode->opacity;
-  const bool opaque = mode->opacity == M::white;
+  const Source<M> source = {mode->opacity, mode->opacity == M::white};
   const bool keep_alpha = Mode::kind == ModeKind::over && Mode::row_class == RowClass::plain && mode->keep_alpha != 0;
-  each_block<PackOf<Mode, T>>(n, src, mask, dst, [&](const T* s, const T* m, T* d, i32 count) HWY_ATTR {
-    if (!blend_lanes<Mode>(opacity, opaque, keep_alpha, s, m, d)) single(count, mode, tables, s, m, d);
+  each_block<typename Lanes<Mode, T>::Pack>(n, src, mask, dst, [&](const T* s, const T* m, T* d, i32 count) HWY_ATTR {
+    if (!blend_lanes<Mode>(source, keep_alpha, s, m, d)) single(count, mode, tables, s, m, d);
   });
   return 0;
 }
@@ -88,6 +110,81 @@ const InnerRows<T>& lane_rows() {
     return functions;
   }();
   return rows;
+}
+
+// ------------------------------------------------------------------------------ ground modes in one pass
+
+template <class Mode>
+inline constexpr bool on_ground = Mode::row_class == RowClass::black_ground ||
+                                  Mode::row_class == RowClass::white_ground || Mode::row_class == RowClass::grey_ground;
+
+// The four passes of a row, of single numbers.
+template <class T, class Mode>
+i32 single_whole_row(i32 n, const ZR_BlendingMode<T>* mode, const T* src, const T* mask, T* dst) {
+  const GroundRows<T>& rows = single_ground_rows<T>();
+  const PremulRows<T>& black = single_premul_rows<T>();
+  constexpr bool is_black = Mode::kind == ModeKind::black_ground, is_white = Mode::kind == ModeKind::white_ground;
+  const auto main = (mask != nullptr ? single_rows<T, true>() : single_rows<T, false>())[Mode::number - first_mode];
+  (is_black ? black.premul : is_white ? rows.white_fade : rows.grey_fade)(n, nullptr, dst);
+  main(n, mode, nullptr, src, mask, dst);
+  rows.union_alpha(n, src, mode->opacity, mask, dst);
+  return (is_black ? black.unmul : is_white ? rows.white_unfade : rows.grey_unfade)(n, nullptr, dst);
+}
+
+// All passes over the pixels of one vector; false when a channel is illegal, and then nothing is written. What a
+// pass leaves is legal.
+template <class Mode, class T>
+HWY_INLINE bool blend_whole(Source<typename Lanes<Mode, T>::Math> source, const T* src, const T* mask, T* dst) {
+  using M = typename Lanes<Mode, T>::Math;
+  using Pack = typename Lanes<Mode, T>::Pack;
+  using Wide = typename M::Wide;
+  constexpr bool integers = !std::is_same_v<T, ZR_PixelFloat>;
+  if (!source.template load<Pack>(src, mask)) return false;
+  const Px<M> d = Pack::template load<M>(dst);
+  if (!legal(d)) return false;
+  const Px<M>& s = source.pixel;
+  const Wide A = source.covered(s.alpha), D = d.alpha;
+  const auto clear = A == 0;
+  const auto main = [&](const Px<M>& onto) HWY_ATTR { return pick(clear, onto, blend_in_row<Mode>(s, A, onto)); };
+  // Under a white alpha the other passes leave integers as they are; floats round in them.
+  if (integers && all(D == M::white)) {
+    if (!all(clear)) Pack::template store<M>(main(d), dst);
+    return true;
+  }
+  const auto each = [](const Px<M>& p, auto change) HWY_ATTR {
+    return Px<M>{p.alpha, change(p.red), change(p.green), change(p.blue)};
+  };
+  const Px<M> blended = main(each(d, [&](Wide c) HWY_ATTR { return faded<M, Mode::kind>(c, D); }));
+  // The union weighs the mask behind the opacity at every depth.
+  const Wide weight = source.opaque ? s.alpha : M::mul(s.alpha, source.opacity);
+  const Wide R = M::inv(M::mul(M::inv(D), M::inv(source.masked ? M::mul(source.cover, weight) : weight)));
+  const Px<M> out = each(blended, [&](Wide c) HWY_ATTR { return M::stored(unfaded<M, Mode::kind>(c, R)); });
+  Pack::template store<M>(with_alpha<M>(out, R), dst);
+  return true;
+}
+
+template <class T, class Mode>
+i32 whole_row(i32 n, const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingTables*, const T* src, const T* mask,
+              T* dst) {
+  using M = typename Lanes<Mode, T>::Math;
+  if (mode->opacity > M::white) return single_whole_row<T, Mode>(n, mode, src, mask, dst);
+  const Source<M> source = {mode->opacity, mode->opacity == M::white};
+  each_block<typename Lanes<Mode, T>::Pack>(n, src, mask, dst, [&](const T* s, const T* m, T* d, i32 count) HWY_ATTR {
+    if (!blend_whole<Mode>(source, s, m, d)) single_whole_row<T, Mode>(count, mode, s, m, d);
+  });
+  return 0;
+}
+
+template <class T>
+const InnerRows<T>* lane_whole_rows() {
+  static constexpr InnerRows<T> rows = [] {
+    InnerRows<T> functions{};
+    for_each_mode([&]<class Mode>() {
+      if constexpr (on_ground<Mode>) functions[Mode::number - first_mode] = &whole_row<T, Mode>;
+    });
+    return functions;
+  }();
+  return &rows;
 }
 
 }  // namespace HWY_NAMESPACE

@@ -13,6 +13,7 @@ namespace zr {
 namespace HWY_NAMESPACE {
 template const InnerRows<ZR_Pixel16>& lane_rows<ZR_Pixel16, false>();
 template const InnerRows<ZR_Pixel16>& lane_rows<ZR_Pixel16, true>();
+template const InnerRows<ZR_Pixel16>* lane_whole_rows<ZR_Pixel16>();
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
 HWY_AFTER_NAMESPACE();

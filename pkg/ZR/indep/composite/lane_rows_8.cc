@@ -13,6 +13,7 @@ namespace zr {
 namespace HWY_NAMESPACE {
 template const InnerRows<ZR_Pixel8>& lane_rows<ZR_Pixel8, false>();
 template const InnerRows<ZR_Pixel8>& lane_rows<ZR_Pixel8, true>();
+template const InnerRows<ZR_Pixel8>* lane_whole_rows<ZR_Pixel8>();
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
 HWY_AFTER_NAMESPACE();

@@ -13,6 +13,7 @@ namespace zr {
 namespace HWY_NAMESPACE {
 template const InnerRows<ZR_PixelFloat>& lane_rows<ZR_PixelFloat, false>();
 template const InnerRows<ZR_PixelFloat>& lane_rows<ZR_PixelFloat, true>();
+template const InnerRows<ZR_PixelFloat>* lane_whole_rows<ZR_PixelFloat>();
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
 HWY_AFTER_NAMESPACE();

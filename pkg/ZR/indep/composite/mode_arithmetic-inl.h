@@ -9,7 +9,7 @@
 
 #include "composite/soft_light_state.h"
 #ifdef ZR_IN_LANES
-#include "simd/lane_depth-inl.h"
+#include "simd/lane_bytes-inl.h"
 #else
 #include "simd/single-inl.h"
 #endif
@@ -45,21 +45,33 @@ struct IntegerModeMath : Primitive<T> {
   }
 };
 
-template <>
-struct ModeMath<ZR_Pixel8> : IntegerModeMath<ZR_Pixel8> {
+// Of bytes, in numbers of any width.
+template <class T>
+struct ByteModeMath : IntegerModeMath<T> {
+  using D = Primitive<T>;
+  using Wide = Number<T>;
+
   // t drawn toward d. Not smul: the fold of a negative product rounds another way, so the sign is
   // taken out first.
-  static ZR_PURE Wide drawn(Wide t, Wide d, Wide k) { return pick(d >= t, t + mul(d - t, k), t - mul(t - d, k)); }
+  static ZR_PURE Wide drawn(Wide t, Wide d, Wide k) { return pick(d >= t, t + D::mul(d - t, k), t - D::mul(t - d, k)); }
   // Twice s below half and twice s less white above, of the modes that stretch a half to the whole.
   static ZR_PURE Wide stretched_low(Wide s) { return shifted_right<7>(s * 255 + 64); }
-  static inline Wide stretched_high(Wide s) { return div(s - half, 127); }
+  static inline Wide stretched_high(Wide s) { return D::div(s - D::half, 127); }
   static inline Wide soft_low(Wide d) { return entry_of(soft_light_low_8.data(), masked(d, 255)); }
   static inline Wide soft_high(Wide d) { return entry_of(soft_light_high_8.data(), masked(d, 255)); }
-  static ZR_PURE Wide hard_mix(Wide s, Wide d) { return pick(d > mul(254, inv(s)), white, 0); }
+  static ZR_PURE Wide hard_mix(Wide s, Wide d) { return pick(d > D::mul(254, D::inv(s)), D::white, 0); }
   // The mask first, then the opacity; alpha unions and the other depths go the other way round.
-  static ZR_PURE Wide covered(Wide c, Wide opacity, Wide mask) { return mul(mul(mask, c), opacity); }
+  static ZR_PURE Wide covered(Wide c, Wide opacity, Wide mask) { return D::mul(D::mul(mask, c), opacity); }
   static constexpr i32 marker_high = 191, marker_low = 64;  // 0.75 and 0.25 of white
 };
+template <>
+struct ModeMath<ZR_Pixel8> : ByteModeMath<ZR_Pixel8> {};
+#ifdef ZR_IN_LANES
+template <>
+struct ModeMath<NarrowPixel8> : ByteModeMath<NarrowPixel8> {
+  static HWY_INLINE Shorts soft_low(Shorts d) { return mul(d, inv(d)); }  // each entry of the table
+};
+#endif
 
 template <>
 struct ModeMath<ZR_Pixel16> : IntegerModeMath<ZR_Pixel16> {

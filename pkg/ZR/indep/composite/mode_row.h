@@ -45,5 +45,9 @@ template <class T, bool masked>
 const InnerRows<T>& single_rows();
 template <class T, bool masked>
 const InnerRows<T>& inner_rows();
+// Of modes on a ground, all passes of the default row routines in one: for a mask or none, and for rows that have no
+// pixel in common. Null for other modes, and where this processor has no lanes.
+template <class T>
+ZR_InnerBlendingFunc<T> whole_ground_row(i32 index);
 
 }  // namespace zr

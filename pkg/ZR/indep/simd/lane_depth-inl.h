@@ -14,8 +14,12 @@ HWY_BEFORE_NAMESPACE();
 namespace zr {
 namespace HWY_NAMESPACE {
 
+// 8-bit pixels of which each channel takes a lane of 16 bits: see lane_bytes-inl.h.
+struct NarrowPixel8;
+
 template <class T>
-using Number = Lane<std::conditional_t<std::is_same_v<T, ZR_PixelFloat>, f32, i32>>;
+using Number = Lane<std::conditional_t<std::is_same_v<T, ZR_PixelFloat>, f32,
+                                       std::conditional_t<std::is_same_v<T, NarrowPixel8>, i16, i32>>>;
 
 HWY_INLINE Floats magnitude_of(Floats v) { return hn::Abs(v.v); }
 HWY_INLINE Ints held(Ints v, i32 low, i32 high) { return hn::Min(hn::Max(v.v, Ints(low).v), Ints(high).v); }

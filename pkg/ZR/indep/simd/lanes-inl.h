@@ -1,7 +1,7 @@
-// Lanes: vectors of 32-bit numbers that read like single ones, and pixels of which each channel is a vector.
+// Lanes: vectors of numbers that read like single ones, and pixels of which each channel is a vector.
 //
-// Integer channels of 8 and 16 bits are worked on in 32-bit lanes, exactly as single numbers are. Included once
-// for each instruction set.
+// Integer channels of 8 and 16 bits are worked on in 32-bit lanes, exactly as single numbers are; those of 8 bits
+// have 16-bit lanes too. Included once for each instruction set.
 #if defined(ZR_SIMD_LANES_INL_H) == defined(HWY_TARGET_TOGGLE)
 #ifdef ZR_SIMD_LANES_INL_H
 #undef ZR_SIMD_LANES_INL_H
@@ -78,6 +78,7 @@ struct Lane {
   friend HWY_INLINE Bools<N> operator>=(Lane a, Lane b) { return b <= a; }
 };
 using Ints = Lane<i32>;
+using Shorts = Lane<i16>;
 using Floats = Lane<f32>;
 
 template <int bits>
@@ -85,10 +86,19 @@ HWY_INLINE Ints shifted_right(Ints a) {
   return hn::ShiftRight<bits>(a.v);
 }
 template <int bits>
+HWY_INLINE Shorts shifted_right(Shorts a) {
+  return hn::ShiftRight<bits>(a.v);
+}
+template <int bits>
 HWY_INLINE Ints shifted_left(Ints a) {
   return hn::ShiftLeft<bits>(a.v);
 }
+template <int bits>
+HWY_INLINE Shorts shifted_left(Shorts a) {
+  return hn::ShiftLeft<bits>(a.v);
+}
 HWY_INLINE Ints masked(Ints a, i32 bits) { return hn::And(a.v, Ints(bits).v); }
+HWY_INLINE Shorts masked(Shorts a, i16 bits) { return hn::And(a.v, Shorts(bits).v); }
 HWY_INLINE Floats to_float(Ints a) { return hn::ConvertTo(Tag<f32>(), a.v); }
 // Toward zero; the argument fits. Highway's own conversion mends what does not, at some times the price.
 HWY_INLINE Ints fitting_int(Floats a) {
