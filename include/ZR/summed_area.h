@@ -37,6 +37,8 @@ class ZR_API ZR_SummedAreaTable {
   const ZR_PixelDouble* DoubleTable() const { return double_table_; }
 
  private:
+  void free_tables();
+
   ZR_PixelFloat* float_table_ = nullptr;
   ZR_PixelDouble* double_table_ = nullptr;
   i32 width_ = 0, height_ = 0;

@@ -2,12 +2,15 @@
 #include <ZR/summed_area.h>
 
 #include <HB/allocator.h>
+#include <RS/rs.h>
 
 #include <algorithm>
 #include <cmath>
+#include <cstdio>
 #include <new>
 #include <vector>
 
+#include "sample/lane_summed.h"
 #include "sample/lanes.h"
 #include "world/guard.h"
 
@@ -43,6 +46,10 @@ inline void store(const Lanes<f64>& c, ZR_PixelFloat& out) {
 template <class T, class Entry>
 void build(const ZR_World& world, Entry* table) {
   const size_t cells = static_cast<size_t>(world.width) + 1;
+  if (SumWorldFunc<Entry>* const lanes = lane_world_sums<T, Entry>(); lanes != nullptr) {
+    SumRow above(cells, Lanes<f64>::all(0.0));
+    return lanes(world, reinterpret_cast<f64*>(above.data()), table);
+  }
   SumRow previous(cells, Lanes<f64>::all(0.0)), current(cells, Lanes<f64>::all(0.0));
   for (i32 y = 0; y < world.height; ++y) {
     const T* const src =
@@ -55,13 +62,20 @@ void build(const ZR_World& world, Entry* table) {
   }
 }
 
+size_t table_bytes(i32 width, i32 height, size_t entry) {
+  return static_cast<size_t>(width) * static_cast<size_t>(height) * entry;
+}
+// A frame from the pool: fresh pages would cost more than the sums.
 template <class Entry>
 Entry* allocate(i32 width, i32 height) {
-  const size_t bytes = static_cast<size_t>(width) * static_cast<size_t>(height) * sizeof(Entry);
-  void* const block =
-      HB_AllocatePtr(bytes, HB_ZLookupLStrCache(ZR_G_zref, ZR_Str_BlurMemory, 0, 0), ZR_ModuleCode | ZR_Site_Plain);
-  if (block == nullptr) fail(ZR_Err_OutOfMemory);
-  return static_cast<Entry*>(block);
+  const size_t bytes = table_bytes(width, height, sizeof(Entry));
+  void* const block = RS_AllocateFrameQuiet(bytes);
+  if (block != nullptr) return static_cast<Entry*>(block);
+  char text[256];
+  std::snprintf(text, sizeof text, "Out of memory: %s (%zu bytes).",
+                HB_ZLookupLStrCache(ZR_G_zref, ZR_Str_BlurMemory, 0, 0), bytes);
+  HBp_ReportErrString(ZR_ModuleCode | ZR_Site_Plain, ZR_ReportSeverity, text);
+  fail(ZR_Err_OutOfMemory);
 }
 
 // ------------------------------------------------------------------------------------- sampling
@@ -120,15 +134,16 @@ ZR_SummedAreaTable::ZR_SummedAreaTable(const ZR_World* world, bool use_double)
     else
       fill(float_table_ = zr::allocate<ZR_PixelFloat>(width_, height_));
   } catch (const std::bad_alloc&) {  // of the rows; reported
-    HB_FreePtr(float_table_);
-    HB_FreePtr(double_table_);
+    free_tables();
     zr::fail(ZR_Err_OutOfMemory);
   }
 }
 
-ZR_SummedAreaTable::~ZR_SummedAreaTable() {
-  HB_FreePtr(float_table_);
-  HB_FreePtr(double_table_);
+ZR_SummedAreaTable::~ZR_SummedAreaTable() { free_tables(); }
+
+void ZR_SummedAreaTable::free_tables() {
+  RS_FreeFrame(float_table_, zr::table_bytes(width_, height_, sizeof *float_table_));
+  RS_FreeFrame(double_table_, zr::table_bytes(width_, height_, sizeof *double_table_));
 }
 
 template <class O, class T>
