@@ -39,10 +39,16 @@ i32 copy_bits(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect, cons
     copy_in_place<To, From>(src, dst, from.rect);
     return ZR_Err_None;
   }
-  const auto emit = [](i32 n, const i32* columns, const char* src_row, char* dst_pixels) {
+  const LaneColumns* const lanes = lane_columns();
+  const auto emit = [&](i32 n, const i32* columns, const char* src_row, char* dst_pixels, bool apart) {
+    i32 done = 0;
+    if constexpr (std::is_same_v<To, From> && sizeof(To) <= 8) {
+      if (lanes != nullptr && apart)
+        done = (sizeof(To) == 4 ? lanes->pick4 : lanes->pick8)(n, columns, src->width, src_row, dst_pixels);
+    }
     const From* const in = reinterpret_cast<const From*>(src_row);
     To* const out = reinterpret_cast<To*>(dst_pixels);
-    for (i32 k = 0; k < n; ++k) out[k] = copy_pixel<To>(in[columns[k]]);
+    for (i32 k = done; k < n; ++k) out[k] = copy_pixel<To>(in[columns[k]]);
   };
   return copy_scaled({*src, sizeof(From)}, from, {*dst, sizeof(To)}, to, overflow_texts, emit);
 }

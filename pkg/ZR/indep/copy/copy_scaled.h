@@ -8,6 +8,7 @@
 #include <cstring>
 
 #include "copy/copy_rects.h"
+#include "copy/lane_columns.h"
 #include "world/guard.h"
 
 namespace zr {
@@ -41,7 +42,11 @@ struct OverflowTexts {
   const char *x, *y;
 };
 
-// emit(n, source columns, source row, destination pixels) writes n pixels; the source row is that of column 0.
+// Above this a destination does not stay in the caches: what is written to it need not come there.
+inline constexpr i64 streamed_bytes = i64{4} << 20;
+
+// emit(n, source columns, source row, destination pixels, apart) writes n pixels; the source row is that of column 0.
+// Unless source and destination are apart it writes one pixel after the other.
 template <class EmitRow>
 i32 copy_scaled(const CopyPlane& src, const CopySide& from, const CopyPlane& dst, const CopySide& to,
                 const OverflowTexts& texts, EmitRow&& emit) {
@@ -60,34 +65,42 @@ i32 copy_scaled(const CopyPlane& src, const CopySide& from, const CopyPlane& dst
   // memory the rows have to be finished one by one, and a row may have changed between its copies.
   constexpr i32 block = 1024;
   i32 columns[block], row;
-  const auto write_block = [&](i32 k, i32 column, i32 n) {
-    emit(n, columns, src.at(0, row), dst.at(i64{x.first} + column, i64{y.first} + k));
-  };
+  const auto out = [&](i32 k, i32 column) { return dst.at(i64{x.first} + column, i64{y.first} + k); };
   if (src.may_overlap(dst)) {
     for (i32 k = 0; k < y.count; ++k) {
       y.sources(k, 1, &row);
       for (i32 column = 0; column < x.count; column += block) {
         const i32 n = std::min(block, x.count - column);
         x.sources(column, n, columns);
-        write_block(k, column, n);
+        emit(n, columns, src.at(0, row), out(k, column), false);
       }
     }
     return ZR_Err_None;
   }
+  // Rows that are shown several times are made once, beside the destination where that is large.
+  const LaneColumns* const lanes = lane_columns();
+  const bool large = i64{x.count} * y.count * dst.pixel_bytes >= streamed_bytes;
+  alignas(64) char kept[block * 16];
+  const bool streams = lanes != nullptr && large && dst.pixel_bytes <= 16 && y.dst_extent > y.src_extent;
   for (i32 column = 0; column < x.count; column += block) {
     const i32 n = std::min(block, x.count - column);
+    const std::size_t bytes = static_cast<std::size_t>(n) * static_cast<std::size_t>(dst.pixel_bytes);
     x.sources(column, n, columns);
     i32 row_above = -1;
     for (i32 k = 0; k < y.count; ++k, row_above = row) {
       y.sources(k, 1, &row);
-      if (row == row_above) {
-        char* const out = dst.at(i64{x.first} + column, i64{y.first} + k);
-        std::memmove(out, out - dst.row_bytes, static_cast<std::size_t>(n) * static_cast<std::size_t>(dst.pixel_bytes));
+      char* const pixels = out(k, column);
+      if (streams) {
+        if (row != row_above) emit(n, columns, src.at(0, row), kept, true);
+        lanes->stream(bytes, kept, pixels);
+      } else if (row == row_above) {
+        std::memcpy(pixels, pixels - dst.row_bytes, bytes);
       } else {
-        write_block(k, column, n);
+        emit(n, columns, src.at(0, row), pixels, true);
       }
     }
   }
+  if (streams) lanes->finish();
   return ZR_Err_None;
 }
 

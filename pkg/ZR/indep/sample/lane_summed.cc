@@ -114,7 +114,7 @@ SumWorldFunc<Entry>* world_sums() {
 #endif
 }
 
-#define ZR_INSTANTIATE(T)                                     \
+#define ZR_INSTANTIATE(T)                                               \
   template SumWorldFunc<ZR_PixelFloat>* world_sums<T, ZR_PixelFloat>(); \
   template SumWorldFunc<ZR_PixelDouble>* world_sums<T, ZR_PixelDouble>();
 ZR_INSTANTIATE(ZR_Pixel8)
@@ -139,7 +139,7 @@ SumWorldFunc<Entry>* lane_world_sums() {
   return nullptr;
 }
 
-#define ZR_INSTANTIATE(T)                                     \
+#define ZR_INSTANTIATE(T)                                                    \
   template SumWorldFunc<ZR_PixelFloat>* lane_world_sums<T, ZR_PixelFloat>(); \
   template SumWorldFunc<ZR_PixelDouble>* lane_world_sums<T, ZR_PixelDouble>();
 ZR_INSTANTIATE(ZR_Pixel8)
