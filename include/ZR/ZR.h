@@ -14,6 +14,7 @@
 #include <ZR/platform.h>
 #include <ZR/prisma.h>
 #include <ZR/slots.h>
+#include <ZR/suites.h>
 #include <ZR/summed_area.h>
 #include <ZR/transfer_mode.h>
 #include <ZR/vec_pixel.h>

@@ -58,6 +58,7 @@ enum ZR_CallSite : u32 {
   ZR_Site_DepthConvert = 0x87,
   ZR_Site_TransformWorld = 0x88,
   ZR_Site_Blur = 0x89,
+  ZR_Site_WorldSuite = 0x98,
   ZR_Site_UnknownDepth = 0x3e7,
   ZR_Site_GuessAlpha = 0x90,
   ZR_Site_MatteRow = 0x91,

@@ -11,6 +11,7 @@
 #pragma once
 
 #include <ZR/module.h>
+#include <ZR/suites.h>
 
 #include <string>
 #include <vector>
@@ -50,12 +51,7 @@ i32 ADDIN_UnprepRoutine(ADDIN_Routine* routine);  // 516 if it is not prepared
 // Suites: a name, two versions and a table of functions; name and table are kept as addresses and must live
 // until ADDIN_ClearTWSuites. Registering a name and both versions again is 516.
 i32 ADDIN_AddTWSuite(i32, i32, const char* name, i32 version_a, i32 version_b, i32 count, void* const* table);
-// The suite through which others are looked up.
-struct ADDIN_BasicSuite {
-  // The table; of several second versions the highest. 515, and null, for one not there.
-  i32 (*acquire)(const char* name, i32 version_a, const void** suite);
-  i32 (*release)(const char* name, i32 version_a);  // 515 for one not there, 516 for one not acquired
-};
+using ADDIN_BasicSuite = ZR_BasicSuite;  // the suite through which others are looked up
 i32 ADDIN_GetTWBasicSuite(const ADDIN_BasicSuite** out);
 void ADDIN_ClearTWSuites();  // ZR_Death calls it
 

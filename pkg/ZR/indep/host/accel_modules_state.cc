@@ -11,6 +11,7 @@
 #include <string>
 
 #include "host/ansi_functions.h"
+#include "host/suites_state.h"
 #include "world/constants_state.h"
 #include "world/guard.h"
 
@@ -145,7 +146,10 @@ i32 scan_file(ADDIN_File* file) {
   });
 }
 
-i32 scan_done() { return ADDIN_GetTWBasicSuite(&G_basic_suite); }
+i32 scan_done() {
+  if (const i32 error = register_suites(); error != ZR_Err_None) return error;
+  return ADDIN_GetTWBasicSuite(&G_basic_suite);
+}
 
 }  // namespace
 
