@@ -1,5 +1,6 @@
 // The ready host: what it sets before birth it takes back after death.
 #include <ZR/hostkit.h>
+#include <ZR/module.h>
 #include <ZR/platform.h>
 #include <ZR/slots.h>
 
@@ -8,6 +9,7 @@
 #include <utility>
 
 #include "divided_calls_state.h"
+#include "slot_trials.h"
 #include "threaded_iterate.h"
 #include "threaded_iterate_state.h"
 
@@ -30,6 +32,7 @@ struct Hostkit::State {
     if (ZRp_G_OverFuncs[ZR_Slot_iterate_generic] == reinterpret_cast<ZR_SlotFunc>(&threaded_iterate))
       ZRp_G_OverFuncs[ZR_Slot_iterate_generic] = reinterpret_cast<ZR_SlotFunc>(&ZR_IterateGeneric_Static);
     HB_SetNumThreads(0);
+    ZR_SetSlotCheck(nullptr, nullptr);
     if (!options.module_folders.empty()) ADDIN_SetModuleFolders(nullptr, 0);
     if (options.message_sink) HB_SetMessageSink(nullptr, nullptr);
     if (options.verification_sink) HB_SetVerificationSink(nullptr, nullptr);
@@ -59,6 +62,7 @@ struct Hostkit::State {
     }
     if (options.frame_pool_limit >= 0) RS_SetFramePoolLimit(static_cast<u64>(options.frame_pool_limit));
     HB_SetNumThreads(workers.count());
+    ZR_SetSlotCheck(&check_slot, nullptr);
   }
   void begin_life() {
     if (const i32 error = ZR_Birth(); error != ZR_Err_None)

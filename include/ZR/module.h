@@ -66,6 +66,49 @@ typedef struct ZR_ModuleRoutine {
   ZR_ModuleEntry entry;
 } ZR_ModuleRoutine;
 
+/* ------------------------------------------------------------------------------ for hosts */
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+/* The name of a slot as in ZR_SlotIndex, without its prefix; null for one without. Any thread. */
+ZR_API const char* ZR_GetSlotName(i32 slot);
+
+/* Compares two routines of a slot, on the main thread, while the library is being born: 0 where `now` does what
+ * `before` does, or where that cannot be told. A Hostkit brings one (<ZR/hostkit.h>). */
+typedef i32 (*ZR_SlotCheck)(void* refcon, i32 slot, ZR_SlotFunc before, ZR_SlotFunc now);
+/* The check of the following births: asked for each slot that a routine of a module rewrote, after it was loaded and
+ * before the suites are made. A slot that was emptied counts as one that differs, unasked. What differs is named in the
+ * log and, by the preference "module.check" (ZR_MODULE_CHECK=off|warn|strict), put back (strict, without a preference),
+ * kept (warn), or not asked for (off). Null: no check. Main thread. */
+ZR_API void ZR_SetSlotCheck(ZR_SlotCheck check, void* refcon);
+
+/* What the last birth found in the module folders, file by file: path, whether it was accepted, and if not why. The
+ * texts are valid until the next birth. 516 for an index behind the last. Main thread. */
+typedef struct ZR_ModuleFile {
+  const char* path;
+  i32 accepted;
+  const char* reason; /* empty for one accepted */
+} ZR_ModuleFile;
+ZR_API i32 ZR_GetModuleFile(i32 index, ZR_ModuleFile* out);
+/* The same for the slots that accepted modules rewrote, in the order of loading. Valid until death. */
+typedef enum ZR_SlotVerdict {
+  ZR_SlotVerdict_Replaced = 0, /* and in use: not checked, or found equal */
+  ZR_SlotVerdict_Kept = 1,     /* differs and is in use */
+  ZR_SlotVerdict_PutBack = 2   /* differs and is not in use */
+} ZR_SlotVerdict;
+typedef struct ZR_ModuleSlot {
+  const char* routine; /* the module's name for its routine */
+  i32 slot;
+  i32 verdict;
+} ZR_ModuleSlot;
+ZR_API i32 ZR_GetModuleSlot(i32 index, ZR_ModuleSlot* out);
+
+#ifdef __cplusplus
+}
+#endif
+
 #define ZR_ModuleDescriptorVersion 1u
 #define ZR_ModuleDescriptorSymbol "ZR_Module"
 typedef struct ZR_ModuleDescriptor {

@@ -72,16 +72,16 @@ typedef struct ZR_HandleSuite2 {
 #define ZR_ColorSuite_Name "ZR Color Suite"
 #define ZR_Color16Suite_Name "ZR Color16 Suite"
 #define ZR_ColorFloatSuite_Name "ZR ColorFloat Suite"
-#define ZR_COLOR_SUITE(Suite, Pixel, Measure)                      \
-  typedef struct Suite {                                           \
-    i32 (*rgb_to_hls)(void* ref, const Pixel* in, i32 hls[3]);     \
-    i32 (*hls_to_rgb)(void* ref, const i32 hls[3], Pixel* out);    \
-    i32 (*rgb_to_yiq)(void* ref, const Pixel* in, i32 yiq[3]);     \
-    i32 (*yiq_to_rgb)(void* ref, const i32 yiq[3], Pixel* out);    \
-    i32 (*luminance)(void* ref, const Pixel* in, Measure* out);    \
-    i32 (*hue)(void* ref, const Pixel* in, Measure* out);          \
-    i32 (*lightness)(void* ref, const Pixel* in, Measure* out);    \
-    i32 (*saturation)(void* ref, const Pixel* in, Measure* out);   \
+#define ZR_COLOR_SUITE(Suite, Pixel, Measure)                    \
+  typedef struct Suite {                                         \
+    i32 (*rgb_to_hls)(void* ref, const Pixel* in, i32 hls[3]);   \
+    i32 (*hls_to_rgb)(void* ref, const i32 hls[3], Pixel* out);  \
+    i32 (*rgb_to_yiq)(void* ref, const Pixel* in, i32 yiq[3]);   \
+    i32 (*yiq_to_rgb)(void* ref, const i32 yiq[3], Pixel* out);  \
+    i32 (*luminance)(void* ref, const Pixel* in, Measure* out);  \
+    i32 (*hue)(void* ref, const Pixel* in, Measure* out);        \
+    i32 (*lightness)(void* ref, const Pixel* in, Measure* out);  \
+    i32 (*saturation)(void* ref, const Pixel* in, Measure* out); \
   } Suite;
 ZR_COLOR_SUITE(ZR_ColorSuite1, ZR_Pixel8, i32)
 ZR_COLOR_SUITE(ZR_Color16Suite1, ZR_Pixel16, i32)
@@ -97,11 +97,11 @@ typedef struct ZR_BatchSamplingSuite1 {
 #define ZR_Sampling8Suite_Name "ZR Sampling8 Suite"
 #define ZR_Sampling16Suite_Name "ZR Sampling16 Suite"
 #define ZR_SamplingFloatSuite_Name "ZR SamplingFloat Suite"
-#define ZR_SAMPLING_SUITE(Suite, Pixel)                                                                  \
-  typedef struct Suite {                                                                                 \
-    i32 (*nearest)(const ZR_ProgressInfo*, i32 x, i32 y, const ZR_SampPB* params, Pixel* dst);           \
-    i32 (*bilinear)(const ZR_ProgressInfo*, i32 x, i32 y, const ZR_SampPB* params, Pixel* dst);          \
-    i32 (*area)(const ZR_ProgressInfo*, i32 x, i32 y, const ZR_SampPB* params, Pixel* dst);              \
+#define ZR_SAMPLING_SUITE(Suite, Pixel)                                                         \
+  typedef struct Suite {                                                                        \
+    i32 (*nearest)(const ZR_ProgressInfo*, i32 x, i32 y, const ZR_SampPB* params, Pixel* dst);  \
+    i32 (*bilinear)(const ZR_ProgressInfo*, i32 x, i32 y, const ZR_SampPB* params, Pixel* dst); \
+    i32 (*area)(const ZR_ProgressInfo*, i32 x, i32 y, const ZR_SampPB* params, Pixel* dst);     \
   } Suite;
 ZR_SAMPLING_SUITE(ZR_Sampling8Suite1, ZR_Pixel8)
 ZR_SAMPLING_SUITE(ZR_Sampling16Suite1, ZR_Pixel16)
@@ -157,13 +157,13 @@ typedef struct ZR_WorldTransformSuite1 {
   i32 (*composite_rect)(const ZR_ProgressInfo*, const GX_LRect* rect, u8 opacity, ZR_LayerDef* src, i32 dest_x,
                         i32 dest_y, i32 field, u32 flags, ZR_LayerDef* dst);
   i32 (*blend)(const ZR_ProgressInfo*, ZR_LayerDef* src1, ZR_LayerDef* src2, i32 ratio, ZR_LayerDef* dst);
-  i32 (*convolve)(const ZR_ProgressInfo*, ZR_LayerDef* src, const GX_LRect* rect, u32 flags, i32 size,
-                  const i32* alpha, const i32* red, const i32* green, const i32* blue, ZR_LayerDef* dst);
+  i32 (*convolve)(const ZR_ProgressInfo*, ZR_LayerDef* src, const GX_LRect* rect, u32 flags, i32 size, const i32* alpha,
+                  const i32* red, const i32* green, const i32* blue, ZR_LayerDef* dst);
   ZR_CopyBitsRoutine copy;    /* draft */
   ZR_CopyBitsRoutine copy_hq; /* best */
   i32 (*transfer_rect)(const ZR_ProgressInfo*, i32 quality, u32 flags, i32 field, const GX_LRect* rect,
-                       ZR_LayerDef* src, const ZR_CompositeMode* mode, const ZR_MaskWorld* mask, i32 dest_x,
-                       i32 dest_y, ZR_LayerDef* dst);
+                       ZR_LayerDef* src, const ZR_CompositeMode* mode, const ZR_MaskWorld* mask, i32 dest_x, i32 dest_y,
+                       ZR_LayerDef* dst);
   i32 (*transform_world)(const ZR_ProgressInfo*, i32 quality, u32 flags, i32 field, ZR_LayerDef* src,
                          const ZR_CompositeMode* mode, const ZR_MaskWorld* mask, const GX_Matrix3* matrices, i32 count,
                          bool src2dst, const GX_LRect* dst_rect, ZR_LayerDef* dst);

@@ -6,11 +6,11 @@
 #include <SEQ/seq.h>
 
 #include <algorithm>
-#include <array>
 #include <cstdlib>
 #include <string>
 
 #include "host/ansi_functions.h"
+#include "host/slot_review_state.h"
 #include "host/suites_state.h"
 #include "world/constants_state.h"
 #include "world/guard.h"
@@ -41,11 +41,10 @@ constexpr u32 module_version = 2;
 // All slots as one image, to be put back when a module fails.
 class SlotImage {
  public:
-  SlotImage() { std::copy(std::begin(ZRp_G_OverFuncs), std::end(ZRp_G_OverFuncs), slots_.begin()); }
-  void put_back() const { std::copy(slots_.begin(), slots_.end(), std::begin(ZRp_G_OverFuncs)); }
+  SlotImage() { std::copy(std::begin(ZRp_G_OverFuncs), std::end(ZRp_G_OverFuncs), std::begin(slots)); }
+  void put_back() const { std::copy(std::begin(slots), std::end(slots), std::begin(ZRp_G_OverFuncs)); }
 
- private:
-  std::array<ZR_SlotFunc, ZR_SlotCount> slots_;
+  ZR_SlotFunc slots[ZR_SlotCount];
 };
 
 // Let go of on every way out, until it is kept.
@@ -132,8 +131,12 @@ i32 load_routine(ADDIN_File* file, i32 index) {
   fill_block(module.block);
   i32 result = guarded(
       [&] { return module.entry(ZR_ModuleCommand_Load, &module.own_words[0], &module.block, &module.own_words[1]); });
+  if (result == ZR_Err_None) result = guarded([&] { return review_slots(info.name, before.slots), ZR_Err_None; });
   if (result == ZR_Err_None) result = held.keep();
-  if (result != ZR_Err_None) before.put_back();
+  if (result != ZR_Err_None) {
+    before.put_back();
+    forget_slot_review_of(info.name);
+  }
   return result;
 }
 
@@ -169,6 +172,7 @@ i32 run_module_scan() {
 
 i32 unload_modules() {
   G_basic_suite = nullptr;
+  forget_slot_review();
   if (G_loaded == nullptr) return ZR_Err_None;
   i32 result = ZR_Err_None;
   const i32 count = SEQ_GetCount(G_loaded);

@@ -74,12 +74,12 @@ void fill_tables(Tables& t) {
   std::memcpy(&t.ansi, ansi, sizeof ansi);
   t.handle = {host_handle_new,     host_handle_lock, host_handle_unlock,
               host_handle_dispose, host_handle_size, host_handle_resize};
-  t.color = {ZR_RGBtoHLS_Straight, ZR_HLStoRGB_Straight, ZR_RGBtoYIQ_Straight,  ZR_YIQtoRGB_Straight,
-             ZR_Luminance_Straight, ZR_Hue_Straight,     ZR_Lightness_Straight, ZR_Saturation_Straight};
+  t.color = {ZR_RGBtoHLS_Straight,  ZR_HLStoRGB_Straight, ZR_RGBtoYIQ_Straight,  ZR_YIQtoRGB_Straight,
+             ZR_Luminance_Straight, ZR_Hue_Straight,      ZR_Lightness_Straight, ZR_Saturation_Straight};
   t.color16 = {ZR_RGBtoHLS_Straight16,  ZR_HLStoRGB_Straight16, ZR_RGBtoYIQ_Straight16,  ZR_YIQtoRGB_Straight16,
                ZR_Luminance_Straight16, ZR_Hue_Straight16,      ZR_Lightness_Straight16, ZR_Saturation_Straight16};
-  t.color_float = {ZR_RGBtoHLS_StraightFloat, ZR_HLStoRGB_StraightFloat,  ZR_RGBtoYIQ_StraightFloat,
-                   ZR_YIQtoRGB_StraightFloat, ZR_Luminance_StraightFloat, ZR_Hue_StraightFloat,
+  t.color_float = {ZR_RGBtoHLS_StraightFloat,  ZR_HLStoRGB_StraightFloat,  ZR_RGBtoYIQ_StraightFloat,
+                   ZR_YIQtoRGB_StraightFloat,  ZR_Luminance_StraightFloat, ZR_Hue_StraightFloat,
                    ZR_Lightness_StraightFloat, ZR_Saturation_StraightFloat};
   t.batch_sampling = {};
   t.sampling8 = {slot<ZR_Slot_nn_sample8>(), slot<ZR_Slot_bilinear_straight8>(), slot<ZR_Slot_area_straight8>()};
@@ -111,7 +111,6 @@ i32 add(const char* name, i32 version_a, i32 version_b, const Table& table) {
 }  // namespace
 
 i32 register_suites() {
-  ADDIN_ClearTWSuites();  // of a life that did not end
   fill_tables(G_tables);
   const Tables& t = G_tables;
   i32 result = ZR_Err_None;
