@@ -65,12 +65,12 @@ TEST_F(Birth, ASecondOneStartsOverAndHoldsNoMore) {
   const u64 held = live_blocks();
   const ZR_SlotFunc iterate = ZRp_G_OverFuncs[ZR_Slot_iterate];
   ASSERT_EQ(ZR_SetOverrideFunc(ZR_Slot_iterate, reinterpret_cast<void*>(&ZR_Hypot)), 0);
-  ASSERT_EQ(ZR_SetOverrideFunc(ZR_Slot_convolve, reinterpret_cast<void*>(&ZR_Hypot)), 0);
+  ASSERT_EQ(ZR_SetOverrideFunc(ZR_Slot_module1, reinterpret_cast<void*>(&ZR_Hypot)), 0);
   ZR_G_LiveWorlds = 5;
   ZR_G_LiveChunks = -3;
   ASSERT_EQ(ZR_Birth(), 0);
   EXPECT_EQ(ZRp_G_OverFuncs[ZR_Slot_iterate], iterate);
-  EXPECT_EQ(ZRp_G_OverFuncs[ZR_Slot_convolve], nullptr);
+  EXPECT_EQ(ZRp_G_OverFuncs[ZR_Slot_module1], nullptr);
   EXPECT_EQ(ZR_G_LiveWorlds, 0);
   EXPECT_EQ(ZR_G_LiveChunks, 0);
   EXPECT_EQ(live_blocks(), held);

@@ -15,7 +15,7 @@ struct Range {
   int first, last;
 };
 // Slots with a routine; every other one is null.
-constexpr Range filled[] = {{2, 10},  {17, 25}, {31, 32}, {35, 48}, {51, 53}, {57, 58},  {60, 61},
+constexpr Range filled[] = {{2, 10},  {17, 28}, {31, 32}, {35, 48}, {51, 53}, {57, 58},  {60, 61},
                             {63, 65}, {68, 68}, {70, 78}, {83, 84}, {86, 87}, {94, 112}, {115, 117}};
 
 using Slots = BornLibrary;

@@ -147,7 +147,11 @@ inline ZR_LinearBlendingTables gamma_tables(f64 gamma) {
 template <class D>
 using Linear = std::conditional_t<is_eight<D>, Sixteen, D>;
 
-inline f32 signed_power(f32 c, f32 exponent) { return c >= 0 ? std::pow(c, exponent) : -std::pow(-c, exponent); }
+// The power that is nearest in single precision.
+inline f32 signed_power(f32 c, f32 exponent) {
+  const auto power = [&](f64 v) { return static_cast<f32>(std::pow(v, static_cast<f64>(exponent))); };
+  return c >= 0 ? power(c) : -power(-c);
+}
 
 template <class D>
 typename Linear<D>::V alpha_into(typename D::V a) {
