@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cmath>
 #include <type_traits>
 
 namespace zr {
@@ -27,7 +28,7 @@ struct BellMath<ZR_Pixel16> {
   static u16 stored(f32 v) { return static_cast<u16>(truncate_i32(v)); }
   static u16 premultiplied(f32 sum, f32 divisor) { return stored((sum + divisor / 2) / divisor); }
   static u16 straight(f32 sum, f32 alpha) {
-    return stored(std::min((sum * 32768 + static_cast<f32>(truncate_i32(alpha / 2))) / alpha, 32768.0f));
+    return stored(std::min((sum * 32768 + std::trunc(alpha / 2)) / alpha, 32768.0f));
   }
 };
 template <>

@@ -64,7 +64,7 @@ void weigh(const Box& box, bool renormalise, const Strip<T>& in, i64 position, B
     const i64 whole = (box.reach << 11) - 2 * shortfall + 1024;
     const i64 divisor = renormalise ? inside * 1024 - edges * shortfall : whole;
     weights->shortfall = shortfall;
-    if (weights->divisor != divisor) weights->divide_by(static_cast<i32>(divisor));
+    weights->divisor = static_cast<i32>(divisor);
   } else {
     const f32 edge = edges == 0 ? 0 : edges == 1 ? box.shortfall : box.shortfall + box.shortfall;
     weights->shortfall = box.shortfall;
@@ -83,7 +83,6 @@ class BoxPass {
     run_ = {};
     run_.pixels = pixels;
     run_.sums = sums;
-    run_.weights.divisor = -1;
     std::memset(sums, 0, static_cast<std::size_t>(pixels) * 4 * sizeof(f64));
     const i64 low = std::max(start - box.reach - 1, in.low), high = std::min(start + box.reach, in.high);
     if (low < high) rows.add(pixels, high - low, in.at(low), in.step, sums);

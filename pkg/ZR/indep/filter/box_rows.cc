@@ -3,19 +3,8 @@
 
 #include <algorithm>
 #include <array>
-#include <bit>
 
 namespace zr {
-
-void BoxWeights<ZR_Pixel8>::divide_by(i32 weight) {
-  divisor = weight;
-  // With l bits to hold weight - 1, reciprocal = ceil(2^(31 + l) / weight) fits 32 bits, and what it has too much
-  // times a numerator below 2^31 stays below one part in weight.
-  const i32 bits = std::bit_width(static_cast<u32>(std::max(weight, 2) - 1));
-  const u64 top = u64{1} << (31 + bits), below = static_cast<u64>(std::max(weight, 2));
-  reciprocal = static_cast<u32>((top + below - 1) / below);
-  shift = bits;
-}
 
 namespace {
 

@@ -13,15 +13,11 @@ namespace zr {
 
 template <class T>
 struct BoxWeights;
-// Weights of 8 bits in 1/1024 pixel.
+// Of 8 bits in 1/1024 pixel. A divisor of 0 gives clear pixels.
 template <>
 struct BoxWeights<ZR_Pixel8> {
-  i32 shortfall;   // of the edge
-  i32 divisor;     // 0 gives clear pixels
-  u32 reciprocal;  // quotients are numerator * reciprocal >> 31 >> shift, exact for numerators below 2^31
-  i32 shift;
-
-  void divide_by(i32 weight);
+  i32 shortfall;  // of the edge
+  i32 divisor;
 };
 template <class T>
 struct FloatBoxWeights {

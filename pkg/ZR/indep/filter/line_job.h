@@ -19,7 +19,7 @@
 namespace zr {
 
 // Vectors of every depth hold up to this many pixels: strips are filtered in whole groups of them.
-inline constexpr i32 strip_group = 4;
+inline constexpr i32 strip_group = 8;
 
 template <class T>
 struct Strip {
