@@ -44,6 +44,18 @@ TEST_F(Selectors, GiveTheSameFixedRoutinesAsTheBlock) {
   }
 }
 
+TEST_F(Selectors, LeadToRoutinesThatNoBlockHolds) {
+  void* block[69];
+  ASSERT_EQ(ZR_GetCallbackBlock(1, 1, block), 0);
+  const std::pair<i32, void*> routines[] = {
+      {-4, address_of(&ZR_InsertPlanes)}, {-3, address_of(&ZR_ExtractPlanes)}, {-1, address_of(&ZR_PaintSpot)}};
+  for (const auto& [selector, routine] : routines) {
+    void* found = nullptr;
+    EXPECT_EQ(ZR_GetCallbackAddr(nullptr, 0, 0, selector, &found), 0);
+    EXPECT_EQ(found, routine) << selector;
+  }
+}
+
 TEST_F(Selectors, OthersAreRefusedByName) {
   std::set<i32> listed = {-5, -4, -3, -1};
   for (const SlotChoice& one : from_slots) listed.insert(one.number);

@@ -1,0 +1,138 @@
+// Pixel measures and conversions: stated values, exact integer measures of random pixels, and round trips.
+#include <ZR/pixel_measures.h>
+
+#include <cmath>
+
+#include "support/born_library.h"
+
+namespace {
+
+constexpr i32 one = 65536;
+
+class PixelMeasures : public BornLibrary {};
+
+TEST_F(PixelMeasures, OfKnownColours) {
+  const struct {
+    ZR_Pixel8 pixel;
+    i32 hls[3];
+    i32 luminance, hue, lightness, saturation;
+  } colours[] = {
+      {{255, 255, 0, 0}, {0, one / 2, one}, 7650, 0, 127, 255},
+      {{9, 0, 255, 0}, {120 * one, one / 2, one}, 15045, 85, 127, 255},
+      {{0, 0, 0, 255}, {240 * one, one / 2, one}, 2805, 170, 127, 255},
+      {{0, 255, 0, 1}, {23577540, one / 2, one}, 7661, 255, 127, 255},  // a hair below 360 degrees
+      {{0, 255, 255, 255}, {0, one, 0}, 25500, 0, 255, 0},
+      {{0, 77, 77, 77}, {0, 19789, 0}, 7700, 0, 77, 0},
+      {{0, 0, 0, 0}, {0, 0, 0}, 0, 0, 0, 0},
+      {{0, 255, 200, 200}, {0, 58468, one}, 21650, 0, 227, 11},
+  };
+  for (const auto& c : colours) {
+    i32 hls[3], luminance, hue, lightness, saturation;
+    EXPECT_EQ(ZR_RGBtoHLS_Straight(nullptr, &c.pixel, hls), 0);
+    EXPECT_NEAR(hls[0], c.hls[0], 1);
+    EXPECT_EQ(hls[1], c.hls[1]);
+    EXPECT_EQ(hls[2], c.hls[2]);
+    EXPECT_EQ(ZR_Luminance_Straight(nullptr, &c.pixel, &luminance), 0);
+    EXPECT_EQ(ZR_Hue_Straight(nullptr, &c.pixel, &hue), 0);
+    EXPECT_EQ(ZR_Lightness_Straight(nullptr, &c.pixel, &lightness), 0);
+    EXPECT_EQ(ZR_Saturation_Straight(nullptr, &c.pixel, &saturation), 0);
+    EXPECT_EQ(luminance, c.luminance);
+    EXPECT_EQ(hue, c.hue);
+    EXPECT_EQ(lightness, c.lightness);
+    EXPECT_EQ(saturation, c.saturation);
+  }
+  const ZR_Pixel16 white = {0, 32768, 32768, 32768}, violet = {0, 16384, 0, 32768};
+  i32 number;
+  ZR_Luminance_Straight16(nullptr, &white, &number);
+  EXPECT_EQ(number, 3276800);
+  ZR_Hue_Straight16(nullptr, &violet, &number);
+  EXPECT_EQ(number, 191) << "270 degrees, a byte at 16 bits too";
+  ZR_Saturation_Straight16(nullptr, &violet, &number);
+  EXPECT_EQ(number, 32768);
+  const ZR_PixelFloat olive = {0, 0.5f, 0.5f, 0};
+  f32 real;
+  ZR_Hue_StraightFloat(nullptr, &olive, &real);
+  EXPECT_EQ(real, 60.0f / 360.0f);
+  ZR_Saturation_StraightFloat(nullptr, &olive, &real);
+  EXPECT_EQ(real, 0.25f);
+  ZR_Lightness_StraightFloat(nullptr, &olive, &real);
+  EXPECT_EQ(real, 0.25f);
+}
+
+TEST_F(PixelMeasures, RoundTripsAndSumsOfRoundedTerms) {
+  for (u32 seed = 0; seed < 4096; ++seed) {
+    const u32 word = seed * 2654435761u;
+    const ZR_Pixel8 p = {200, static_cast<u8>(word), static_cast<u8>(word >> 8), static_cast<u8>(word >> 16)};
+    i32 words[3];
+    const auto expect_back = [&](const ZR_Pixel8& back, i32 within) {
+      EXPECT_EQ(back.alpha, 7) << "alpha is the caller's";
+      EXPECT_NEAR(back.red, p.red, within);
+      EXPECT_NEAR(back.green, p.green, within);
+      EXPECT_NEAR(back.blue, p.blue, within);
+    };
+    ZR_Pixel8 back = {7, 0, 0, 0};
+    ZR_RGBtoHLS_Straight(nullptr, &p, words);
+    ZR_HLStoRGB_Straight(nullptr, words, &back);
+    expect_back(back, 0);
+    ZR_RGBtoYIQ_Straight(nullptr, &p, words);
+    const auto term = [](f32 unit, f32 weight) {
+      return static_cast<i32>(std::lround(static_cast<f64>(unit * weight) * one));
+    };
+    const f32 r = static_cast<f32>(p.red) / 255, g = static_cast<f32>(p.green) / 255,
+              b = static_cast<f32>(p.blue) / 255;
+    EXPECT_NEAR(words[0], term(r, 0.2989f) + term(g, 0.5866f) + term(b, 0.1144f), 1);
+    EXPECT_NEAR(words[1], term(r, 0.5959f) + term(g, -0.2741f) + term(b, -0.3218f), 1);
+    EXPECT_NEAR(words[2], term(r, 0.2113f) + term(g, -0.5227f) + term(b, 0.3113f), 1);
+    ZR_YIQtoRGB_Straight(nullptr, words, &back);
+    expect_back(back, 1);
+    // At 16 bits the same words give the same colours, finer.
+    ZR_Pixel16 deep = {7, 0, 0, 0};
+    ZR_YIQtoRGB_Straight16(nullptr, words, &deep);
+    EXPECT_NEAR(deep.red * 255 / 32768.0, back.red, 0.51);
+    EXPECT_EQ(deep.alpha, 7);
+  }
+  const i32 bright[3] = {3 * one, 0, 0};
+  ZR_PixelFloat above = {0.25f, 0, 0, 0};
+  ZR_YIQtoRGB_StraightFloat(nullptr, bright, &above);
+  EXPECT_EQ(above.green, 3.0f);
+  EXPECT_EQ(above.alpha, 0.25f);
+}
+
+TEST_F(PixelMeasures, PremultipliedFormsUseThePixelsOwnAlpha) {
+  for (const u8 alpha : {u8{0}, u8{1}, u8{77}, u8{128}, u8{254}, u8{255}}) {
+    const ZR_Pixel8 p = {alpha, static_cast<u8>(alpha / 2), static_cast<u8>(alpha / 3), alpha};
+    const auto over = [&](u8 c) { return ZRp_G_fcd_table[alpha * 256 + c]; };
+    const ZR_Pixel8 straight = {alpha, over(p.red), over(p.green), over(p.blue)};
+    i32 expected[3], words[3];
+    ZR_RGBtoHLS_Straight(nullptr, &straight, expected);
+    ZR_RGBtoHLS_Premul(nullptr, &p, words);
+    EXPECT_TRUE(std::equal(words, words + 3, expected));
+    ZR_Pixel8 out = {alpha, 1, 2, 3};
+    ZR_HLStoRGB_Premul(nullptr, words, &out);
+    EXPECT_EQ(out.alpha, alpha);
+    EXPECT_EQ(out.blue, ZRp_G_fcm_table[alpha * 256 + straight.blue]);
+    i32 luminance, plain;
+    ZR_Luminance_Premul(nullptr, &p, &luminance);
+    ZR_Luminance_Straight(nullptr, &straight, &plain);
+    EXPECT_EQ(luminance, plain);
+  }
+}
+
+TEST_F(PixelMeasures, OfAnythingAreDefined) {
+  i32 words[3] = {INT32_MIN, INT32_MAX, INT32_MIN}, number;
+  f32 real;
+  ZR_PixelFloat odd = {NAN, INFINITY, -INFINITY, NAN};
+  ZR_Pixel16 illegal = {65535, 65535, 65000, 65535};
+  EXPECT_EQ(ZR_HLStoRGB_Straight16(nullptr, words, &illegal), 0);
+  EXPECT_EQ(ZR_RGBtoHLS_StraightFloat(nullptr, &odd, words), 0);
+  EXPECT_EQ(ZR_RGBtoYIQ_StraightFloat(nullptr, &odd, words), 0);
+  EXPECT_EQ(ZR_Hue_StraightFloat(nullptr, &odd, &real), 0);
+  illegal = {65535, 65535, 65000, 0};
+  EXPECT_EQ(ZR_Saturation_Straight16(nullptr, &illegal, &number), 0);
+  EXPECT_EQ(number, 1);
+  EXPECT_EQ(ZR_Luminance_Straight(nullptr, nullptr, &number), 0);
+  EXPECT_EQ(ZR_HLStoRGB_Premul(nullptr, words, nullptr), 0);
+  EXPECT_EQ(ZR_YIQtoRGB_Premul(nullptr, nullptr, nullptr), 0);
+}
+
+}  // namespace
