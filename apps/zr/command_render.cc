@@ -2,7 +2,6 @@
 #include <CLI/CLI.hpp>
 #include <ZR/platform.h>
 
-#include <chrono>
 #include <cstdio>
 #include <memory>
 #include <nlohmann/json.hpp>
@@ -15,6 +14,7 @@
 #include "output_files.h"
 #include "progress_line.h"
 #include "render.h"
+#include "stopwatch.h"
 #include "tool_error.h"
 #include "tool_host.h"
 
@@ -50,14 +50,6 @@ constexpr const char* kFooter =
     "  stays white and every value of the composite survives the way out and in again.\n"
     "  Colour under alpha 0 is kept in PNG and TIFF; in OpenEXR it becomes 0.\n"
     "  A layer that is moved by whole pixels and not turned is copied as it is, in every quality.";
-
-class Stopwatch {
- public:
-  f64 seconds() const { return std::chrono::duration<f64>(std::chrono::steady_clock::now() - begun_).count(); }
-
- private:
-  std::chrono::steady_clock::time_point begun_ = std::chrono::steady_clock::now();
-};
 
 struct Timings {
   f64 load = 0, draw = 0, write = 0;

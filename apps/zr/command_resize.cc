@@ -140,11 +140,8 @@ void resize(const ResizeOptions& options) {
   const PixelSize size = size_for(request, info.width, info.height);
   const bool best = options.quality == "best";
   turn_picture(options, "resize", {}, [&](Picture picture, i32 depth) -> Finished {
-    if (!picture.colour.ink) return {resized(picture.world, size, best), std::move(picture.colour.icc)};
-    const Profile srgb = standard_space(PRISMA_Profile_sRGB);
-    OwnedWorld world = world_in_space(std::move(picture), {}, srgb, depth, PRISMA_Intent_RelativeColorimetric,
-                                      options.input, "resize");
-    return {resized(world, size, best), icc_data(*srgb)};
+    Finished rgb = without_ink(std::move(picture), depth, options.input, "resize");
+    return {resized(rgb.world, size, best), std::move(rgb.icc)};
   });
 }
 

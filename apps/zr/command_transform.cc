@@ -183,11 +183,8 @@ OwnedWorld transformed(OwnedWorld& picture, const Request& request) {
 void transform(const TransformOptions& options) {
   const Request request = parse_request(options);
   turn_picture(options, "transform", {}, [&](Picture picture, i32 depth) -> Finished {
-    if (!picture.colour.ink) return {transformed(picture.world, request), std::move(picture.colour.icc)};
-    const Profile srgb = standard_space(PRISMA_Profile_sRGB);
-    OwnedWorld world = world_in_space(std::move(picture), {}, srgb, depth, PRISMA_Intent_RelativeColorimetric,
-                                      options.input, "transform");
-    return {transformed(world, request), icc_data(*srgb)};
+    Finished rgb = without_ink(std::move(picture), depth, options.input, "transform");
+    return {transformed(rgb.world, request), std::move(rgb.icc)};
   });
 }
 

@@ -20,7 +20,8 @@ struct Command {
 };
 
 extern const Command kRenderCommand, kListCommand, kGalleryCommand, kConvertCommand, kDisplayCommand, kInfoCommand,
-    kSheetCommand, kTransformCommand, kResizeCommand, kVerifyCommand;
+    kSheetCommand, kTransformCommand, kResizeCommand, kVerifyCommand, kBlurCommand, kConvolveCommand,
+    kGuessAlphaCommand, kUnmatteCommand, kViewCommand, kWireframeCommand;
 
 std::span<const Command* const> all_commands();
 // Help that belongs to no verb: {name, text}.

@@ -293,6 +293,14 @@ Picture load_picture(const std::string& file, i32 depth, const std::string& wher
   return {read_world(image, image.ink ? 16 : depth, file, where), std::move(colour)};
 }
 
+Picture load_stored(const std::string& file, i32 depth, const std::string& where) {
+  OpenImage image = open_image(file, where);
+  image.plan.associated = false;
+  PictureColour colour = colour_of(image);
+  if (colour.ink) colour = {};  // the profile is one of ink
+  return {read_world(image, depth, file, where), std::move(colour)};
+}
+
 OwnedWorld world_in_space(Picture picture, Profile from, const Profile& to, i32 depth, i32 intent,
                           const std::string& file, const std::string& where) {
   if (!from) from = profile_of(picture.colour, file, where);

@@ -54,6 +54,9 @@ struct Picture {
   PictureColour colour;
 };
 Picture load_picture(const std::string& file, i32 depth, const std::string& where);
+// The pixels as the file holds them, for asking what its alpha means: colours are not divided by alpha, whatever
+// the file says of them. CMYK is turned to RGB as load_image does it.
+Picture load_stored(const std::string& file, i32 depth, const std::string& where);
 // The picture in the space `to`, at `depth`, which is that it was loaded at; `from` stands in for the
 // file's own profile unless it is empty.
 OwnedWorld world_in_space(Picture picture, Profile from, const Profile& to, i32 depth, i32 intent,

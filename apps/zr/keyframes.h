@@ -41,6 +41,8 @@ class Keyed {
     return keys_.back().value;
   }
 
+  const std::vector<Key>& keys() const { return keys_; }
+
  private:
   std::vector<Key> keys_;
 };

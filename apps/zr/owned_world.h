@@ -21,7 +21,11 @@ class OwnedWorld {
   OwnedWorld(OwnedWorld&& other) noexcept : layer_(std::exchange(other.layer_, {})), depth_(other.depth_) {}
   OwnedWorld(const OwnedWorld&) = delete;
   OwnedWorld& operator=(const OwnedWorld&) = delete;
-  OwnedWorld& operator=(OwnedWorld&&) = delete;
+  OwnedWorld& operator=(OwnedWorld&& other) noexcept {
+    std::swap(layer_, other.layer_);
+    std::swap(depth_, other.depth_);
+    return *this;
+  }
 
   ZR_LayerDef* layer() { return &layer_; }
   const ZR_LayerDef* layer() const { return &layer_; }

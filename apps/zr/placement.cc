@@ -45,6 +45,13 @@ GX_Matrix3 placed(const GX_Matrix3& turning, const Point& anchor, const Point& p
   return matrix;
 }
 
+GX_Matrix3 with_border(const GX_Matrix3& matrix, const GX_LPoint& border) {
+  GX_Matrix3 moved = matrix;
+  if (border.x == 0 && border.y == 0) return moved;
+  for (auto& row : moved.m) row[2] -= row[0] * border.x + row[1] * border.y;
+  return moved;
+}
+
 bool moves_whole_pixels(const GX_Matrix3& matrix) {
   const auto& m = matrix.m;
   const bool unturned = m[0][0] == 1 && m[0][1] == 0 && m[1][0] == 0 && m[1][1] == 1;

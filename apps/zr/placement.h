@@ -26,6 +26,8 @@ const std::vector<std::string>& quality_names();  // by the library's number
 GX_Matrix3 turning_matrix(const Point& scale, const Point& skew, f64 rotation);
 // `anchor`, a point of the picture, comes to stand on `position`.
 GX_Matrix3 placed(const GX_Matrix3& turning, const Point& anchor, const Point& position);
+// For a picture that has got `border` more pixels on each side: what it had before stands where it stood.
+GX_Matrix3 with_border(const GX_Matrix3& matrix, const GX_LPoint& border);
 // Whether the picture is moved by whole pixels and nothing else.
 bool moves_whole_pixels(const GX_Matrix3& matrix);
 

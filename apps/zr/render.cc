@@ -24,6 +24,18 @@ void fill(OwnedWorld& world, const ZR_PixelFloat& colour, const std::string& wha
   check(ZR_FillFloat(nullptr, &colour, nullptr, world.layer()), what);
 }
 
+// The picture before and after an effect, and one in between.
+u64 effect_bytes(const Scene& scene, const Layer& layer) {
+  const GX_LPoint growth = largest_growth(layer.effects);
+  ImageInfo size{layer.width, layer.height, 0};
+  if (!layer.image.empty()) size = probe_image(layer.image, scene.file + ": " + layer.place + ".image");
+  const i64 width = i64{size.width} + 2 * i64{growth.x}, height = i64{size.height} + 2 * i64{growth.y};
+  if (width > kLargestSide || height > kLargestSide)
+    throw bad_input(scene.file + ": " + layer.place + ".effects make the layer grow to " + std::to_string(width) +
+                    " x " + std::to_string(height) + " pixels; a side has at most " + std::to_string(kLargestSide));
+  return 3 * world_bytes(static_cast<i32>(width), static_cast<i32>(height), scene.depth);
+}
+
 // The whole sequence of matrices goes into one call, which makes the motion blur.
 void transform(OwnedWorld& source, const std::vector<GX_Matrix3>& matrices, i32 quality, i32 field,
                const ZR_CompositeModePlus& mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
@@ -56,6 +68,8 @@ u64 memory_needed(const Scene& scene) {
   if (mattes) worlds *= 2;  // one to draw mattes in
   for (const Layer& layer : scene.layers)
     if (layer.image.empty()) worlds += world_bytes(layer.width, layer.height, scene.depth);
+  for (const Layer& layer : scene.layers)
+    if (!layer.effects.empty()) worlds += effect_bytes(scene, layer);
   for (const SceneImage& image : images_of(scene)) {
     stop_if_interrupted();
     const ImageInfo info = probe_image(image.file, image.where);
@@ -83,7 +97,7 @@ const OwnedWorld& Renderer::draw(i32 frame) {
   fill(canvas_, scene_.background, "background");
   for (const Layer& layer : scene_.layers) {
     stop_if_interrupted();
-    composite(layer, layer.image.empty() ? solids_.at(&layer) : images_.at(layer.image), frame);
+    composite(layer, frame);
   }
   if (to_output_.Get() != nullptr) convert_world(canvas_, to_output_, "converting to the output space");
   return canvas_;
@@ -132,14 +146,28 @@ ZR_MaskWorld Renderer::matte_of(const Layer& layer, i32 frame) {
   return mask;
 }
 
-void Renderer::composite(const Layer& layer, OwnedWorld& source, i32 frame) {
+Renderer::Source Renderer::source_of(const Layer& layer, i32 frame) {
+  OwnedWorld& own = layer.image.empty() ? solids_.at(&layer) : images_.at(layer.image);
+  if (layer.effects.empty()) return {own, {0, 0}};
+  const auto kept = filtered_.find(&layer);
+  if (kept != filtered_.end() && stand_still(layer.effects)) return {kept->second.world, kept->second.grown};
+  filtered_.erase(&layer);
+  Filtered made = with_effects(own, layer.effects, frame, layer.place + ".effects");
+  Filtered& filtered = filtered_.emplace(&layer, std::move(made)).first->second;
+  return {filtered.world, filtered.grown};
+}
+
+void Renderer::composite(const Layer& layer, i32 frame) {
   if (scene_.field != 0 && layer.field != 0 && scene_.field != layer.field) return;  // no row is left
   const ZR_CompositeModePlus mode(layer.mode, static_cast<f32>(layer.opacity.at(frame)), nullptr, layer.keep_alpha,
                                   layer.seed);
   ZR_MaskWorld mask;
   if (layer.matte) mask = matte_of(layer, frame);
-  transform(source, layer.placement.matrices_of(frame), layer.placement.quality, scene_.field | layer.field, mode,
-            tables_.get(), layer.matte ? &mask : nullptr, canvas_, layer.place);
+  const Source source = source_of(layer, frame);
+  std::vector<GX_Matrix3> matrices = layer.placement.matrices_of(frame);
+  for (GX_Matrix3& matrix : matrices) matrix = with_border(matrix, source.grown);
+  transform(source.world, matrices, layer.placement.quality, scene_.field | layer.field, mode, tables_.get(),
+            layer.matte ? &mask : nullptr, canvas_, layer.place);
 }
 
 }  // namespace zr::tool

@@ -37,7 +37,13 @@ class Renderer {
   void choose_spaces();
   OwnedWorld load(const SceneImage& image) const;
   ZR_MaskWorld matte_of(const Layer& layer, i32 frame);
-  void composite(const Layer& layer, OwnedWorld& source, i32 frame);
+  // A layer's pixels after its effects, and what they have added on each side.
+  struct Source {
+    OwnedWorld& world;
+    GX_LPoint grown;
+  };
+  Source source_of(const Layer& layer, i32 frame);
+  void composite(const Layer& layer, i32 frame);
 
   const Scene& scene_;
   Profile working_, output_;  // empty: values are taken as they are
@@ -48,6 +54,7 @@ class Renderer {
   std::optional<OwnedWorld> matte_;           // of the frame's size, once a matte needs it
   std::map<std::string, OwnedWorld> images_;  // by file name
   std::map<const Layer*, OwnedWorld> solids_;
+  std::map<const Layer*, Filtered> filtered_;  // after effects: for all frames, or the latest
 };
 
 }  // namespace zr::tool

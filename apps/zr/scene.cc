@@ -7,6 +7,7 @@
 
 #include "mode_names.h"
 #include "nearest_name.h"
+#include "scene_effects.h"
 #include "scene_keys.h"
 #include "scene_node.h"
 #include "scene_values.h"
@@ -82,6 +83,7 @@ Layer read_layer(const SceneNode& node, const Scene& scene) {
     if (node.has("size")) read_size(node.at("size"), layer.width, layer.height);
   }
   if (node.has("name")) node.at("name").string("a text");
+  if (node.has("effects")) layer.effects = read_effects(node.at("effects"));
   layer.placement = read_placement(node, scene.placement);
   if (node.has("opacity")) layer.opacity = read_keyed(node.at("opacity"), &read_opacity);
   if (node.has("mode")) layer.mode = read_mode(node.at("mode"));

@@ -9,6 +9,7 @@
 
 #include "colour_space.h"
 #include "depths.h"
+#include "effects.h"
 #include "frame_names.h"
 #include "placement.h"
 
@@ -24,7 +25,8 @@ struct Layer {
   std::string place;  // "layers[2]", for messages
   std::string image;  // path; empty for a solid
   ZR_PixelFloat colour{1, 0, 0, 0};
-  i32 width = 0, height = 0;  // of a solid
+  i32 width = 0, height = 0;    // of a solid
+  std::vector<Effect> effects;  // on its own pixels, before it is placed
   Placement placement;
   Keyed<f64> opacity{1.0};
   i32 mode = 2;

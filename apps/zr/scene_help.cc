@@ -21,6 +21,13 @@ std::string section(const char* title, const Keys& keys) {
   return text;
 }
 
+std::string effect_sections() {
+  std::string text;
+  for (const EffectKind& kind : kEffectKinds)
+    text += section(("Effect \"" + std::string(kind.name) + "\": " + kind.meaning).c_str(), kind.keys);
+  return text;
+}
+
 }  // namespace
 
 std::string scene_help() {
@@ -38,6 +45,12 @@ std::string scene_help() {
              "                      { \"frame\": 48, \"value\": [700, 40] } ] } ] }\n") +
          section("The scene", kSceneKeys) + section("A layer", kLayerKeys) + section("A matte", kMatteKeys) +
          section("Placing a layer or a matte", kPlacementKeys) + section("Motion blur", kMotionBlurKeys) +
+         effect_sections() +
+         "\nAn effect is an object { \"effect\": name, ... } of the keys above. Example of a layer with a soft "
+         "shadow's "
+         "shape:\n"
+         "  { \"image\": \"media/logo.png\", \"effects\": [ { \"effect\": \"fill\", \"colour\": \"#000000\",\n"
+         "      \"keep_alpha\": true }, { \"effect\": \"blur\", \"radius\": 12 } ], \"opacity\": 0.6 }\n" +
          section("A keyframe, in a list of rising frames", kKeyframeKeys) +
          "\nA colour is [red, green, blue], [red, green, blue, alpha], each 0..1, \"#rrggbb\" or \"#rrggbbaa\".\n"
          "An unknown key is an error.\n";

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <array>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -35,6 +36,7 @@ inline constexpr std::array kLayerKeys = {
     SceneKey{"colour", "colour", "", "a solid, instead of \"image\""},
     SceneKey{"size", "[width, height], each 1..30000", "the scene's", "of a solid"},
     SceneKey{"name", "text", "", "for the reader only"},
+    SceneKey{"effects", "list of effects", "none", "what is done to the layer's own pixels first, in this order"},
     SceneKey{"opacity", "0..1 or keyframes", "1", ""},
     SceneKey{"mode", "name, see zr list modes", "in-front", "how the layer meets what is below"},
     SceneKey{"keep_alpha", "true or false", "false", "leaves the alpha below as it is"},
@@ -75,6 +77,55 @@ inline constexpr std::array kKeyframeKeys = {
     SceneKey{"frame", "whole number", "", ""},
     SceneKey{"value", "as without keyframes", "",
              "straight lines between, held before and after; motion blur looks between frames too"},
+};
+
+// Effects, by the "effect" that each object of the list names.
+inline constexpr std::array kBlurKeys = {
+    SceneKey{"radius", "0..30000 or keyframes", "", "pixels from the middle to where the blur ends"},
+    SceneKey{"shape", "\"gaussian\" or \"box\"", "gaussian", ""},
+    SceneKey{"iterations", "whole number 1..100", "1", "of a box; three look like a bell"},
+    SceneKey{"direction", "\"both\", \"horizontal\" or \"vertical\"", "both", ""},
+    SceneKey{"channels", "letters of \"argb\"", "argb", "the other channels stay"},
+    SceneKey{"keep_edges", "true or false", "false", "what is outside of the picture is left out, not transparent"},
+    SceneKey{"grow", "true or false", "true unless keep_edges", "the layer gets larger by what spreads over its edges"},
+    SceneKey{"premultiplied", "true or false", "false", "the layer is, and stays so"},
+};
+inline constexpr std::array kConvolveKeys = {
+    SceneKey{"kernel", "\"1 2 1; 2 4 2; 1 2 1\" or [[1, 2, 1], ...]", "",
+             "a square, a row or a column of whole numbers, odd on each side"},
+    SceneKey{"channels", "letters of \"argb\"", "argb", "rgb where the taps sum to 0 or no pixel is transparent"},
+    SceneKey{"normalise", "true or false", "true", "divides by the taps' sum; otherwise by 256 for each tap"},
+    SceneKey{"clamp", "true or false", "true", "holds 8-bit sums to 0..255; otherwise they wrap at 65536 first"},
+    SceneKey{"straight", "true or false", "false", "colours as they stand, not weighted by alpha"},
+};
+inline constexpr std::array kLutKeys = {
+    SceneKey{"rgb", "2 to 256 numbers 0..1", "none",
+             "values at inputs evenly from 0 to 1, straight lines between; [1, 0] is the negative"},
+    SceneKey{"red", "the same", "rgb", ""},
+    SceneKey{"green", "the same", "rgb", ""},
+    SceneKey{"blue", "the same", "rgb", ""},
+    SceneKey{"alpha", "the same", "none", ""},
+};
+inline constexpr std::array kFillKeys = {
+    SceneKey{"colour", "colour", "", ""},
+    SceneKey{"keep_alpha", "true or false", "false", "colours the layer's shape"},
+};
+inline constexpr std::array kPremultiplyKeys = {
+    SceneKey{"direction", "\"forward\" or \"back\"", "forward", "back makes a premultiplied layer straight"},
+    SceneKey{"colour", "colour", "#000000", "what it is premultiplied on"},
+};
+
+struct EffectKind {
+  const char* name;
+  const char* meaning;
+  std::span<const SceneKey> keys;
+};
+inline constexpr EffectKind kEffectKinds[] = {
+    {"blur", "a bell or boxes, as zr blur", kBlurKeys},
+    {"convolve", "a kernel, as zr convolve", kConvolveKeys},
+    {"lut", "a curve for each channel", kLutKeys},
+    {"fill", "one colour", kFillKeys},
+    {"premultiply", "onto a colour or off it", kPremultiplyKeys},
 };
 
 template <class Keys>

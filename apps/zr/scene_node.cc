@@ -50,15 +50,16 @@ SceneNode SceneNode::at(size_t index) const {
   return {*source_, value_->at(index), std::move(path)};
 }
 
-void SceneNode::require_keys(const std::vector<std::string>& known) const {
+void SceneNode::require_keys(const std::vector<std::string>& known, const std::string& kind) const {
   if (!value_->is_object()) refuse("an object { ... }");
   for (const auto& [key, value] : value_->items()) {
     if (std::find(known.begin(), known.end(), key) != known.end()) continue;
     JsonPath path = path_;
     path.emplace_back(key);
     throw bad_input(place_text(*source_, byte_of_path(source_->text, path, true)) +
-                    (path_.empty() ? "the scene" : this->path()) + " has an unknown key " + shown(key) +
-                    "; the nearest is " + quoted_list(nearest_names(key, known, 1)));
+                    (path_.empty() ? "the scene" : this->path()) + (kind.empty() ? "" : " (" + kind + ')') +
+                    " has an unknown key " + shown(key) + "; the nearest is " +
+                    quoted_list(nearest_names(key, known, 1)));
   }
 }
 

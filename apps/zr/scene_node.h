@@ -33,8 +33,9 @@ class SceneNode {
   bool has(const std::string& key) const { return value_->contains(key); }
   size_t size() const { return value_->size(); }
 
-  // An object with no other keys than these; an unknown one is told with the nearest.
-  void require_keys(const std::vector<std::string>& known) const;
+  // An object with no other keys than these; an unknown one is told with the nearest. `kind` says of which kind the
+  // object is, where there are several.
+  void require_keys(const std::vector<std::string>& known, const std::string& kind = "") const;
   void require_array(size_t length, const std::string& expected) const;
   f64 number(f64 low, f64 high) const;
   i32 integer(i32 low, i32 high) const;
