@@ -7,9 +7,12 @@
 #include "composite/depth_convert_rows.h"
 #include "composite/ground_rows.h"
 #include "composite/linear_rows.h"
+#include "copy/track_matte.h"
+#include "iterate/lane_lut_rows.h"
 #include "support/born_library.h"
 #include "support/edge_rows.h"
 #include "support/gamma_tables.h"
+#include "world/alpha_rows.h"
 #include "world/depth_rows.h"
 #include "world/premul_rows.h"
 
@@ -111,6 +114,20 @@ TYPED_TEST(LaneRows, GroundsAndAlphas) {
   }
 }
 
+TYPED_TEST(LaneRows, AlphasOnly) {
+  using T = TypeParam;
+  this->compare("fill", [](i32 n, T*, T*, T* d) { zr::fill_alpha_row<T>(d, n, part_of_white<T>(0.3f)); });
+  this->compare("invert", [](i32 n, T*, T*, T* d) { zr::invert_alpha_row<T>(d, n); });
+  for (u32 kind = 0; kind < 4; ++kind) {
+    this->compare("mask cells", [&](i32 n, T* s, T*, T* d) {
+      zr::prepare_mask_row<T>(static_cast<u32>(n), s, n / 3 - 20, n, kind, d);
+    });
+    this->compare("mask cells onto what they read next", [&](i32 n, T*, T*, T* d) {
+      zr::prepare_mask_row<T>(static_cast<u32>(n - 1), d, 0, n - 1, kind, d + 1);
+    });
+  }
+}
+
 TYPED_TEST(LaneRows, Depths) {
   using T = TypeParam;
   constexpr bool of_floats = std::is_same_v<T, ZR_PixelFloat>;
@@ -134,6 +151,20 @@ TYPED_TEST(LaneRows, Depths) {
   to.template operator()<ZR_Pixel8>();
   to.template operator()<ZR_Pixel16>();
   to.template operator()<ZR_PixelFloat>();
+}
+
+using ByteRows = LaneRows<ZR_Pixel8>;
+TEST_F(ByteRows, Tables) {
+  u8 entries[3][256];
+  for (auto& table : entries)
+    for (u8& entry : table) entry = static_cast<u8>(random_());
+  const zr::ByteTables all(entries[0], entries[1], entries[2], entries[0]), some(nullptr, entries[1], nullptr, entries[2]);
+  for (const zr::ByteTables* tables : {&all, &some}) {
+    compare("tables", [&](i32 n, ZR_Pixel8* s, ZR_Pixel8*, ZR_Pixel8* d) { tables->row(n, s, d); });
+    compare("tables in place", [&](i32 n, ZR_Pixel8*, ZR_Pixel8*, ZR_Pixel8* d) { tables->row(n, d, d); });
+    compare("tables onto what they read next",
+            [&](i32 n, ZR_Pixel8*, ZR_Pixel8*, ZR_Pixel8* d) { tables->row(n - 1, d, d + 1); });
+  }
 }
 
 }  // namespace

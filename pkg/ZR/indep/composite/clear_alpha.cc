@@ -4,13 +4,14 @@
 
 #include <algorithm>
 
+#include "world/alpha_rows.h"
 #include "world/guard.h"
 
 namespace {
 
 template <class T>
 void clear_alpha(i32 left, i32 right, T* row) {
-  for (i32 x = left; x < right; ++x) row[x].alpha = 0;
+  if (right > left) zr::fill_alpha_row<T>(row + left, right - left, 0);
 }
 
 }  // namespace

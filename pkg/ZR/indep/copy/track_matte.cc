@@ -3,27 +3,9 @@
 
 #include <algorithm>
 
+#include "world/alpha_rows.h"
+
 namespace zr {
-namespace {
-
-template <class T>
-void fill_alpha(i64 count, Channel<T> alpha, T* out) {
-  for (i64 i = 0; i < count; ++i) out[i].alpha = alpha;
-}
-
-// An out-of-range 16-bit alpha wraps in the store.
-template <class T, bool inverted, bool luma>
-void convert_cells(i64 count, const T* src, T* out) {
-  using D = Depth<T>;
-  for (i64 i = 0; i < count; ++i) {
-    Wide<T> value = src[i].alpha;
-    if constexpr (luma) value = D::mul(value, D::luma(src[i].red, src[i].green, src[i].blue));
-    if constexpr (inverted) value = D::inv(value);
-    out[i].alpha = static_cast<Channel<T>>(value);
-  }
-}
-
-}  // namespace
 
 template <class T>
 void prepare_mask_row(u32 count, const T* src, i64 offset, i64 row_length, u32 kind, T* out) {
@@ -37,18 +19,12 @@ void prepare_mask_row(u32 count, const T* src, i64 offset, i64 row_length, u32 k
   const i64 inside = std::clamp<i64>(row_length, 0, count - before);
   const bool inverted = (kind & mask_inverted) != 0;
   const Channel<T> outside = inverted ? static_cast<Channel<T>>(Depth<T>::white) : Channel<T>{0};
-  fill_alpha<T>(before, outside, out);
+  fill_alpha_row<T>(out, before, outside);
   if (inside > 0) {
-    const T* const from = src + skipped;
-    T* const to = out + before;
-    switch (kind & mask_kinds) {
-      case 0: convert_cells<T, false, false>(inside, from, to); break;
-      case mask_inverted: convert_cells<T, true, false>(inside, from, to); break;
-      case mask_luma: convert_cells<T, false, true>(inside, from, to); break;
-      default: convert_cells<T, true, true>(inside, from, to); break;
-    }
+    constexpr MaskValue values[] = {MaskValue::alpha, MaskValue::inverted, MaskValue::luma, MaskValue::luma_inverted};
+    mask_value_row<T>(values[kind & mask_kinds], inside, src + skipped, out + before);
   }
-  fill_alpha<T>(count - before - inside, outside, out + before + inside);
+  fill_alpha_row<T>(out + before + inside, count - before - inside, outside);
 }
 
 template <class T>
@@ -56,7 +32,7 @@ const T* mask_row(const ZR_MaskWorld& mask, i32 x, i32 y, i32 count, T* scratch)
   const ZR_LayerDef& world = mask.world;
   const i64 column = static_cast<i64>(x) - mask.offset_x, row = static_cast<i64>(y) - mask.offset_y;
   if (world.data == nullptr || row < 0 || row >= world.height) {
-    fill_alpha<T>(count, static_cast<Channel<T>>(Depth<T>::white), scratch);
+    fill_alpha_row<T>(scratch, count, static_cast<Channel<T>>(Depth<T>::white));
     return scratch;
   }
   const T* const pixels = reinterpret_cast<const T*>(static_cast<const char*>(world.data) + row * world.row_bytes);

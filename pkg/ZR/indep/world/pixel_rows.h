@@ -20,16 +20,6 @@ void fill_row(T* row, std::ptrdiff_t n, const T& pixel) {
 }
 
 template <class T>
-void fill_alpha_row(T* row, std::ptrdiff_t n) {
-  for (std::ptrdiff_t i = 0; i < n; ++i) row[i].alpha = static_cast<Channel<T>>(Depth<T>::white);
-}
-
-template <class T>
-void invert_alpha_row(T* row, std::ptrdiff_t n) {
-  for (std::ptrdiff_t i = 0; i < n; ++i) row[i].alpha = static_cast<Channel<T>>(Depth<T>::inv(row[i].alpha));
-}
-
-template <class T>
 void clear_row(T* row, std::ptrdiff_t n) {
   if (n > 0) std::memset(static_cast<void*>(row), 0, static_cast<std::size_t>(n) * sizeof(T));
 }

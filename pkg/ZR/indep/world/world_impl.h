@@ -7,6 +7,7 @@
 #include <cstring>
 
 #include "world/guard.h"
+#include "world/alpha_rows.h"
 #include "world/pixel_rows.h"
 #include "world/world_memory.h"
 
@@ -181,7 +182,7 @@ void ZR_WorldX<T>::Fill(const ZR_Pixel16& colour, const GX_LRect* rect) {
 
 template <class T>
 void ZR_WorldX<T>::FillAlpha() {
-  for (i32 y = 0; y < height; ++y) zr::fill_alpha_row(Row(y), width);
+  for (i32 y = 0; y < height; ++y) zr::fill_alpha_row(Row(y), width, static_cast<zr::Channel<T>>(zr::Depth<T>::white));
 }
 
 template <class T>
