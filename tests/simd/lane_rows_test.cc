@@ -4,9 +4,11 @@
 
 #include <vector>
 
+#include "composite/blend_rows.h"
 #include "composite/depth_convert_rows.h"
 #include "composite/ground_rows.h"
 #include "composite/linear_rows.h"
+#include "composite/matte_rows.h"
 #include "copy/track_matte.h"
 #include "iterate/lane_lut_rows.h"
 #include "support/born_library.h"
@@ -111,6 +113,25 @@ TYPED_TEST(LaneRows, GroundsAndAlphas) {
     const auto factor = part_of_white<T>(opacity);
     this->compare("union", [&](i32 n, T* s, T*, T* d) { zr::union_alpha_row<T>(n, s, factor, nullptr, d); });
     this->compare("masked union", [&](i32 n, T* s, T* m, T* d) { zr::union_alpha_row<T>(n, s, factor, m, d); });
+  }
+}
+
+TYPED_TEST(LaneRows, MattesAndMixes) {
+  using T = TypeParam;
+  for (const f32 white_part : {0.0f, 0.4f, 1.0f}) {
+    const auto part = part_of_white<T>(white_part);
+    const T matte{0, part, static_cast<zr::Channel<T>>(zr::Depth<T>::inv(part)), part};
+    this->compare("onto a matte", [&](i32 n, T* s, T*, T* d) { zr::matte_row<T, true>(n, matte, s, d); });
+    this->compare("off a matte", [&](i32 n, T* s, T*, T* d) { zr::matte_row<T, false>(n, matte, s, d); });
+    this->compare("off a matte in place", [&](i32 n, T*, T*, T* d) { zr::matte_row<T, false>(n, matte, d, d); });
+  }
+  for (const i32 part : {1, 0x5555, 0x8000, 0xffff}) {
+    this->compare("straight mix", [&](i32 n, T* s, T* m, T* d) { zr::blend_row<T, false>(n, s, m, part, d); });
+    this->compare("straight mix of one alpha", [&](i32 n, T* s, T*, T* d) { zr::blend_row<T, false>(n, s, s, part, d); });
+    this->compare("straight mix in place", [&](i32 n, T*, T* m, T* d) { zr::blend_row<T, false>(n, d, m, part, d); });
+    this->compare("premultiplied mix", [&](i32 n, T* s, T* m, T* d) { zr::blend_row<T, true>(n, s, m, part, d); });
+    this->compare("mix onto what it reads next",
+                  [&](i32 n, T* s, T*, T* d) { zr::blend_row<T, true>(n - 1, s, d, part, d + 1); });
   }
 }
 

@@ -1,57 +1,17 @@
-// Premultiplying and unmultiplying: the arithmetic against a matte colour, and rows handed to the generic
-// iterator.
+// Premultiplying and unmultiplying: rows handed to the generic iterator.
 #include "composite/premultiply.h"
 
 #include <ZR/errors.h>
 
 #include <algorithm>
-#include <cstring>
 #include <type_traits>
 
+#include "composite/matte_rows.h"
 #include "world/guard.h"
 #include "world/slot_table.h"
 
 namespace zr {
 namespace {
-
-// ------------------------------------------------------------------------------ a matte colour
-
-// At 16 bits the product has no rounding term, unlike the plain form's.
-template <class T>
-Channel<T> onto_matte(Wide<T> c, Wide<T> a, Wide<T> m) {
-  using D = Depth<T>;
-  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
-    return m + D::smul(a, c - m);
-  else
-    return static_cast<Channel<T>>(wrap_add(m, D::smul(a, wrap_sub(c, m))));
-}
-
-// a is neither 0 nor white. Floats have no floor, and divide by a denormal alpha too.
-template <class T>
-Channel<T> off_matte(Wide<T> c, Wide<T> a, Wide<T> m) {
-  using D = Depth<T>;
-  const Wide<T> ground = D::mul(D::inv(a), m);
-  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
-    return (c - ground) / a;
-  else
-    return static_cast<Channel<T>>(D::div(std::max(wrap_sub(c, ground), 0), a));
-}
-
-template <class T, bool forward>
-void matte_row(i32 n, const T& matte, const T* src, T* dst) {
-  for (i32 i = 0; i < n; ++i) {
-    const T p = src[i];
-    const Channel<T> a = p.alpha;
-    if (a == Depth<T>::white || (!forward && a == 0)) {
-      dst[i] = p;
-      continue;
-    }
-    const auto channel = [a](Channel<T> c, Channel<T> m) {
-      return forward ? onto_matte<T>(c, a, m) : off_matte<T>(c, a, m);
-    };
-    dst[i] = {a, channel(p.red, matte.red), channel(p.green, matte.green), channel(p.blue, matte.blue)};
-  }
-}
 
 // ------------------------------------------------------------------------------ rows in bands
 

@@ -16,11 +16,6 @@ namespace HWY_NAMESPACE {
 
 // ---------------------------------------------------------------------------- double precision
 
-// Toward zero; the argument fits.
-HWY_INLINE Ints fitting_int(Doubles v) {
-  const HalfInts half;
-  return hn::Combine(Tag<i32>(), hn::DemoteTo(half, v.high), hn::DemoteTo(half, v.low));
-}
 
 template <class Real>
 HWY_INLINE Real to_real(Ints v) {

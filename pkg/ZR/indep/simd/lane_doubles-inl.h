@@ -43,6 +43,12 @@ HWY_INLINE Floats narrowed(Doubles v) {
   const HalfFloats half;
   return hn::Combine(Tag<f32>(), hn::DemoteTo(half, v.high), hn::DemoteTo(half, v.low));
 }
+// Toward zero; the argument fits.
+HWY_INLINE Ints fitting_int(Doubles v) {
+  const HalfInts half;
+  return hn::Combine(Tag<i32>(), hn::DemoteTo(half, v.high), hn::DemoteTo(half, v.low));
+}
+
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
 HWY_AFTER_NAMESPACE();
