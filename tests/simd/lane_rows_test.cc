@@ -127,7 +127,8 @@ TYPED_TEST(LaneRows, MattesAndMixes) {
   }
   for (const i32 part : {1, 0x5555, 0x8000, 0xffff}) {
     this->compare("straight mix", [&](i32 n, T* s, T* m, T* d) { zr::blend_row<T, false>(n, s, m, part, d); });
-    this->compare("straight mix of one alpha", [&](i32 n, T* s, T*, T* d) { zr::blend_row<T, false>(n, s, s, part, d); });
+    this->compare("straight mix of one alpha",
+                  [&](i32 n, T* s, T*, T* d) { zr::blend_row<T, false>(n, s, s, part, d); });
     this->compare("straight mix in place", [&](i32 n, T*, T* m, T* d) { zr::blend_row<T, false>(n, d, m, part, d); });
     this->compare("premultiplied mix", [&](i32 n, T* s, T* m, T* d) { zr::blend_row<T, true>(n, s, m, part, d); });
     this->compare("mix onto what it reads next",
@@ -164,9 +165,8 @@ TYPED_TEST(LaneRows, Depths) {
         this->template compare<Out>("conversion", [](i32 n, T* s, T*, Out* d) { zr::convert_row(n, s, d, false); });
       if constexpr (of_floats)
         this->template compare<Out>("clamped", [](i32 n, T* s, T*, Out* d) { zr::narrow_row(n, s, d); });
-      this->template compare<Out>("linear floats", [&](i32 n, T* s, T*, Out* d) {
-        zr::depth_convert_row(n, s, d, gamma);
-      });
+      this->template compare<Out>("linear floats",
+                                  [&](i32 n, T* s, T*, Out* d) { zr::depth_convert_row(n, s, d, gamma); });
     }
   };
   to.template operator()<ZR_Pixel8>();
@@ -179,7 +179,8 @@ TEST_F(ByteRows, Tables) {
   u8 entries[3][256];
   for (auto& table : entries)
     for (u8& entry : table) entry = static_cast<u8>(random_());
-  const zr::ByteTables all(entries[0], entries[1], entries[2], entries[0]), some(nullptr, entries[1], nullptr, entries[2]);
+  const zr::ByteTables all(entries[0], entries[1], entries[2], entries[0]),
+      some(nullptr, entries[1], nullptr, entries[2]);
   for (const zr::ByteTables* tables : {&all, &some}) {
     compare("tables", [&](i32 n, ZR_Pixel8* s, ZR_Pixel8*, ZR_Pixel8* d) { tables->row(n, s, d); });
     compare("tables in place", [&](i32 n, ZR_Pixel8*, ZR_Pixel8*, ZR_Pixel8* d) { tables->row(n, d, d); });

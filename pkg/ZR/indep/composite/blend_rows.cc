@@ -64,8 +64,10 @@ template <>
 class Quotients<ZR_Pixel16> {
  public:
   HWY_INLINE Quotients(Ints alpha1, Ints alpha2, i32 w1, i32 w2)
-      : t_(alpha1 * w1 + alpha2 * w2), a1_(to_double(alpha1) * static_cast<f64>(w1)),
-        a2_(to_double(alpha2) * static_cast<f64>(w2)), half_(to_double(shifted_right_unsigned<1>(t_))),
+      : t_(alpha1 * w1 + alpha2 * w2),
+        a1_(to_double(alpha1) * static_cast<f64>(w1)),
+        a2_(to_double(alpha2) * static_cast<f64>(w2)),
+        half_(to_double(shifted_right_unsigned<1>(t_))),
         per_(1.0 / (a1_ + a2_)) {}
   HWY_INLINE Ints operator()(Ints c1, Ints c2) const {
     return fitting_int((to_double(c1) * a1_ + to_double(c2) * a2_ + half_) * per_ + 0x1p-34);
@@ -85,9 +87,8 @@ HWY_INLINE Px<PixelMath<T>> straight(const Px<PixelMath<T>>& p, const Px<PixelMa
     const Floats f1 = to_float(a1), f2 = to_float(a2), total = to_float(a1 + a2);
     const Bools<f32> none1 = {hn::RebindMask(Tag<f32>(), (a1 == 0).mask)},
                      none2 = {hn::RebindMask(Tag<f32>(), (a2 == 0).mask)};
-    const auto colour = [&](Floats c1, Floats c2) HWY_ATTR {
-      return pick(none1, c2, pick(none2, c1, (c1 * f1 + c2 * f2) / total));
-    };
+    const auto colour = [&](Floats c1, Floats c2)
+                            HWY_ATTR { return pick(none1, c2, pick(none2, c1, (c1 * f1 + c2 * f2) / total)); };
     return {of_ratio_one * total, colour(p.red, q.red), colour(p.green, q.green), colour(p.blue, q.blue)};
   } else {
     const Bools<i32> none1 = p.alpha == 0, none2 = q.alpha == 0;
@@ -96,9 +97,7 @@ HWY_INLINE Px<PixelMath<T>> straight(const Px<PixelMath<T>>& p, const Px<PixelMa
       return Px<M>{p.alpha, colour(p.red, q.red), colour(p.green, q.green), colour(p.blue, q.blue)};
     }
     const Quotients<T> quotient(p.alpha, q.alpha, w1, w2);
-    const auto colour = [&](Ints c1, Ints c2) HWY_ATTR {
-      return pick(none1, c2, pick(none2, c1, quotient(c1, c2)));
-    };
+    const auto colour = [&](Ints c1, Ints c2) HWY_ATTR { return pick(none1, c2, pick(none2, c1, quotient(c1, c2))); };
     return Px<M>{quotient.alpha(), colour(p.red, q.red), colour(p.green, q.green), colour(p.blue, q.blue)};
   }
 }
@@ -141,8 +140,8 @@ bool blend(i32 n, const T* first, const T* second, i32 w1, i32 w2, T* dst) {
   return true;
 }
 
-#define ZR_INSTANTIATE(T)                                                         \
-  template bool blend<T, true>(i32, const T*, const T*, i32, i32, T*);            \
+#define ZR_INSTANTIATE(T)                                              \
+  template bool blend<T, true>(i32, const T*, const T*, i32, i32, T*); \
   template bool blend<T, false>(i32, const T*, const T*, i32, i32, T*);
 ZR_INSTANTIATE(ZR_Pixel8)
 ZR_INSTANTIATE(ZR_Pixel16)
@@ -230,8 +229,8 @@ void blend_row(i32 n, const T* first, const T* second, i32 second_part, T* dst) 
   for (i32 i = 0; i < n; ++i) dst[i] = Form::mix(first[i], second[i], w1, w2);
 }
 
-#define ZR_INSTANTIATE(T)                                                 \
-  template void blend_row<T, true>(i32, const T*, const T*, i32, T*);     \
+#define ZR_INSTANTIATE(T)                                             \
+  template void blend_row<T, true>(i32, const T*, const T*, i32, T*); \
   template void blend_row<T, false>(i32, const T*, const T*, i32, T*);
 ZR_INSTANTIATE(ZR_Pixel8)
 ZR_INSTANTIATE(ZR_Pixel16)

@@ -1,11 +1,11 @@
 // Worlds between depths, floats linear and integers stored.
 #include <ZR/linear_tables.h>
 
-#include <algorithm>
 #include <cstring>
 
 #include "composite/depth_convert_rows.h"
 #include "world/guard.h"
+#include "world/row_bands.h"
 
 namespace zr {
 namespace {
@@ -20,24 +20,16 @@ void convert_row(i32 n, const From* src, To* dst, const ZR_LinearBlendingTables&
     depth_convert_row(n, src, dst, tables);
 }
 
-constexpr i32 band_rows = 16;
-
 template <class To, class From>
 void convert(const u16* tables, const ZR_World* src, ZR_World* dst) {
-  struct Work {
-    const ZR_LinearBlendingTables& tables;
-    const ZR_World* src;
-    ZR_World* dst;
-  } work{*reinterpret_cast<const ZR_LinearBlendingTables*>(tables), src, dst};
-  const i32 bands = (src->height + band_rows - 1) / band_rows;
-  const i32 error = ZR_IterateGeneric(bands, &work, [](void* refcon, i32, i32 i, i32) -> i32 {
-    const Work& all = *static_cast<const Work*>(refcon);
-    const auto row = [](const ZR_World* world, i32 y) {
-      return static_cast<char*>(world->data) + static_cast<ptrdiff_t>(y) * world->row_bytes;
-    };
-    for (i32 y = i * band_rows; y < std::min((i + 1) * band_rows, all.src->height); ++y)
-      convert_row(all.src->width, reinterpret_cast<const From*>(row(all.src, y)),
-                  reinterpret_cast<To*>(row(all.dst, y)), all.tables);
+  const auto& both = *reinterpret_cast<const ZR_LinearBlendingTables*>(tables);
+  const auto row = [](const ZR_World* world, i32 y) {
+    return static_cast<char*>(world->data) + static_cast<ptrdiff_t>(y) * world->row_bytes;
+  };
+  const i64 row_bytes = i64{src->width} * static_cast<i64>(sizeof(From) + sizeof(To));
+  const i32 error = for_bands(src->height, row_bytes, band_of_work, [&](i32 top, i32 bottom) -> i32 {
+    for (i32 y = top; y < bottom; ++y)
+      convert_row(src->width, reinterpret_cast<const From*>(row(src, y)), reinterpret_cast<To*>(row(dst, y)), both);
     return ZR_Err_None;
   });
   if (error != ZR_Err_None) fail(error);

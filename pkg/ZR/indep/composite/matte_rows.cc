@@ -64,16 +64,15 @@ bool matte_row(i32 n, const T& matte, const T* src, T* dst) {
       if (src != dst) Pack::template store<M>(p, d);
       return;
     }
-    const auto one = [&](Number<T> c, Number<T> against) HWY_ATTR {
-      return pick(stays, c, matted<T, forward>(c, p.alpha, against));
-    };
+    const auto one = [&](Number<T> c, Number<T> against)
+                         HWY_ATTR { return pick(stays, c, matted<T, forward>(c, p.alpha, against)); };
     Pack::template store<M>(Px<M>{p.alpha, one(p.red, m.red), one(p.green, m.green), one(p.blue, m.blue)}, d);
   });
   return true;
 }
 
-#define ZR_INSTANTIATE(T)                                              \
-  template bool matte_row<T, true>(i32, const T&, const T*, T*);       \
+#define ZR_INSTANTIATE(T)                                        \
+  template bool matte_row<T, true>(i32, const T&, const T*, T*); \
   template bool matte_row<T, false>(i32, const T&, const T*, T*);
 ZR_INSTANTIATE(ZR_Pixel8)
 ZR_INSTANTIATE(ZR_Pixel16)
@@ -141,8 +140,8 @@ void matte_row(i32 n, const T& matte, const T* src, T* dst) {
   if (!lane_matte_row<T, forward>(n, matte, src, dst)) single_matte_row<T, forward>(n, matte, src, dst);
 }
 
-#define ZR_INSTANTIATE(T)                                                  \
-  template void matte_row<T, true>(i32, const T&, const T*, T*);           \
+#define ZR_INSTANTIATE(T)                                        \
+  template void matte_row<T, true>(i32, const T&, const T*, T*); \
   template void matte_row<T, false>(i32, const T&, const T*, T*);
 ZR_INSTANTIATE(ZR_Pixel8)
 ZR_INSTANTIATE(ZR_Pixel16)

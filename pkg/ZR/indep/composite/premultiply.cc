@@ -8,6 +8,7 @@
 
 #include "composite/matte_rows.h"
 #include "world/guard.h"
+#include "world/row_bands.h"
 #include "world/slot_table.h"
 
 namespace zr {
@@ -15,29 +16,15 @@ namespace {
 
 // ------------------------------------------------------------------------------ rows in bands
 
-// Pixels that one call of the generic iterator works on: enough to make the call itself cheap.
-constexpr i32 band_bytes = 1 << 16;
-
-// Runs body(y) for y in 0..rows-1 through the generic iterator, whole bands of rows to a call. The band with
-// row 0 asks for abort before it starts; a non-zero answer is returned, and rows not yet begun stay undone.
+// Runs body(y) for y in 0..rows-1 through the generic iterator. The band with row 0 asks for abort before it starts.
 template <class Body>
-i32 for_rows(const ZR_ProgressInfo* progress, i32 rows, i64 row_bytes, const Body& body) {
-  struct Job {
-    const ZR_ProgressInfo* progress;
-    const Body* body;
-    i32 rows, band_rows;
-  };
-  const i32 band_rows = static_cast<i32>(std::clamp<i64>(band_bytes / std::max<i64>(row_bytes, 1), 1, rows));
-  Job job = {progress, &body, rows, band_rows};
-  const i32 bands = (rows - 1) / band_rows + 1;
-  return ZR_IterateGeneric(bands, &job, [](void* refcon, i32, i32 band, i32) -> i32 {
-    const Job& work = *static_cast<const Job*>(refcon);
-    const i32 top = band * work.band_rows, bottom = top + std::min(work.band_rows, work.rows - top);
-    if (top == 0 && work.progress != nullptr && work.progress->abort != nullptr) {
-      const i32 stop = work.progress->abort(work.progress->refcon);
+i32 rows_with_abort(const ZR_ProgressInfo* progress, i32 rows, i64 row_bytes, const Body& body) {
+  return for_bands(rows, row_bytes, band_of_work, [&](i32 top, i32 bottom) -> i32 {
+    if (top == 0 && progress != nullptr && progress->abort != nullptr) {
+      const i32 stop = progress->abort(progress->refcon);
       if (stop != 0) return stop;
     }
-    for (i32 y = top; y < bottom; ++y) (*work.body)(y);
+    for (i32 y = top; y < bottom; ++y) body(y);
     return ZR_Err_None;
   });
 }
@@ -82,14 +69,16 @@ i32 premul_colour_rows(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const 
   const auto source = [&](i32 y) { return from.At(area.left, area.top + y); };
   const auto target = [&](i32 y) { return to.At(area.left, area.top + y); };
   if (forward)
-    return for_rows(progress, rows, row_bytes, [&](i32 y) { matte_row<T, true>(width, matte, source(y), target(y)); });
+    return rows_with_abort(progress, rows, row_bytes,
+                           [&](i32 y) { matte_row<T, true>(width, matte, source(y), target(y)); });
   // Taking black away is the plain division, which makes colours under alpha 0 white.
   if (is_black(matte)) {
     RowFunc<T>* const row = plain_row<T>(false);
     if (row == nullptr) return empty_row_slot();
-    return for_rows(progress, rows, row_bytes, [&](i32 y) { row(width, source(y), target(y)); });
+    return rows_with_abort(progress, rows, row_bytes, [&](i32 y) { row(width, source(y), target(y)); });
   }
-  return for_rows(progress, rows, row_bytes, [&](i32 y) { matte_row<T, false>(width, matte, source(y), target(y)); });
+  return rows_with_abort(progress, rows, row_bytes,
+                         [&](i32 y) { matte_row<T, false>(width, matte, source(y), target(y)); });
 }
 
 template <class Colour>
@@ -128,8 +117,9 @@ i32 ZR_PremulRect_S(const ZR_ProgressInfo* progress, i32 forward, const GX_LRect
       if (row == nullptr) return zr::empty_row_slot();
       const ZR_WorldX<T> world(dst, false);
       const i32 width = area.right - area.left;
-      return zr::for_rows(progress, area.bottom - area.top, static_cast<i64>(width) * static_cast<i64>(sizeof(T)),
-                          [&](i32 y) { row(width, nullptr, world.At(area.left, area.top + y)); });
+      return zr::rows_with_abort(progress, area.bottom - area.top,
+                                 static_cast<i64>(width) * static_cast<i64>(sizeof(T)),
+                                 [&](i32 y) { row(width, nullptr, world.At(area.left, area.top + y)); });
     });
   });
 }

@@ -24,9 +24,8 @@ using Bytes = hn::Vec<Tag<u8>>;
 HWY_INLINE Bytes looked_up(Bytes v, const u8 (&steps)[2][8][16]) {
   const Tag<u8> d;
   Bytes place = hn::And(v, hn::Set(d, 127));
-  const auto entries = [&](int half, int k) HWY_ATTR {
-    return hn::TableLookupBytesOr0(hn::LoadDup128(d, steps[half][k]), place);
-  };
+  const auto entries = [&](int half, int k)
+                           HWY_ATTR { return hn::TableLookupBytesOr0(hn::LoadDup128(d, steps[half][k]), place); };
   Bytes lower = entries(0, 0), upper = entries(1, 0);
   for (int k = 1; k < 8; ++k) {
     place = hn::Sub(place, hn::Set(d, 16));

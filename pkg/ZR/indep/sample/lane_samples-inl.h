@@ -16,7 +16,6 @@ namespace HWY_NAMESPACE {
 
 // ---------------------------------------------------------------------------- double precision
 
-
 template <class Real>
 HWY_INLINE Real to_real(Ints v) {
   if constexpr (std::is_same_v<Real, Floats>)

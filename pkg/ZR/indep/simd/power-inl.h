@@ -33,9 +33,8 @@ ZR_BEGIN_FORMULAS
 
 #ifdef ZR_IN_LANES
 HWY_INLINE Doubles held(Doubles v, f64 least, f64 most) {
-  const auto one = [&](Doubles::V x) HWY_ATTR {
-    return hn::Min(hn::Max(x, hn::Set(Tag<f64>(), least)), hn::Set(Tag<f64>(), most));
-  };
+  const auto one = [&](Doubles::V x)
+                       HWY_ATTR { return hn::Min(hn::Max(x, hn::Set(Tag<f64>(), least)), hn::Set(Tag<f64>(), most)); };
   return {one(v.low), one(v.high)};
 }
 HWY_INLINE Ints bits_of(Floats v) { return hn::BitCast(Tag<i32>(), v.v); }
@@ -63,9 +62,7 @@ constexpr f32 narrowed(f64 v) { return static_cast<f32>(v); }
 constexpr f64 held(f64 v, f64 least, f64 most) { return v < least ? least : v > most ? most : v; }
 constexpr i32 bits_of(f32 v) { return std::bit_cast<i32>(v); }
 constexpr f32 float_of(i32 bits) { return std::bit_cast<f32>(bits); }
-constexpr f64 two_to_low_bits(f64 v) {
-  return std::bit_cast<f64>((std::bit_cast<u64>(v) << 52) + (u64{0x3ff} << 52));
-}
+constexpr f64 two_to_low_bits(f64 v) { return std::bit_cast<f64>((std::bit_cast<u64>(v) << 52) + (u64{0x3ff} << 52)); }
 #endif
 
 // ------------------------------------------------------------------------------ the power

@@ -53,18 +53,19 @@ bool fill_alpha(T* row, i64 n, Channel<T> alpha) {
 template <class T, bool inverted>
 HWY_INLINE void luma_row(i64 n, const T* src, T* out) {
   using M = PixelMath<T>;
-  each_block<Apart>(static_cast<i32>(n), src, static_cast<const T*>(nullptr), out, [&](const T* s, const T*, T* d, i32 count) HWY_ATTR {
-    const Px<M> p = load<M>(s);
-    if (!legal(p)) {
-      single_mask_values<T>(inverted ? MaskValue::luma_inverted : MaskValue::luma, count, s, d);
-      return;
-    }
-    auto value = M::mul(p.alpha, M::luma(p.red, p.green, p.blue));
-    if constexpr (inverted) value = M::inv(value);
-    Px<M> cell = load<M>(d);
-    cell.alpha = value;
-    store<M>(cell, d);
-  });
+  each_block<Apart>(static_cast<i32>(n), src, static_cast<const T*>(nullptr), out,
+                    [&](const T* s, const T*, T* d, i32 count) HWY_ATTR {
+                      const Px<M> p = load<M>(s);
+                      if (!legal(p)) {
+                        single_mask_values<T>(inverted ? MaskValue::luma_inverted : MaskValue::luma, count, s, d);
+                        return;
+                      }
+                      auto value = M::mul(p.alpha, M::luma(p.red, p.green, p.blue));
+                      if constexpr (inverted) value = M::inv(value);
+                      Px<M> cell = load<M>(d);
+                      cell.alpha = value;
+                      store<M>(cell, d);
+                    });
 }
 
 template <class T>
@@ -82,8 +83,8 @@ bool mask_values(MaskValue value, i64 n, const T* src, T* out) {
   return true;
 }
 
-#define ZR_INSTANTIATE(T)                             \
-  template bool fill_alpha<T>(T*, i64, Channel<T>);   \
+#define ZR_INSTANTIATE(T)                           \
+  template bool fill_alpha<T>(T*, i64, Channel<T>); \
   template bool mask_values<T>(MaskValue, i64, const T*, T*);
 ZR_INSTANTIATE(ZR_Pixel8)
 ZR_INSTANTIATE(ZR_Pixel16)
@@ -153,9 +154,9 @@ void mask_value_row(MaskValue value, i64 n, const T* src, T* out) {
   if (overlap || !lane_mask_values(value, n, src, out)) single_mask_values(value, n, src, out);
 }
 
-#define ZR_INSTANTIATE(T)                                     \
-  template void fill_alpha_row<T>(T*, i64, Channel<T>);       \
-  template void invert_alpha_row<T>(T*, i64);                 \
+#define ZR_INSTANTIATE(T)                               \
+  template void fill_alpha_row<T>(T*, i64, Channel<T>); \
+  template void invert_alpha_row<T>(T*, i64);           \
   template void mask_value_row<T>(MaskValue, i64, const T*, T*);
 ZR_INSTANTIATE(ZR_Pixel8)
 ZR_INSTANTIATE(ZR_Pixel16)

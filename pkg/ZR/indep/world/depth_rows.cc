@@ -119,8 +119,7 @@ HWY_INLINE Ints nearest_int(Floats a) {
 template <class To>
 void narrow_scalar(i32 n, const ZR_PixelFloat* src, To* dst) {
   constexpr i32 bits = static_cast<i32>(std::numeric_limits<Channel<To>>::max());
-  const Bools<f32> is_alpha = {
-      hn::RebindMask(Tag<f32>(), (masked(Ints(hn::Iota(Tag<i32>(), 0)), 3) == 0).mask)};
+  const Bools<f32> is_alpha = {hn::RebindMask(Tag<f32>(), (masked(Ints(hn::Iota(Tag<i32>(), 0)), 3) == 0).mask)};
   narrow_lanes(n, src, dst, [=](Floats c) HWY_ATTR {
     const Floats scaled = c * static_cast<f32>(Depth<To>::white);
     return masked(to_int(pick(is_alpha, scaled, clamped<To>(scaled)) + 0.5f), bits);

@@ -9,6 +9,7 @@
 
 #include "world/guard.h"
 #include "world/pixel_rows.h"
+#include "world/row_bands.h"
 
 namespace zr {
 namespace {
@@ -35,13 +36,13 @@ void fill_rows(const ZR_WorldX<T>& world, const T& pixel, const GX_LRect* rect) 
   const i32 columns = across.second - across.first;
   if (columns <= 0) return;
   const bool clears = is_all_zero_bits(pixel);
-  for (i32 y = down.first; y < down.second; ++y) {
+  each_row(down.first, down.second, columns, sizeof(T), [&](i32 y) {
     T* const row = world.At(across.first, y);
     if (clears)
       clear_row(row, columns);
     else
       fill_row(row, columns, pixel);
-  }
+  });
 }
 
 template <class Colour>

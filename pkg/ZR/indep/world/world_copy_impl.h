@@ -9,6 +9,7 @@
 
 #include "world/depth_rows.h"
 #include "world/guard.h"
+#include "world/row_bands.h"
 
 namespace zr {
 
@@ -66,8 +67,14 @@ void copy_rows(const ZR_LayerDef& src, const ZR_LayerDef& dst, const CopyArea& a
   if constexpr (std::is_same_v<To, From>) {
     move_rows<To>(src, dst, area, first, count);
   } else {
-    for (i32 row = first; row < first + count; ++row)
-      convert_row(area.columns(), src_row<From>(src, area, row), dst_row<To>(dst, area, row), dither);
+    const auto convert = [&](i32 y) {
+      convert_row(area.columns(), src_row<From>(src, area, first + y), dst_row<To>(dst, area, first + y), dither);
+    };
+    // Dither goes on from row to row.
+    if (dither && std::is_same_v<To, ZR_Pixel8>)
+      for (i32 y = 0; y < count; ++y) convert(y);
+    else
+      each_row(0, count, area.columns(), sizeof(To) + sizeof(From), convert);
   }
 }
 

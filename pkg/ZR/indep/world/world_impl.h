@@ -9,6 +9,7 @@
 #include "world/guard.h"
 #include "world/alpha_rows.h"
 #include "world/pixel_rows.h"
+#include "world/row_bands.h"
 #include "world/world_memory.h"
 
 namespace zr {
@@ -141,10 +142,11 @@ void ZR_WorldX<T>::Clear(const GX_LRect* rect) {
   const std::ptrdiff_t columns = part.right - part.left;
   if (columns * static_cast<std::ptrdiff_t>(sizeof(T)) == row_bytes) {
     // Kept so on purpose: rows below the rectangle go too. Never more than this world holds.
-    zr::clear_row(Row(part.top), columns * (height - part.top));
+    zr::each_band(part.top, height, columns, sizeof(T),
+                  [&](i32 top, i32 bottom) { zr::clear_row(Row(top), columns * (bottom - top)); });
     return;
   }
-  for (i32 y = part.top; y < part.bottom; ++y) zr::clear_row(At(part.left, y), columns);
+  zr::each_row(part.top, part.bottom, columns, sizeof(T), [&](i32 y) { zr::clear_row(At(part.left, y), columns); });
 }
 
 template <class T>
@@ -165,7 +167,9 @@ template <class T>
 static void fill_part(ZR_WorldX<T>& world, const T& pixel, const GX_LRect* rect) {
   const GX_LRect part = zr::clip_to_world(rect, world);
   if (zr::is_empty(part)) return;
-  for (i32 y = part.top; y < part.bottom; ++y) zr::fill_row(world.At(part.left, y), part.right - part.left, pixel);
+  const std::ptrdiff_t columns = part.right - part.left;
+  zr::each_row(part.top, part.bottom, columns, sizeof(T),
+               [&](i32 y) { zr::fill_row(world.At(part.left, y), columns, pixel); });
 }
 
 template <class T>
@@ -182,12 +186,13 @@ void ZR_WorldX<T>::Fill(const ZR_Pixel16& colour, const GX_LRect* rect) {
 
 template <class T>
 void ZR_WorldX<T>::FillAlpha() {
-  for (i32 y = 0; y < height; ++y) zr::fill_alpha_row(Row(y), width, static_cast<zr::Channel<T>>(zr::Depth<T>::white));
+  constexpr auto white = static_cast<zr::Channel<T>>(zr::Depth<T>::white);
+  zr::each_row(0, height, width, sizeof(T), [&](i32 y) { zr::fill_alpha_row(Row(y), width, white); });
 }
 
 template <class T>
 void ZR_WorldX<T>::InvertAlpha() {
-  for (i32 y = 0; y < height; ++y) zr::invert_alpha_row(Row(y), width);
+  zr::each_row(0, height, width, sizeof(T), [&](i32 y) { zr::invert_alpha_row(Row(y), width); });
 }
 
 template <class T>
