@@ -153,6 +153,14 @@ i32 bilinear_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, T*
   });
 }
 
+// Any steps.
+template <class T>
+i32 bilinear_row(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
+  if constexpr (!std::is_same_v<T, ZR_PixelFloat>)
+    if (Windowed<T, 2>::suits(run)) return bilinear_vectors<T, Windowed<T, 2>>(run, params, sum, dst);
+  return bilinear_vectors<T, Scattered<T>>(run, params, sum, dst);
+}
+
 // Integer depths say of whole positions that they are not inside, and copy them.
 template <class T>
 inline constexpr bool copies_whole = !std::is_same_v<T, ZR_PixelFloat>;
@@ -196,7 +204,7 @@ const LaneRows<T>* bilinear_rows() {
   static constexpr LaneRows<T> rows = [] {
     LaneRows<T> r = {nullptr, &bilinear_vectors<T, Adjacent<T>, AlphaSum<T>>, nullptr, &bilinear_weighted_motion<T>};
     if constexpr (gains_from_lanes<T>) {
-      r.no_clip = &bilinear_vectors<T, Scattered<T>, RowSum<T>>;
+      r.no_clip = &bilinear_row<T>;
       r.motion = &bilinear_motion<T>;
     }
     return r;

@@ -284,6 +284,65 @@ class Scattered {
   i32 row_bytes_, step_x_, step_y_;
 };
 
+// Positions along a row of the source, less than a pixel apart: a vector of pixels holds the neighbours of all lanes.
+template <class T, i32 count>
+class Windowed {
+ public:
+  static constexpr bool one_phase = false;
+
+  // Whether `count` neighbours of each lane lie within as many pixels as there are lanes.
+  static bool suits(const SampleRun& run) {
+    constexpr i32 lanes = lane_count();
+    return run.step_y == 0 && run.step_x > 0 && run.step_x < 0x10000 &&
+           (run.step_x * (lanes - 1) + 0xffff) >> 16 <= lanes - count;
+  }
+  HWY_INLINE Windowed(const SampleRun& run, const ZR_LayerDef& src)
+      : row_(static_cast<const char*>(src.data) + static_cast<std::ptrdiff_t>(run.y >> 16) * src.row_bytes),
+        row_bytes_(src.row_bytes),
+        width_(src.width),
+        step_(run.step_x),
+        first_x_(run.x),
+        y_(run.y) {
+    x_ = Ints(run.x) + Ints(hn::Iota(Tag<i32>(), 0)) * step_;
+  }
+  HWY_INLINE void next() {
+    first_x_ += step_ * lane_count();
+    x_ = x_ + Ints(step_ * lane_count());
+  }
+  HWY_INLINE Ints fraction_x() const { return masked(x_, 65535); }
+  HWY_INLINE Ints fraction_y() const { return y_ & 0xffff; }
+  HWY_INLINE Bools<i32> whole() const { return masked(x_ | Ints(y_), 65535) == 0; }
+
+  HWY_INLINE void row(i32 dx, i32 dy, Raw<T> (&p)[count]) const {
+    const Tag<i32> d;
+    const i32 first = (first_x_ >> 16) + dx;
+    const char* const line = row_ + static_cast<std::ptrdiff_t>(dy) * row_bytes_;
+    const Ints place = shifted_right<16>(x_) + dx;
+    if (width_ - first < lane_count()) {
+      const Columns<T> columns(place);
+      for (i32 i = 0; i < count; ++i) p[i] = columns.at(line, i);
+      return;
+    }
+    const i32* const words = reinterpret_cast<const i32*>(line + static_cast<std::ptrdiff_t>(first) * i32{sizeof(T)});
+    Ints window[Raw<T>::words];
+    if constexpr (Raw<T>::words == 1)
+      window[0] = hn::LoadU(d, words);
+    else if constexpr (Raw<T>::words == 2)
+      hn::LoadInterleaved2(d, words, window[0].v, window[1].v);
+    else
+      hn::LoadInterleaved4(d, words, window[0].v, window[1].v, window[2].v, window[3].v);
+    for (i32 i = 0; i < count; ++i) {
+      const auto indices = hn::IndicesFromVec(d, (place - Ints(first - i)).v);
+      for (i32 k = 0; k < Raw<T>::words; ++k) p[i].w[k] = hn::TableLookupLanes(window[k].v, indices);
+    }
+  }
+
+ private:
+  const char* row_;
+  i32 row_bytes_, width_, step_, first_x_, y_;
+  Ints x_;
+};
+
 // Positions one pixel apart in a row: neighbours lie side by side.
 template <class T>
 class Adjacent {
