@@ -93,36 +93,99 @@ HWY_INLINE Raw<ZR_PixelFloat> float_mix(const Raw<ZR_PixelFloat> (&p)[4], const 
            colour(in_order<2>(a, p)), colour(in_order<3>(a, p))}};
 }
 
-// Where all alphas agree, pixels stay as they lie in memory: channels are pulled apart for the others only.
-template <int k>
-HWY_INLINE void put_blocks(const Ints (&v)[4][4], const LaneWeights<Floats>& weights, Bools<f32> first,
-                           ZR_PixelFloat* out) {
-  const auto weighted = [&](i32 i) HWY_ATTR { return Floats(hn::Broadcast<k>(weights.w[i].v)) * as_floats(v[i][k]); };
-  const Floats sum = ((weighted(0) + weighted(1)) + weighted(2)) + weighted(3);
-  store_blocks(Tag<f32>(), pick(first, as_floats(v[0][k]), sum).v, out + k);
+// Float pixels as they lie in memory, a fourth as many as there are lanes: weights are spread over a pixel's lanes.
+HWY_INLINE Floats mix_together(const Floats (&p)[4], const LaneWeights<Floats>& weights, Bools<f32> first) {
+  const auto mixed = [&](const Floats(&w)[4])
+                         HWY_ATTR { return ((w[0] * p[0] + w[1] * p[1]) + w[2] * p[2]) + w[3] * p[3]; };
+  const Bools<f32> same = p[0] == p[1] && p[0] == p[2] && p[0] == p[3];
+  if (all(same || !first)) return pick(first, p[0], mixed(weights.w));
+  Floats alpha[4], a[4];
+  for (i32 i = 0; i < 4; ++i) alpha[i] = hn::Broadcast<0>(p[i].v);
+  const Bools<f32> equal = (alpha[0] == alpha[1] && alpha[0] == alpha[2]) && alpha[0] == alpha[3];
+  for (i32 i = 0; i < 4; ++i) a[i] = weights.w[i] * pick(equal, 1.0f, alpha[i]);
+  const Floats sum = ((a[0] + a[1]) + a[2]) + a[3];
+  const Bools<f32> clear = !equal && sum == 0.0f;
+  const Floats limited = pick(equal || sum > 1.0f, 1.0f, sum), inverse = 1.0f / limited;
+  return pick(clear, 0.0f, pick(first, pick(equal, alpha[0], limited), inverse * mixed(a)));
 }
-HWY_INLINE Ints put_scattered_floats(const Scattered<ZR_PixelFloat>& at, const LaneWeights<Floats>& weights,
-                                     ZR_PixelFloat* out) {
-  Ints v[4][4];
-  for (i32 i = 0; i < 4; ++i) at.blocks(i & 1, i >> 1, v[i]);
+
+// The neighbours of such pixels of a vector of positions, at `offsets` from the upper left ones.
+class TogetherAnywhere {
+ public:
+  HWY_INLINE TogetherAnywhere(const SampleRun& run, const ZR_LayerDef& src) : at_(run, src) {}
+  HWY_INLINE void next() { at_.next(); }
+  HWY_INLINE LaneWeights<Floats> load(i32 part, Floats (&p)[4]) const {
+    for (i32 i = 0; i < 4; ++i) p[i] = as_floats(at_.together(part, i & 1, i >> 1));
+    const Tag<i32> d;
+    const Ints pixel = shifted_right<2>(Ints(hn::Iota(d, 0))) + part * Together::pixels;
+    const auto spread = [&](Ints v)
+                            HWY_ATTR { return Ints(hn::TableLookupLanes(v.v, hn::IndicesFromVec(d, pixel.v))); };
+    return {spread(at_.fraction_x()), spread(at_.fraction_y())};
+  }
+
+ private:
+  Scattered<ZR_PixelFloat> at_;
+};
+
+// The same for positions along a row of the source, not more than a pixel apart: a vector of pixels holds the left
+// neighbours, and the one a pixel further the right ones.
+class TogetherAlong {
+ public:
+  static bool suits(const SampleRun& run) { return run.step_y == 0 && run.step_x > 0 && run.step_x <= 0x10000; }
+  HWY_INLINE TogetherAlong(const SampleRun& run, const ZR_LayerDef& src)
+      : row_(static_cast<const char*>(src.data) + static_cast<std::ptrdiff_t>(run.y >> 16) * src.row_bytes),
+        row_bytes_(src.row_bytes),
+        width_(src.width),
+        step_(run.step_x),
+        x_(run.x),
+        y_(run.y) {}
+  HWY_INLINE void next() { x_ += step_ * lane_count(); }
+  HWY_INLINE LaneWeights<Floats> load(i32 part, Floats (&p)[4]) const {
+    const Tag<i32> d;
+    const i32 start = x_ + part * Together::pixels * step_, first = start >> 16;
+    const Ints lane = hn::Iota(d, 0), x = Ints(start) + shifted_right<2>(lane) * step_;
+    const Ints place = shifted_left<2>(shifted_right<16>(x) - first) + masked(lane, 3);
+    const auto indices = hn::IndicesFromVec(d, place.v);
+    for (i32 i = 0; i < 4; ++i) {
+      const char* const at = row_ + (i >> 1) * static_cast<std::ptrdiff_t>(row_bytes_) +
+                             static_cast<std::ptrdiff_t>(first + (i & 1)) * i32{sizeof(ZR_PixelFloat)};
+      p[i] = as_floats(whole_window(first)
+                           ? Ints(hn::TableLookupLanes(hn::LoadU(d, reinterpret_cast<const i32*>(at)), indices))
+                           : single_pixels(at, start, first));
+    }
+    return {masked(x, 65535), Ints(y_ & 0xffff)};
+  }
+
+ private:
+  HWY_INLINE bool whole_window(i32 first) const { return width_ - first > Together::pixels; }
+  HWY_INLINE Ints single_pixels(const char* at, i32 start, i32 first) const {
+    i64 offsets[Together::pixels];
+    for (i32 i = 0; i < Together::pixels; ++i)
+      offsets[i] = i64{((start + i * step_) >> 16) - first} * i64{sizeof(ZR_PixelFloat)};
+    return load_pixels(Tag<i32>(), at, offsets);
+  }
+
+  const char* row_;
+  i32 row_bytes_, width_, step_, x_, y_;
+};
+
+template <class Neighbours>
+i32 float_vectors(const SampleRun& run, const ZR_SampPB& params, f64* sum, ZR_PixelFloat* dst) {
+  const Tag<f32> d;
   const Ints place = hn::Iota(Tag<i32>(), 0);
-  const Bools<f32> first = {hn::RebindMask(Tag<f32>(), (masked(place, 3) == 0).mask)};
-  Bools<f32> equal = Floats(0.0f) == Floats(0.0f), one = equal;
-  for (i32 k = 0; k < 4; ++k) {
-    const Floats p = as_floats(v[0][k]);
-    equal = equal && p == as_floats(v[1][k]) && p == as_floats(v[2][k]) && p == as_floats(v[3][k]);
-    one = one && p == 1.0f;
-  }
-  if (all(equal || !first)) {
-    put_blocks<0>(v, weights, first, out);
-    put_blocks<1>(v, weights, first, out);
-    put_blocks<2>(v, weights, first, out);
-    put_blocks<3>(v, weights, first, out);
-    return as_ints(pick(one || !first, 1.0f, 0.0f));  // enough to tell whether all are 1
-  }
-  Raw<ZR_PixelFloat> p[4];
-  for (i32 i = 0; i < 4; ++i) transpose_blocks(v[i], p[i].w);
-  return put(float_mix(p, weights), out);
+  const Bools<f32> first = {hn::RebindMask(d, (masked(place, 3) == 0).mask)};
+  return sample_vectors<ZR_PixelFloat, Neighbours>(
+      run, *params.src, sum, dst, [&](const Neighbours& at, ZR_PixelFloat* out) HWY_ATTR {
+        Bools<f32> one = Floats(0.0f) == Floats(0.0f);
+        for (i32 part = 0; part < 4; ++part) {
+          Floats p[4];
+          const LaneWeights<Floats> weights = at.load(part, p);
+          const Floats mixed = mix_together(p, weights, first);
+          hn::StoreU(mixed.v, d, reinterpret_cast<f32*>(out + part * Together::pixels));
+          one = one && (mixed == 1.0f || !first);
+        }
+        return as_ints(pick(one, 1.0f, 0.0f));  // enough to tell whether all are 1
+      });
 }
 
 template <class T>
@@ -146,19 +209,20 @@ i32 bilinear_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, T*
   const Weights phase(run.x & 0xffff, run.y & 0xffff);
   return sample_vectors<T, Neighbours>(run, *params.src, sum, dst, [&](const Neighbours& at, T* out) HWY_ATTR {
     const Weights weights = Neighbours::one_phase ? phase : Weights(at.fraction_x(), at.fraction_y());
-    if constexpr (std::is_same_v<Neighbours, Scattered<ZR_PixelFloat>>)
-      return put_scattered_floats(at, weights, out);
-    else
-      return put(mixed_at<T>(at, weights, Neighbours::one_phase ? Ints(0) != Ints(0) : at.whole()), out);
+    return put(mixed_at<T>(at, weights, Neighbours::one_phase ? Ints(0) != Ints(0) : at.whole()), out);
   });
 }
 
 // Any steps.
 template <class T>
 i32 bilinear_row(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
-  if constexpr (!std::is_same_v<T, ZR_PixelFloat>)
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
+    if (TogetherAlong::suits(run)) return float_vectors<TogetherAlong>(run, params, sum, dst);
+    return float_vectors<TogetherAnywhere>(run, params, sum, dst);
+  } else {
     if (Windowed<T, 2>::suits(run)) return bilinear_vectors<T, Windowed<T, 2>>(run, params, sum, dst);
-  return bilinear_vectors<T, Scattered<T>>(run, params, sum, dst);
+    return bilinear_vectors<T, Scattered<T>>(run, params, sum, dst);
+  }
 }
 
 // Integer depths say of whole positions that they are not inside, and copy them.

@@ -139,24 +139,20 @@ HWY_INLINE void transpose_blocks(const Ints (&v)[4], Ints (&words)[4]) {
   words[2] = hn::InterleaveLower(d, even_high, odd_high);
   words[3] = hn::InterleaveUpper(d, even_high, odd_high);
 }
-HWY_INLINE void load_all_blocks(const char* base, const i64* offsets, Ints (&v)[4]) {
-  for (i32 k = 0; k < 4; ++k) v[k] = load_blocks(Tag<i32>(), base, offsets + k);
-}
 // The four words of 16 bytes at base + offsets[i] for each lane i.
 HWY_INLINE void gather_blocks(const char* base, const i64* offsets, Ints (&words)[4]) {
   Ints v[4];
-  load_all_blocks(base, offsets, v);
+  for (i32 k = 0; k < 4; ++k) v[k] = load_blocks(Tag<i32>(), base, offsets + k);
   transpose_blocks(v, words);
 }
-// Block b to pixel 4 * b.
+// 16 bytes at base + offsets[b] for each block b.
 template <class D>
-HWY_INLINE void store_blocks(D d, hn::Vec<D> v, ZR_PixelFloat* dst) {
+HWY_INLINE hn::Vec<D> load_pixels(D d, const char* base, const i64* offsets) {
   if constexpr (hn::MaxLanes(D()) == 4) {
-    hn::StoreU(v, d, reinterpret_cast<f32*>(dst));
+    return hn::LoadU(d, reinterpret_cast<const i32*>(base + *offsets));
   } else {
     const hn::Half<D> half;
-    store_blocks(half, hn::LowerHalf(half, v), dst);
-    store_blocks(half, hn::UpperHalf(half, v), dst + hn::MaxLanes(half));
+    return hn::Combine(d, load_pixels(half, base, offsets + hn::MaxLanes(half) / 4), load_pixels(half, base, offsets));
   }
 }
 
@@ -253,8 +249,10 @@ class Scattered {
       }
     }
   }
-  // One neighbour of each position as blocks.
-  HWY_INLINE void blocks(i32 dx, i32 dy, Ints (&v)[4]) const { load_all_blocks(neighbour(dx, dy), offsets_, v); }
+  // One neighbour of a fourth of the positions, as pixels of 16 bytes lie in memory.
+  HWY_INLINE Ints together(i32 part, i32 dx, i32 dy) const {
+    return load_pixels(Tag<i32>(), neighbour(dx, dy), offsets_ + part * (lane_count() / 4));
+  }
 
  private:
   HWY_INLINE const char* neighbour(i32 dx, i32 dy) const {
