@@ -78,7 +78,10 @@ struct LineJob {
     line_shift = dst.origin_across - src.origin_across;
   }
   // Lines of a strip. Strips of columns are wide, to make use of memory pages; rows have to pass a corner turn.
-  i32 strip_lines() const { return (src.vertical && dst.vertical ? 256 : 64) / static_cast<i32>(sizeof(T)); }
+  i32 strip_lines() const {
+    const i32 lines = (src.vertical && dst.vertical ? 256 : 64) / static_cast<i32>(sizeof(T));
+    return std::max(lines, strip_group);
+  }
   // Whether strips of so many lines are read where they lie.
   bool reads_in_place(i32 lines) const {
     return src.vertical && !call.premultiply && !call.copy_source && lines % strip_group == 0 && src.whole_pixels();
