@@ -57,8 +57,10 @@ struct ByteModeMath : IntegerModeMath<T> {
   // Twice s below half and twice s less white above, of the modes that stretch a half to the whole.
   static ZR_PURE Wide stretched_low(Wide s) { return shifted_right<7>(s * 255 + 64); }
   static inline Wide stretched_high(Wide s) { return D::div(s - D::half, 127); }
-  static inline Wide soft_low(Wide d) { return entry_of(soft_light_low_8.data(), masked(d, 255)); }
-  static inline Wide soft_high(Wide d) { return entry_of(soft_light_high_8.data(), masked(d, 255)); }
+  // How far soft light moves d toward dark (low) or light.
+  static inline Wide soft(auto low, Wide d) {
+    return entry_of(soft_light_8.data(), masked(d, 255) + pick(low, 0, soft_light_reach_8));
+  }
   static ZR_PURE Wide hard_mix(Wide s, Wide d) { return pick(d > D::mul(254, D::inv(s)), D::white, 0); }
   // The mask first, then the opacity; alpha unions and the other depths go the other way round.
   static ZR_PURE Wide covered(Wide c, Wide opacity, Wide mask) { return D::mul(D::mul(mask, c), opacity); }
@@ -69,7 +71,10 @@ struct ModeMath<ZR_Pixel8> : ByteModeMath<ZR_Pixel8> {};
 #ifdef ZR_IN_LANES
 template <>
 struct ModeMath<NarrowPixel8> : ByteModeMath<NarrowPixel8> {
-  static HWY_INLINE Shorts soft_low(Shorts d) { return mul(d, inv(d)); }  // each entry of the table
+  // What is low is its formula at every entry of the table.
+  static HWY_INLINE Shorts soft(Bools<i16> low, Shorts d) {
+    return pick(low, mul(d, inv(d)), entry_of(soft_light_8.data() + soft_light_reach_8, d));
+  }
 };
 #endif
 
@@ -78,20 +83,16 @@ struct ModeMath<ZR_Pixel16> : IntegerModeMath<ZR_Pixel16> {
   static ZR_PURE Wide drawn(Wide t, Wide d, Wide k) { return t + smul(k, d - t); }
   static ZR_PURE Wide stretched_low(Wide s) { return 2 * s; }
   static ZR_PURE Wide stretched_high(Wide s) { return 2 * s - white; }
-  static inline Wide soft_low(Wide d) { return interpolated(soft_light_low_16, d); }
-  static inline Wide soft_high(Wide d) { return interpolated(soft_light_high_16, d); }
+  // The tables have an entry for every eighth value.
+  static inline Wide soft(auto low, Wide d) {
+    const Wide v = held(d, 0, white);  // an illegal channel stays inside the table
+    const Wide entry = shifted_right<3>(v) + pick(low, 0, soft_light_reach), between = masked(v, 7);
+    const auto ends = entries_of(soft_light_16, entry);
+    return ends.first + shifted_right<3>(between * (ends.next - ends.first) + 4);
+  }
   static ZR_PURE Wide hard_mix(Wide s, Wide d) { return pick(d > shifted_right<15>(inv(s) * 32767 + 16384), white, 0); }
   static ZR_PURE Wide covered(Wide c, Wide opacity, Wide mask) { return mul(mask, mul(c, opacity)); }
   static constexpr i32 marker_high = 24576, marker_low = 8192;
-
- private:
-  // The tables have an entry for every eighth value.
-  static inline Wide interpolated(const i32* table, Wide d) {
-    const Wide v = held(d, 0, white);  // an illegal channel stays inside the table
-    const Wide entry = shifted_right<3>(v), between = masked(v, 7);
-    const Wide low = entry_of(table, entry);
-    return low + shifted_right<3>(between * (entry_of(table + 1, entry) - low) + 4);
-  }
 };
 
 // Float: no clamps and no storing, other roundings of the same formulas, and two formulas of its own.
@@ -107,8 +108,14 @@ struct ModeMath<ZR_PixelFloat> : Primitive<ZR_PixelFloat> {
   static ZR_PURE Wide drawn(Wide t, Wide d, Wide k) { return t + (d - t) * k; }
   static ZR_PURE Wide stretched_low(Wide s) { return 2.0f * s; }
   static ZR_PURE Wide stretched_high(Wide s) { return (s - 0.5f) * 2.0f; }
-  static inline Wide soft_low(Wide d) { return interpolated(soft_light_low_float, d); }
-  static inline Wide soft_high(Wide d) { return interpolated(soft_light_high_float, d); }
+  // Below 0 the first segment goes on; above 1 the tables read zero.
+  static inline Wide soft(auto low, Wide d) {
+    const Wide t = 4096.0f * d;
+    const auto i = held(to_int(t), 0, 4096);
+    const Wide between = t - to_float(i);
+    const auto ends = entries_of(soft_light_float, i + pick(of_ints(low), 0, soft_light_reach));
+    return pick(between != 0.0f, ends.first + (ends.next - ends.first) * between, ends.first);
+  }
   static ZR_PURE Wide soft_weight(Wide k, Wide v, Wide A) { return k * (v * A); }
   // A ramp of the width of `step` instead of a threshold.
   static ZR_PURE Wide hard_mix(Wide s, Wide d) {
@@ -129,15 +136,6 @@ struct ModeMath<ZR_PixelFloat> : Primitive<ZR_PixelFloat> {
   }
   static ZR_PURE Wide covered(Wide c, Wide opacity, Wide mask) { return mask * (c * opacity); }
   static constexpr f32 marker_high = 0.75f, marker_low = 0.25f;
-
- private:
-  // Below 0 the first segment goes on; above 1 the tables read zero.
-  static inline Wide interpolated(const f32* table, Wide d) {
-    const Wide t = 4096.0f * d;
-    const auto i = held(to_int(t), 0, 4096);
-    const Wide between = t - to_float(i), low = entry_of(table, i);
-    return pick(between != 0.0f, low + (entry_of(table + 1, i) - low) * between, low);
-  }
 };
 
 ZR_END_FORMULAS

@@ -29,8 +29,10 @@ ZR_PURE auto unfaded(typename M::Wide t, typename M::Wide R) {
     return M::div(t, R);
   else if constexpr (ground == ModeKind::white_ground)
     return M::inv(M::div(M::inv(t), R));
-  else
-    return pick(t < M::half, M::floored(M::half - M::div(M::half - t, R)), M::capped(M::half + M::div(t - M::half, R)));
+  else {
+    const auto away = M::div(M::magnitude(t - M::half), R);  // the same on both sides of the ground
+    return pick(t < M::half, M::floored(M::half - away), M::capped(M::half + away));
+  }
 }
 
 template <class Mode, class M>

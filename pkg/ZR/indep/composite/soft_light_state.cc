@@ -5,10 +5,8 @@
 
 namespace zr {
 
-constinit i32 soft_light_low_16[4098]{};
-constinit i32 soft_light_high_16[4098]{};
-constinit f32 soft_light_low_float[4098]{};
-constinit f32 soft_light_high_float[4098]{};
+constinit i32 soft_light_16[2 * soft_light_reach]{};
+constinit f32 soft_light_float[2 * soft_light_reach]{};
 
 namespace {
 
@@ -22,10 +20,11 @@ i32 rounded_16(f64 v) { return static_cast<i32>(32768.0 * v + 0.5); }
 void build_soft_light_tables() {
   for (int i = 0; i < 4096; ++i) {
     const f64 x = i / 4096.0;
-    soft_light_low_16[i] = rounded_16(low(x));
-    soft_light_high_16[i] = rounded_16(high(x));
-    soft_light_low_float[i] = static_cast<f32>(low(x));
-    soft_light_high_float[i] = static_cast<f32>(high(x));
+    const i32 above = i + soft_light_reach;
+    soft_light_16[i] = rounded_16(low(x));
+    soft_light_16[above] = rounded_16(high(x));
+    soft_light_float[i] = static_cast<f32>(low(x));
+    soft_light_float[above] = static_cast<f32>(high(x));
   }
 }
 

@@ -11,10 +11,13 @@
 
 namespace zr {
 
-// Entry k of the 16-bit and float tables stands for x = k / 4096; entry 4096 is 0. The float tables have
-// one slot more, also 0, which what lies above 1 reads; so have the 16-bit ones, which is read and not used.
-extern i32 soft_light_low_16[4098], soft_light_high_16[4098];
-extern f32 soft_light_low_float[4098], soft_light_high_float[4098];
+// All tables have the curve of dark sources (low) in front of that of light ones (high), which begins `reach` later:
+// one look-up serves a row of both. Entry k of a curve at 16 bits and of floats stands for x = k / 4096; entry 4096
+// is 0. The float curves have one slot more, also 0, which what lies above 1 reads; so have the 16-bit ones, which is
+// read and not used.
+inline constexpr i32 soft_light_reach = 4098, soft_light_reach_8 = 256;
+extern i32 soft_light_16[2 * soft_light_reach];
+extern f32 soft_light_float[2 * soft_light_reach];
 
 void build_soft_light_tables();
 
@@ -31,18 +34,18 @@ constexpr u32 high_8(u32 i) {
   while (root * root + root < 255 * i) ++root;
   return root - i;
 }
-template <class Rule>
-constexpr std::array<i32, 256> table_8(Rule rule) {
-  std::array<i32, 256> table{};
-  for (u32 i = 0; i < 256; ++i) table[i] = static_cast<i32>(rule(i));
-  return table;
-}
 
 }  // namespace soft_light_detail
 
-inline constexpr std::array<i32, 256> soft_light_low_8 = soft_light_detail::table_8(soft_light_detail::low_8);
-inline constexpr std::array<i32, 256> soft_light_high_8 = soft_light_detail::table_8(soft_light_detail::high_8);
-static_assert(soft_light_low_8[1] == 1 && soft_light_high_8[1] == 3);
-static_assert(soft_light_low_8[255] == 0 && soft_light_high_8[255] == 0);
+inline constexpr auto soft_light_8 = [] {
+  std::array<i32, 2 * soft_light_reach_8> table{};
+  for (u32 i = 0; i < soft_light_reach_8; ++i) {
+    table[i] = static_cast<i32>(soft_light_detail::low_8(i));
+    table[i + soft_light_reach_8] = static_cast<i32>(soft_light_detail::high_8(i));
+  }
+  return table;
+}();
+static_assert(soft_light_8[1] == 1 && soft_light_8[256 + 1] == 3);
+static_assert(soft_light_8[255] == 0 && soft_light_8[256 + 255] == 0);
 
 }  // namespace zr

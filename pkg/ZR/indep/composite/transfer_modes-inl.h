@@ -290,12 +290,15 @@ struct Overlay : Mode<XferOverlay, ModeKind::grey_ground> {
 struct SoftLight : Mode<XferSoftLight, ModeKind::grey_ground> {
   template <class M>
   static ZR_PURE auto full(auto s, auto d) {
-    return pick(s < M::half, d - M::mul(M::inv(2 * s), M::soft_low(d)), d + M::mul(2 * s - M::white, M::soft_high(d)));
+    const auto dark = s < M::half;
+    const auto reach = M::soft(dark, d);
+    return pick(dark, d - M::mul(M::inv(2 * s), reach), d + M::mul(2 * s - M::white, reach));
   }
   template <class M>
   static ZR_PURE auto partial(auto s, auto A, auto d) {
-    return pick(s < M::half, d - M::soft_weight(M::inv(2 * s), M::soft_low(d), A),
-                d + M::soft_weight(2 * s - M::white, M::soft_high(d), A));
+    const auto dark = s < M::half;
+    const auto reach = M::soft(dark, d);
+    return pick(dark, d - M::soft_weight(M::inv(2 * s), reach, A), d + M::soft_weight(2 * s - M::white, reach, A));
   }
 };
 

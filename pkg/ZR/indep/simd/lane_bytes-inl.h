@@ -43,12 +43,13 @@ struct Primitive<NarrowPixel8> {
   static HWY_INLINE Shorts inv(Shorts a) { return white - a; }
   // The estimate is the quotient or one less.
   static HWY_INLINE Shorts div(Shorts n, Shorts r) {
-    const Bools<i16> full = n >= r;
-    if (all(r == white)) return pick(full, white, n);
-    const Shorts numerator = shifted_left<8>(n) - n + shifted_right<1>(r);
+    if (all(r == white)) return hn::Min(n.v, r.v);
+    const Shorts held = hn::Min(n.v, r.v);  // what is as great as r has the quotient white
+    const Shorts numerator = shifted_left<8>(held) - held + shifted_right<1>(r);
     const Shorts least = high(numerator, reciprocal(r));
     const Shorts quotient = pick(numerator - least * r >= r, least + 1, least);
-    return pick(full, white, quotient);
+    const Bools<i16> by_zero = r == 0;
+    return none(by_zero) ? quotient : pick(by_zero, white, quotient);
   }
 
  private:
@@ -59,7 +60,7 @@ struct Primitive<NarrowPixel8> {
   }
   // With u = t + rounding: (u + (u >> 8)) >> 8, which is u * 257 >> 16.
   static HWY_INLINE Shorts fold(Shorts t, Shorts rounding) { return high(t + rounding, 257); }
-  // 65536 / r less at most 1, and never more, for r above 1; any number for 0 and 1.
+  // 65536 / r less at most 1 and 1 / (8 r), never more, and below 65536; any number for r = 0.
   static HWY_INLINE Shorts reciprocal(Shorts r) {
     const Pairs pairs = pairs_of(r.v);
     const Pairs even = rounded_reciprocal(hn::And(pairs, hn::Set(PairTag(), 65535)));
@@ -76,7 +77,7 @@ struct Primitive<NarrowPixel8> {
 #else
     const auto y = hn::Div(hn::Set(d, 1.0f), v);
 #endif
-    return pairs_of(hn::MulAdd(y, hn::Set(d, 65536.0f), hn::Set(d, 8388607.5f)));
+    return pairs_of(hn::MulAdd(y, hn::Set(d, 65535.9f), hn::Set(d, 8388607.5f)));
   }
 };
 
@@ -98,9 +99,7 @@ struct Narrow {
   static HWY_INLINE Px<M> load(const ZR_Pixel8* p) {
     const Pairs first = words(p), second = words(p + lane_count());
     const auto low = [](Pairs v) HWY_ATTR { return hn::And(v, hn::Set(PairTag(), 0x00ff00ff)); };
-    const auto high = [](Pairs v) HWY_ATTR {
-      return pairs_of(hn::ShiftRight<8>(hn::BitCast(Tag<u16>(), v)));
-    };
+    const auto high = [](Pairs v) HWY_ATTR { return pairs_of(hn::ShiftRight<8>(hn::BitCast(Tag<u16>(), v))); };
     const auto lower = [](Pairs a, Pairs b) HWY_ATTR { return joined(a, hn::ShiftLeft<16>(b)); };
     const auto upper = [](Pairs a, Pairs b) HWY_ATTR { return joined(hn::ShiftRight<16>(a), b); };
     return {lower(low(first), low(second)), lower(high(first), high(second)), upper(low(first), low(second)),

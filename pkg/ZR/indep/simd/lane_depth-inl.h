@@ -28,6 +28,26 @@ template <class N>
 HWY_INLINE Lane<N> entry_of(const N* table, Ints index) {
   return hn::GatherIndex(Tag<N>(), table, index.v);
 }
+// An entry and the one behind it, in one read of both.
+template <class N>
+struct Entries {
+  Lane<N> first, next;
+};
+template <class N>
+HWY_INLINE Entries<N> entries_of(const N* table, Ints index) {
+  const Tag<i64> wide;
+  const Tag<N> d;
+  const auto both = [&](auto at) HWY_ATTR {
+    return hn::GatherOffset(wide, reinterpret_cast<const i64*>(table), hn::ShiftLeft<2>(at));
+  };
+  const auto pairs = hn::BitCast(wide, index.v);  // of indices, as they are positive
+  const auto even = both(hn::And(pairs, hn::Set(wide, 0xffffffff)));
+  const auto odd = both(hn::BitCast(wide, hn::ShiftRight<32>(hn::BitCast(Tag<u64>(), pairs))));
+  return {hn::OddEven(hn::BitCast(d, hn::ShiftLeft<32>(odd)), hn::BitCast(d, even)),
+          hn::OddEven(hn::BitCast(d, odd), hn::BitCast(d, hn::ShiftRight<32>(hn::BitCast(Tag<u64>(), even))))};
+}
+// A condition on floats, for choices between integers.
+HWY_INLINE Bools<i32> of_ints(Bools<f32> condition) { return {hn::RebindMask(Tag<i32>(), condition.mask)}; }
 
 // a * b / c toward zero for c > 0; the product wraps. By doubles, whose quotient is never off by an integer.
 HWY_INLINE Ints product_ratio(Ints a, Ints b, Ints c) {
@@ -73,20 +93,46 @@ struct Primitive<ZR_Pixel16> {
   static HWY_INLINE Ints mul(Ints a, Ints b) { return shifted_right<15>(a * b + 16383); }
   static HWY_INLINE Ints smul(Ints k, Ints x) { return shifted_right<15>(k * x); }
   static HWY_INLINE Ints inv(Ints a) { return white - a; }
-  // The estimate is off by less than 1/64; made a little small, it is the quotient or one less.
   static HWY_INLINE Ints div(Ints n, Ints r) {
     const Bools<i32> full = at_least(n, r);
-    if (all(full || r == white)) return pick(full, white, n);
-    const Ints numerator = shifted_left<15>(n) + shifted_right<1>(r);
-    const Ints least = fitting_int(to_float(numerator) * (1.0f / to_float(r)) - 0.03125f);
-    const Ints quotient = pick(numerator - least * r >= r, least + 1, least);
-    return pick(full, white, quotient);
+    if (all(r == white)) return pick(full, white, n);
+    return pick(full, white, quotient(n, r));
   }
   static HWY_INLINE Ints luma(Ints r, Ints g, Ints b) {
     return shifted_right<15>(luma_red * r + luma_green * g + luma_blue * b + 16384);
   }
 
  private:
+#if HWY_NATIVE_FMA
+  // The quotient to the nearest integer, for n < r: an estimate that is never too great and too small by less than
+  // 1/16, rounded by a sum in which floats have no fraction left, is the quotient or one less. What is left of n
+  // then, in 1/32768, has few enough bits to come out exactly.
+  static HWY_INLINE Ints quotient(Ints n, Ints r) {
+    constexpr f32 no_fraction = 8388608.0f, scale = 32768.0f * (1.0f - 0x1p-20f);
+    const Tag<f32> d;
+    const Floats dividend = to_float(n), divisor = to_float(r), unit = divisor * 0x1p-15f;
+    const Floats snapped = hn::MulAdd(dividend.v, (reciprocal(divisor) * scale).v, hn::Set(d, no_fraction));
+    const Floats rest = hn::NegMulAdd((snapped - no_fraction).v, unit.v, dividend.v);
+    const Ints least = masked(hn::BitCast(Tag<i32>(), snapped.v), 65535);
+    return pick(of_ints(rest >= unit * 0.5f), least + 1, least);
+  }
+  // Off by less than 2^-22 of itself.
+  static HWY_INLINE Floats reciprocal(Floats r) {
+#if HWY_ARCH_X86
+    const Floats estimate = hn::ApproximateReciprocal(r.v);
+    return estimate * Floats(hn::NegMulAdd(r.v, estimate.v, hn::Set(Tag<f32>(), 2.0f)));
+#else
+    return 1.0f / r;
+#endif
+  }
+#else
+  // The estimate is off by less than 1/64; made a little small, it is the quotient or one less.
+  static HWY_INLINE Ints quotient(Ints n, Ints r) {
+    const Ints numerator = shifted_left<15>(n) + shifted_right<1>(r);
+    const Ints least = fitting_int(to_float(numerator) * (1.0f / to_float(r)) - 0.03125f);
+    return pick(numerator - least * r >= r, least + 1, least);
+  }
+#endif
   // Negative numbers count as the greatest.
   static HWY_INLINE Bools<i32> at_least(Ints n, Ints r) {
     const hn::Rebind<u32, Tag<i32>> unsigned_tag;

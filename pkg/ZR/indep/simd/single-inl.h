@@ -44,6 +44,17 @@ template <class N>
 constexpr N entry_of(const N* table, i32 index) {
   return table[index];
 }
+// An entry and the one behind it.
+template <class N>
+struct Entries {
+  N first, next;
+};
+template <class N>
+constexpr Entries<N> entries_of(const N* table, i32 index) {
+  return {table[index], table[index + 1]};
+}
+// A condition on floats, for choices between integers.
+constexpr bool of_ints(bool condition) { return condition; }
 
 // A pixel of such numbers.
 template <class M>
