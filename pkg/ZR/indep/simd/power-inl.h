@@ -49,13 +49,11 @@ HWY_INLINE Doubles two_to_low_bits(Doubles v) {
   return {one(v.low), one(v.high)};
 }
 using Truth = Bools<f32>;
-HWY_INLINE Bools<i32> of_ints(Truth t) { return {hn::RebindMask(Tag<i32>(), t.mask)}; }
 #else
 using Doubles = f64;
 using Floats = f32;
 using Ints = i32;
 using Truth = bool;
-constexpr bool of_ints(bool t) { return t; }
 constexpr f64 to_double(f32 v) { return v; }
 constexpr f64 to_double(i32 v) { return v; }
 constexpr f32 narrowed(f64 v) { return static_cast<f32>(v); }
