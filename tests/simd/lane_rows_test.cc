@@ -93,6 +93,58 @@ TYPED_TEST(LaneRows, InnerBlends) {
   }
 }
 
+// Modes on a ground run their four passes in one on lanes.
+TYPED_TEST(LaneRows, WholeRows) {
+  using T = TypeParam;
+  for (i32 mode = -3; mode <= 40; ++mode) {
+    if (mode == -1) continue;
+    for (const f32 opacity : {1.0f, 0.37f, 0.0f}) {
+      ZR_BlendingMode<T> record{};
+      record.mode = mode;
+      record.opacity = part_of_white<T>(opacity);
+      const auto run = [&](i32 n, const T* src, const T* mask, T* dst) {
+        const ZR_BlendModeDescriptor<T> plan(record, mask != nullptr, nullptr);
+        ASSERT_EQ(ZR_BlendPipeline<T>(nullptr, n, &plan, src, mask, nullptr, dst), 0);
+      };
+      const std::string name = "whole row of mode " + std::to_string(mode);
+      this->compare(name.c_str(), [&](i32 n, T* s, T*, T* d) { run(n, s, nullptr, d); });
+      this->compare((name + " masked").c_str(), [&](i32 n, T* s, T* m, T* d) { run(n, s, m, d); });
+      this->compare((name + " in place").c_str(), [&](i32 n, T*, T* m, T* d) { run(n, d, m, d); });
+      if (this->HasFatalFailure()) return;
+    }
+  }
+}
+
+// Quotients of all bytes, and of many deeper channels, where vectors estimate them.
+TYPED_TEST(LaneRows, Quotients) {
+  using T = TypeParam;
+  constexpr u32 white = static_cast<u32>(zr::Depth<T>::white);
+  constexpr i32 n = 1 << 16;
+  std::vector<T> src(n), dst(n), expected;
+  for (u32 i = 0; i < n; ++i) {
+    // Above 8 bits by a divisor and what lies around its halves, where roundings part.
+    const u32 below = white == 255 ? i >> 8 : static_cast<u32>(this->random_()) % (white + 1);
+    const u32 above = white == 255 ? i & 255 : (i % 2 * below + i % 7) / 2 % (white + 1);
+    const u32 any = static_cast<u32>(this->random_()) % (white + 1);
+    const auto channel = [](u32 v) { return static_cast<zr::Channel<T>>(v); };
+    src[i] = {channel(white), channel(white - below), channel(any), channel(white - i % (white + 1))};
+    dst[i] = {channel(white), channel(above), channel(white - below), channel(any)};
+  }
+  ZR_BlendingMode<T> record{};
+  record.mode = XferColorDodge;
+  record.opacity = part_of_white<T>(1);
+  for (int level = 0; level < 4 && Instructions::has(level); ++level) {
+    const Instructions instructions(level);
+    ZR_InnerBlendingFunc<T> row = nullptr;
+    ASSERT_EQ((ZR_GetInnerBlendingFunc<T, false, false>(record.mode, &row)), 0);
+    std::vector<T> out = dst;
+    ASSERT_EQ(row(n, &record, nullptr, src.data(), nullptr, out.data()), 0);
+    if (level == 0) expected = out;
+    for (u32 i = 0; i < n; ++i)
+      ASSERT_TRUE(same_pixel(out[i], expected[i])) << Instructions::names[level] << ", pixel " << i;
+  }
+}
+
 TYPED_TEST(LaneRows, GroundsAndAlphas) {
   using T = TypeParam;
   struct Row {

@@ -7,6 +7,7 @@
 #endif
 
 #include "composite/lane_ground_rows.h"
+#include "composite/lane_matte_mix-inl.h"
 #include "composite/mode_kinds-inl.h"
 #include "simd/lane_row-inl.h"
 #include "world/lane_premul_rows.h"
@@ -15,7 +16,7 @@ HWY_BEFORE_NAMESPACE();
 namespace zr {
 namespace HWY_NAMESPACE {
 
-// Modes that run as single numbers: their rows are no function of each pixel alone.
+// Modes of which a row is a function of each pixel alone.
 template <class Mode>
 inline constexpr bool has_lanes = Mode::kind != ModeKind::row_only&& Mode::kind != ModeKind::copy;
 
@@ -87,7 +88,8 @@ i32 lane_row(i32 n, const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingTable
   if (mode->opacity > M::white || runs_into(src, dst, n) || (mask != nullptr && runs_into(mask, dst, n)))
     return single(n, mode, tables, src, mask, dst);
   const Source<M> source = {mode->opacity, mode->opacity == M::white};
-  const bool keep_alpha = Mode::kind == ModeKind::over && Mode::row_class == RowClass::plain && mode->keep_alpha != 0;
+  const bool keep_alpha = (Mode::kind == ModeKind::copy || Mode::kind == ModeKind::over) &&
+                          Mode::row_class == RowClass::plain && mode->keep_alpha != 0;
   each_block<typename Lanes<Mode, T>::Pack>(n, src, mask, dst, [&](const T* s, const T* m, T* d, i32 count) HWY_ATTR {
     if (!blend_lanes<Mode>(source, keep_alpha, s, m, d)) single(count, mode, tables, s, m, d);
   });
@@ -99,6 +101,16 @@ i32 unmasked_lane_row(i32 n, const ZR_BlendingMode<T>* mode, const ZR_LinearBlen
   return lane_row<T, Mode>(n, mode, tables, src, nullptr, dst);
 }
 
+// Copies of whole pixels need no lanes.
+template <class T, bool masked>
+i32 copy_row(i32 n, const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingTables* tables, const T* src, const T* mask,
+             T* dst) {
+  const T* const cover = masked ? mask : nullptr;
+  if (cover == nullptr && mode->keep_alpha == 0 && mode->opacity == Depth<T>::white)
+    return single_rows<T, false>()[Copy::number - first_mode](n, mode, tables, src, nullptr, dst);
+  return lane_row<T, Copy>(n, mode, tables, src, cover, dst);
+}
+
 template <class T, bool masked>
 const InnerRows<T>& lane_rows() {
   static const InnerRows<T> rows = [] {
@@ -107,6 +119,8 @@ const InnerRows<T>& lane_rows() {
       if constexpr (has_lanes<Mode>)
         functions[Mode::number - first_mode] = masked ? &lane_row<T, Mode> : &unmasked_lane_row<T, Mode>;
     });
+    functions[Copy::number - first_mode] = functions[CopyFast::number - first_mode] = &copy_row<T, masked>;
+    functions[MatteMix::number - first_mode] = &matte_mix_row<T>;
     return functions;
   }();
   return rows;

@@ -151,7 +151,8 @@ inline constexpr bool scales_source = requires {
 };
 // Whether a source that is clear changes nothing.
 template <class Mode>
-inline constexpr bool passes_clear = Mode::kind != ModeKind::alpha_only && !scales_source<Mode>;
+inline constexpr bool passes_clear =
+    Mode::kind != ModeKind::alpha_only&& Mode::kind != ModeKind::copy && !scales_source<Mode>;
 
 template <class M, class Scale>
 ZR_PURE Px<M> scaled(const Px<M>& s, Scale&& scale) {
