@@ -141,8 +141,9 @@ template <class T>
 HWY_INLINE Raw<T> opaque_means(const Raw<T> (&square)[4]) {
   const auto mean = [&](auto k) HWY_ATTR {
     constexpr int c = decltype(k)::value;
-    return shifted_right<2>((channel_of<c>(square[0]) + channel_of<c>(square[1])) +
-                            (channel_of<c>(square[2]) + channel_of<c>(square[3])) + 2);
+    const Ints rounded = shifted_right<2>((channel_of<c>(square[0]) + channel_of<c>(square[1])) +
+                                          (channel_of<c>(square[2]) + channel_of<c>(square[3])) + 2);
+    return pick(rounded > i32{Depth<T>::white}, i32{Depth<T>::white}, rounded);
   };
   return packed<T>(mean(std::integral_constant<int, 0>()), mean(std::integral_constant<int, 1>()),
                    mean(std::integral_constant<int, 2>()), mean(std::integral_constant<int, 3>()));
@@ -197,10 +198,13 @@ i32 square_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum
     at.load(square);
     const Ints alphas[] = {alpha_bits(square[0]), alpha_bits(square[1]), alpha_bits(square[2]), alpha_bits(square[3])};
     const Ints any = (alphas[0] | alphas[1]) | (alphas[2] | alphas[3]);
-    if (all(any == 0)) return put(Raw<T>{}, out);
-    if constexpr (!std::is_same_v<T, ZR_PixelFloat>) {
+    const Bools<i32> clear = any == 0;
+    if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
+      if (all(clear)) return put(Raw<T>{}, out);
+    } else {
       const Ints every = (alphas[0] & alphas[1]) & (alphas[2] & alphas[3]);
-      if (all(any == i32{Depth<T>::white} && every == i32{Depth<T>::white})) return put(opaque_means(square), out);
+      const Bools<i32> opaque = any == i32{Depth<T>::white} && every == i32{Depth<T>::white};
+      if (all(opaque || clear)) return put(pick(opaque, opaque_means(square), Raw<T>{}), out);
     }
     BoxSums<T> sums;
     for (const Raw<T>& p : square) sums.add(p, [](Doubles v) HWY_ATTR { return v; });

@@ -1,0 +1,155 @@
+// Layers through matrices, scaled copies and tables of sums: single numbers against every instruction set, from worlds
+// between pages that cannot be read.
+#include <ZR/copy_bits.h>
+#include <ZR/summed_area.h>
+#include <ZR/transfer_mode.h>
+#include <ZR/transform_world.h>
+
+#include <cmath>
+#include <vector>
+
+#include "support/born_library.h"
+#include "support/edge_rows.h"
+
+namespace {
+
+template <class T>
+class LaneWorlds : public BornLibrary {
+ protected:
+  static constexpr i32 most_pixels = 500, most_columns = 90;
+
+  i32 below(i32 end) { return static_cast<i32>(random_() % static_cast<u32>(end)); }
+  f64 between(f64 low, f64 high) { return low + (high - low) * (below(4096) / 4095.0); }
+
+  // A packed world that ends or begins at an edge, top down or bottom up.
+  ZR_LayerDef world(EdgeRow& memory, i32 width, i32 height, bool at_end, bool upward) {
+    T* const pixels = memory.at<T>(width * height, at_end);
+    fill_edgy(random_, width * height, pixels);
+    ZR_LayerDef layer{};
+    layer.flags = zr::Depth<T>::layer_flags;
+    layer.width = width, layer.height = height;
+    layer.row_bytes = width * static_cast<i32>(sizeof(T)) * (upward ? -1 : 1);
+    layer.data = upward ? pixels + width * (height - 1) : pixels;
+    return layer;
+  }
+  ZR_LayerDef any_world(EdgeRow& memory) {
+    const i32 width = 1 + below(most_columns), height = 1 + below(std::min(most_pixels / width, 24));
+    return world(memory, width, height, below(2) != 0, below(2) != 0);
+  }
+  static std::vector<T> pixels_of(const ZR_LayerDef& layer) {
+    const T* const first = static_cast<const T*>(layer.data) + (layer.row_bytes < 0 ? layer.width * (1 - layer.height) : 0);
+    return {first, first + layer.width * layer.height};
+  }
+  static void put_back(const ZR_LayerDef& layer, const std::vector<T>& pixels) {
+    T* const first = static_cast<T*>(layer.data) + (layer.row_bytes < 0 ? layer.width * (1 - layer.height) : 0);
+    std::copy(pixels.begin(), pixels.end(), first);
+  }
+
+  // Runs body() on all sets, with `dst` as it is now; it returns an error.
+  template <class Body>
+  void compare(const std::string& what, const ZR_LayerDef& dst, Body&& body) {
+    const std::vector<T> before = pixels_of(dst);
+    std::vector<T> expected;
+    for (int level = 0; level < 4 && Instructions::has(level); ++level) {
+      put_back(dst, before);
+      {
+        const Instructions instructions(level);
+        ASSERT_EQ(body(), 0) << what;
+      }
+      const std::vector<T> got = pixels_of(dst);
+      if (level == 0) expected = got;
+      for (std::size_t i = 0; i < got.size(); ++i)
+        ASSERT_TRUE(same_pixel(got[i], expected[i])) << what << " by " << Instructions::names[level] << ", pixel " << i;
+    }
+  }
+
+  EdgeRow src_, dst_;
+  std::mt19937 random_{5};
+};
+using Depths = testing::Types<ZR_Pixel8, ZR_Pixel16, ZR_PixelFloat>;
+TYPED_TEST_SUITE(LaneWorlds, Depths);
+
+// Source to destination, the origin moved.
+GX_Matrix3 turned(f64 scale, f64 degrees, f64 dx, f64 dy) {
+  const f64 angle = degrees * 3.14159265358979323846 / 180, c = scale * std::cos(angle), s = scale * std::sin(angle);
+  return {{{c, -s, dx}, {s, c, dy}, {0, 0, 1}}};
+}
+
+TYPED_TEST(LaneWorlds, Transforms) {
+  for (i32 trial = 0; trial < 400; ++trial) {
+    ZR_LayerDef src = this->any_world(this->src_), dst = this->any_world(this->dst_);
+    constexpr f64 scales[] = {1, 1, 2, 1.3, 0.5, 0.4, 3.1};
+    constexpr f64 shifts[] = {0, 0.5, 3, -7.25, 1.0 / 3, -0.001};
+    const auto shift = [&] { return shifts[this->below(6)]; };
+    const f64 scale = scales[this->below(7)], degrees = this->below(2) != 0 ? 0 : this->between(-30, 30);
+    constexpr i32 counts[] = {1, 2, 2, 3, 6};
+    const i32 count = counts[this->below(5)];
+    const bool turns = this->below(2) != 0;
+    std::vector<GX_Matrix3> matrices;
+    for (i32 i = 0; i < count; ++i)
+      matrices.push_back(turned(scale, degrees + (turns ? 4.0 * i : 0.0), shift() + 5 * i, shift()));
+    const i32 quality = this->below(3);
+    const GX_LRect all = {0, 0, dst.width, dst.height};
+    const ZR_CompositeModePlus mode(this->below(2) != 0 ? XferCopyFast : XferInFront, 1.0f, nullptr, false, 0);
+    this->compare("trial " + std::to_string(trial), dst, [&] {
+      return ZR_TransformWorld(nullptr, quality, 0, 0, &src, &mode, nullptr, nullptr, matrices.data(), count, true, &all,
+                               &dst);
+    });
+    if (this->HasFatalFailure()) return;
+  }
+}
+
+TYPED_TEST(LaneWorlds, ScaledCopies) {
+  for (i32 trial = 0; trial < 400; ++trial) {
+    ZR_LayerDef src = this->any_world(this->src_);
+    ZR_LayerDef dst = this->any_world(this->dst_);
+    if (trial % 3 == 0) {  // halves
+      const i32 width = 2 * (1 + this->below(45)), height = 2;
+      src = this->world(this->src_, width, height, trial % 2 == 0, false);
+      dst = this->world(this->dst_, width / 2, height / 2, trial % 2 != 0, false);
+    }
+    for (const auto copy : {&ZR_CopyBits_Draft, &ZR_CopyBits_HQ_Straight})
+      this->compare("trial " + std::to_string(trial), dst, [&] { return copy(nullptr, &src, &dst, nullptr, nullptr); });
+    if (this->HasFatalFailure()) return;
+  }
+}
+
+// Rows of a large destination are kept beside it.
+TYPED_TEST(LaneWorlds, LargeScaledCopies) {
+  using T = TypeParam;
+  ZR_LayerDef src = this->world(this->src_, 90, 5, true, false);
+  constexpr i32 width = 1201, height = 901;
+  std::vector<T> pixels(static_cast<std::size_t>(width * height));
+  ZR_LayerDef dst{};
+  dst.flags = zr::Depth<T>::layer_flags;
+  dst.width = width, dst.height = height, dst.row_bytes = width * static_cast<i32>(sizeof(T)), dst.data = pixels.data();
+  this->compare("large", dst, [&] { return ZR_CopyBits_Draft(nullptr, &src, &dst, nullptr, nullptr); });
+}
+
+TYPED_TEST(LaneWorlds, SummedAreas) {
+  using T = TypeParam;
+  for (i32 trial = 0; trial < 60; ++trial) {
+    ZR_LayerDef layer = this->any_world(this->src_);
+    const ZR_WorldX<T> world(&layer, true);
+    const std::size_t entries = static_cast<std::size_t>(layer.width * layer.height);
+    for (const bool use_double : {false, true}) {
+      std::vector<f64> expected;
+      for (int level = 0; level < 4 && Instructions::has(level); ++level) {
+        const Instructions instructions(level);
+        const ZR_SummedAreaTable table(&world, use_double);
+        std::vector<f64> got;
+        const auto take = [&](const auto* entry) {
+          for (std::size_t i = 0; i < entries; ++i)
+            got.insert(got.end(), {entry[i].alpha, entry[i].red, entry[i].green, entry[i].blue});
+        };
+        table.UsesDouble() ? take(table.DoubleTable()) : take(table.FloatTable());
+        if (level == 0) expected = got;
+        for (std::size_t i = 0; i < got.size(); ++i)
+          ASSERT_TRUE(std::memcmp(&got[i], &expected[i], sizeof(f64)) == 0 || (got[i] != got[i] && expected[i] != expected[i]))
+              << "trial " << trial << " by " << Instructions::names[level] << ", sum " << i;
+      }
+    }
+  }
+}
+
+}  // namespace
