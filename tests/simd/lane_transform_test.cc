@@ -37,12 +37,17 @@ class LaneWorlds : public BornLibrary {
     return world(memory, width, height, below(2) != 0, below(2) != 0);
   }
   static std::vector<T> pixels_of(const ZR_LayerDef& layer) {
-    const T* const first = static_cast<const T*>(layer.data) + (layer.row_bytes < 0 ? layer.width * (1 - layer.height) : 0);
+    const T* const first =
+        static_cast<const T*>(layer.data) + (layer.row_bytes < 0 ? layer.width * (1 - layer.height) : 0);
     return {first, first + layer.width * layer.height};
   }
   static void put_back(const ZR_LayerDef& layer, const std::vector<T>& pixels) {
     T* const first = static_cast<T*>(layer.data) + (layer.row_bytes < 0 ? layer.width * (1 - layer.height) : 0);
     std::copy(pixels.begin(), pixels.end(), first);
+  }
+
+  static zr::Channel<T> part_of_white(f32 part) {
+    return static_cast<zr::Channel<T>>(part * static_cast<f32>(zr::Depth<T>::white));
   }
 
   // Runs body() on all sets, with `dst` as it is now; it returns an error.
@@ -92,8 +97,8 @@ TYPED_TEST(LaneWorlds, Transforms) {
     const GX_LRect all = {0, 0, dst.width, dst.height};
     const ZR_CompositeModePlus mode(this->below(2) != 0 ? XferCopyFast : XferInFront, 1.0f, nullptr, false, 0);
     this->compare("trial " + std::to_string(trial), dst, [&] {
-      return ZR_TransformWorld(nullptr, quality, 0, 0, &src, &mode, nullptr, nullptr, matrices.data(), count, true, &all,
-                               &dst);
+      return ZR_TransformWorld(nullptr, quality, 0, 0, &src, &mode, nullptr, nullptr, matrices.data(), count, true,
+                               &all, &dst);
     });
     if (this->HasFatalFailure()) return;
   }
@@ -106,6 +111,10 @@ TYPED_TEST(LaneWorlds, ScaledCopies) {
     if (trial % 3 == 0) {  // halves
       const i32 width = 2 * (1 + this->below(45)), height = 2;
       src = this->world(this->src_, width, height, trial % 2 == 0, false);
+      auto* const pixels = static_cast<TypeParam*>(src.data);
+      if (trial % 4 != 0)  // opaque in front, clear behind
+        for (i32 i = 0; i < width * height; ++i)
+          pixels[i].alpha = this->part_of_white(i % width < trial % 160 ? 1.0f : 0.0f);
       dst = this->world(this->dst_, width / 2, height / 2, trial % 2 != 0, false);
     }
     for (const auto copy : {&ZR_CopyBits_Draft, &ZR_CopyBits_HQ_Straight})
@@ -145,7 +154,8 @@ TYPED_TEST(LaneWorlds, SummedAreas) {
         table.UsesDouble() ? take(table.DoubleTable()) : take(table.FloatTable());
         if (level == 0) expected = got;
         for (std::size_t i = 0; i < got.size(); ++i)
-          ASSERT_TRUE(std::memcmp(&got[i], &expected[i], sizeof(f64)) == 0 || (got[i] != got[i] && expected[i] != expected[i]))
+          ASSERT_TRUE(std::memcmp(&got[i], &expected[i], sizeof(f64)) == 0 ||
+                      (got[i] != got[i] && expected[i] != expected[i]))
               << "trial " << trial << " by " << Instructions::names[level] << ", sum " << i;
       }
     }
