@@ -50,8 +50,8 @@ const Work works[] = {
      }},
 };
 
-constexpr const Placement* placements[] = {&turned_draft, &turned_bilinear, &turned_bicubic,
-                                           &reduced_area, &moved,           &moved_half_pixel};
+constexpr const Placement* placements[] = {&turned_draft, &turned_bilinear,  &turned_bicubic, &reduced_area,
+                                           &moved,        &moved_half_pixel, &moved_subpixel};
 
 const bool registered = [] {
   for (const Size size : sizes)

@@ -41,6 +41,7 @@ const bool registered = [] {
       add_warp<T>(turned_bilinear, size, cv::INTER_LINEAR);
       add_warp<T>(turned_bicubic, size, cv::INTER_CUBIC);
       add_warp<T>(moved_half_pixel, size, cv::INTER_LINEAR);
+      add_warp<T>(moved_subpixel, size, cv::INTER_LINEAR);
       add_placed_peer<T>(reduced_area, "opencv-resize-only", size, [](auto& src, auto& dst, const GX_Matrix3& m) {
         cv::Mat to = picture_of<T>(dst);
         cv::Mat part = to(

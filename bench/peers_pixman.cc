@@ -127,6 +127,7 @@ const bool registered = [] {
     add_placed(turned_draft, size, PIXMAN_FILTER_NEAREST);
     add_placed(turned_bilinear, size, PIXMAN_FILTER_BILINEAR);
     add_placed(moved_half_pixel, size, PIXMAN_FILTER_BILINEAR);
+    add_placed(moved_subpixel, size, PIXMAN_FILTER_BILINEAR);
     add_resize(nearest_half, size, PIXMAN_FILTER_NEAREST);
     add_resize(nearest_double, size, PIXMAN_FILTER_NEAREST);
     add_resize(bilinear_larger, size, PIXMAN_FILTER_BILINEAR);

@@ -32,7 +32,8 @@ inline constexpr Placement turned_draft = {"transform-turned-draft", 0, turned_d
                            turned_bicubic = {"transform-turned-bicubic", 2, turned_degrees, enlarged, 0, 0},
                            reduced_area = {"transform-reduced-area", 1, 0, reduced, 0, 0},
                            moved = {"transform-moved", 1, 0, 1, 7, 5},
-                           moved_half_pixel = {"transform-moved-half-pixel", 1, 0, 1, 7.5, 5.5};
+                           moved_half_pixel = {"transform-moved-half-pixel", 1, 0, 1, 7.5, 5.5},
+                           moved_subpixel = {"transform-moved-subpixel", 1, 0, 1, 7.3, 5.6};
 
 // Work between frames of two sizes.
 struct Resize {

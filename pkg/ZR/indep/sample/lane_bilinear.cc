@@ -76,6 +76,58 @@ HWY_INLINE Raw<T> integer_mix(const Raw<T> (&p)[4], const LaneWeights<Real>& wei
   return pick(same, p[0], pick(clear, Raw<T>{}, mixed));
 }
 
+// Weights of a phase in whole sixteenths of a pixel: with 8-bit channels all their products and sums are exact in
+// single precision, so that whole numbers give the same.
+class Sixteenths {
+ public:
+  static bool suits(u32 fraction_x, u32 fraction_y) { return ((fraction_x | fraction_y) & 0xfff) == 0; }
+  HWY_INLINE Sixteenths(u32 fraction_x, u32 fraction_y) {
+    const u32 x = fraction_x >> 12, y = fraction_y >> 12;
+    const u32 w[4] = {(16 - x) * (16 - y), x * (16 - y), (16 - x) * y, x * y};  // of 256
+    for (i32 i = 0; i < 4; ++i) w_[i] = hn::Set(D(), static_cast<u16>(w[i]));
+  }
+  // False where alphas differ.
+  HWY_INLINE bool mix(const Raw<ZR_Pixel8> (&p)[4], Raw<ZR_Pixel8>* out) const {
+    const Ints a = p[0].w[0];
+    const Ints difference = ((a ^ p[1].w[0]) | (a ^ p[2].w[0])) | (a ^ p[3].w[0]);
+    if (!all(masked(difference, 255) == 0)) return false;
+    const D d;
+    auto even = hn::Set(d, 128), odd = even;
+    for (i32 i = 0; i < 4; ++i) {
+      const auto v = hn::BitCast(d, p[i].w[0].v);
+      even = hn::Add(even, hn::Mul(hn::And(v, hn::Set(d, 255)), w_[i]));
+      odd = hn::Add(odd, hn::Mul(hn::ShiftRight<8>(v), w_[i]));
+    }
+    const auto both = hn::Or(hn::ShiftRight<8>(even), hn::And(odd, hn::Set(d, 0xff00)));
+    const Ints mixed = hn::BitCast(Tag<i32>(), both);
+    out->w[0] = pick(difference == 0, a, pick(masked(a, 255) == 0, 0, mixed));
+    return true;
+  }
+
+ private:
+  using D = hn::Repartition<u16, Tag<i32>>;
+  hn::Vec<D> w_[4];
+};
+
+// A span of 8-bit pixels in such a phase.
+template <class Sum>
+i32 sixteenth_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, ZR_Pixel8* dst) {
+  const u32 fraction_x = static_cast<u32>(run.x) & 0xffff, fraction_y = static_cast<u32>(run.y) & 0xffff;
+  const LaneWeights<Floats> phase(Ints(run.x & 0xffff), Ints(run.y & 0xffff));
+  const Sixteenths whole(fraction_x, fraction_y);
+  using Neighbours = Adjacent<ZR_Pixel8>;
+  return sample_vectors<ZR_Pixel8, Neighbours>(run, *params.src, sum, dst,
+                                               [&](const Neighbours& at, ZR_Pixel8* out) HWY_ATTR {
+                                                 Raw<ZR_Pixel8> upper[2], lower[2], mixed;
+                                                 at.row(0, 0, upper);
+                                                 at.row(0, 1, lower);
+                                                 const Raw<ZR_Pixel8> p[4] = {upper[0], upper[1], lower[0], lower[1]};
+                                                 if (!whole.mix(p, &mixed))
+                                                   mixed = integer_mix<ZR_Pixel8>(p, phase, Ints(0) != Ints(0));
+                                                 return put(mixed, out);
+                                               });
+}
+
 HWY_INLINE Raw<ZR_PixelFloat> float_mix(const Raw<ZR_PixelFloat> (&p)[4], const LaneWeights<Floats>& weights) {
   Floats alpha[4];
   for (i32 i = 0; i < 4; ++i) alpha[i] = as_floats(p[i].w[0]);
@@ -225,6 +277,15 @@ i32 bilinear_row(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, 
   }
 }
 
+// Steps of one pixel.
+template <class T>
+i32 bilinear_span_row(const SampleRun& run, const ZR_SampPB& params, AlphaSum<T>* sum, T* dst) {
+  if constexpr (std::is_same_v<T, ZR_Pixel8>)
+    if (Sixteenths::suits(static_cast<u32>(run.x) & 0xffff, static_cast<u32>(run.y) & 0xffff))
+      return sixteenth_vectors(run, params, sum, dst);
+  return bilinear_vectors<T, Adjacent<T>>(run, params, sum, dst);
+}
+
 // Integer depths say of whole positions that they are not inside, and copy them.
 template <class T>
 inline constexpr bool copies_whole = !std::is_same_v<T, ZR_PixelFloat>;
@@ -266,7 +327,7 @@ i32 bilinear_weighted_motion(const MotionRun& run, const ZR_SampPB& params, RowS
 template <class T>
 const LaneRows<T>* bilinear_rows() {
   static constexpr LaneRows<T> rows = [] {
-    LaneRows<T> r = {nullptr, &bilinear_vectors<T, Adjacent<T>, AlphaSum<T>>, nullptr, &bilinear_weighted_motion<T>};
+    LaneRows<T> r = {nullptr, &bilinear_span_row<T>, nullptr, &bilinear_weighted_motion<T>};
     if constexpr (gains_from_lanes<T>) {
       r.no_clip = &bilinear_row<T>;
       r.motion = &bilinear_motion<T>;
