@@ -3,6 +3,7 @@
 #include <ZR/errors.h>
 
 #include <algorithm>
+#include <cstdlib>
 #include <limits>
 #include <type_traits>
 
@@ -65,6 +66,99 @@ bool find_divisors(Convolution<T>* c, bool normalised) {
   return true;
 }
 
+// A call's taps as lanes take them, made anew where other rows of the kernel meet the source.
+template <class T>
+class LaneTaps {
+ public:
+  // Lanes serve kernels whose numbers fit theirs, and not the largest ones.
+  explicit LaneTaps(const Convolution<T>& c) : c_(c), row_(lane_convolve<T>()) {
+    const i64 taps = static_cast<i64>(c.width) * c.height;
+    if (row_ == nullptr || taps > most_taps || !fits(taps)) return;
+    taps_ = static_cast<LaneTap<T>*>(HB_AllocatePtr(static_cast<u64>(taps) * sizeof(LaneTap<T>),
+                                                    HB_ZLookupLStrCache(ZR_G_zref, ZR_Str_BlurMemory, 0, 0),
+                                                    ZR_ModuleCode | ZR_Site_Convolve));
+    if (taps_ == nullptr) fail(ZR_Err_OutOfMemory);
+  }
+  ~LaneTaps() { HB_FreePtr(taps_); }
+  LaneTaps(const LaneTaps&) = delete;
+  LaneTaps& operator=(const LaneTaps&) = delete;
+
+  void row(i32 y, i32 pixels, T* dst) {
+    const i64 reach = c_.width / 2;
+    const i32 first = static_cast<i32>(std::min<i64>(reach, pixels));
+    const i32 end = static_cast<i32>(std::clamp<i64>(c_.src_width - reach, first, pixels));
+    const KernelRows rows = kernel_rows_at(c_, y);
+    i32 done = 0;
+    if (taps_ != nullptr && end > first && rows.first < rows.end) {
+      if (rows.first != rows_.first || rows.end != rows_.end) collect(rows);
+      work_.src = c_.source_row(y) + first;
+      work_.pixels = end - first;
+      work_.dst = dst + first;
+      done = row_(work_);
+    }
+    convolve_pixels(c_, y, 0, first, dst);
+    convolve_pixels(c_, y, first + done, pixels, dst);
+  }
+
+ private:
+  static constexpr i64 most_taps = 1 << 16;
+  static constexpr bool whole = !std::is_same_v<T, ZR_PixelFloat>;
+
+  bool fits(i64 taps) const {
+    if (!whole) return true;
+    for (i32 k = 0; k < 4; ++k) {
+      if (c_.tap_sums[k] > std::numeric_limits<i32>::max() / greatest_channel<T>) return false;
+      for (i64 i = 0; i < taps; ++i)
+        if (c_.kernels[k][i] > 32767 || c_.kernels[k][i] < -32767) return false;
+    }
+    return true;
+  }
+  i32 weight(u32 channel, i64 tap) const {
+    const i32 value = c_.kernels[channel][tap];
+    return whole && c_.divisors[channel] < 0 ? -value : value;
+  }
+  i64 place(i64 tap) const {
+    const i64 v = tap / c_.width - c_.height / 2, u = tap % c_.width - c_.width / 2;
+    return v * c_.src_row_bytes + u * static_cast<i64>(sizeof(T));
+  }
+  void collect(KernelRows rows) {
+    rows_ = rows;
+    work_ = {};
+    const i64 first = static_cast<i64>(rows.first) * c_.width, end = static_cast<i64>(rows.end) * c_.width;
+    for (u32 k = 0; k < 4; ++k) {
+      i64 sum = 0;
+      for (i64 i = first; i < end; ++i) sum += weight(k, i);
+      if (std::is_same_v<T, ZR_Pixel16>) work_.bias[k] = static_cast<i32>(sum * 32768);
+      if (whole) work_.divisors[k] = static_cast<i32>(std::abs(c_.divisors[k]));
+      work_.float_divisors[k] = static_cast<f32>(c_.divisors[k]);
+    }
+    work_.wraps = c_.wraps;
+    work_.taps = taps_;
+    constexpr i64 at_once = whole ? 2 : 1;
+    for (i64 i = first; i < end; i += at_once) {
+      LaneTap<T>& tap = taps_[work_.count++];
+      if constexpr (whole) {
+        const bool both = i + 1 < end;
+        tap.first = tap.second = place(i);
+        if (both) tap.second = place(i + 1);
+        for (u32 k = 0; k < 4; ++k) {
+          tap.weights[2 * k] = static_cast<i16>(weight(k, i));
+          tap.weights[2 * k + 1] = static_cast<i16>(both ? weight(k, i + 1) : 0);
+        }
+      } else {
+        tap.place = place(i);
+        for (u32 k = 0; k < 4; ++k) tap.weights[k] = static_cast<f32>(weight(k, i));
+      }
+    }
+  }
+
+  const Convolution<T>& c_;
+  LaneConvolveFunc<T>* row_;
+  LaneTap<T>* taps_ = nullptr;
+  KernelRows rows_ = {0, 0};
+  LaneConvolution<T> work_ = {};
+};
+
 template <class T>
 i32 convolve(const ZR_ProgressInfo* progress, const ZR_LayerDef* src, u32 flags, i32 size, const i32* a, const i32* r,
              const i32* g, const i32* b, ZR_LayerDef* dst) {
@@ -78,7 +172,7 @@ i32 convolve(const ZR_ProgressInfo* progress, const ZR_LayerDef* src, u32 flags,
   c.height = one_row && !upright ? 1 : size;
   const i32* const kernels[] = {a, r, g, b};
   std::copy(kernels, kernels + 4, c.kernels);
-  c.wraps = (flags & ZR_ConvolveFlag_NoClamp) != 0;
+  c.wraps = std::is_same_v<T, ZR_Pixel8> && (flags & ZR_ConvolveFlag_NoClamp) != 0;
   c.src = static_cast<const char*>(src->data);
   c.src_row_bytes = src->row_bytes;
   c.src_width = src->width;
@@ -86,10 +180,11 @@ i32 convolve(const ZR_ProgressInfo* progress, const ZR_LayerDef* src, u32 flags,
   if (!find_divisors(&c, (flags & ZR_ConvolveFlag_Normalised) != 0))
     return failed_verification(ZR_Site_Convolve, "sums of a kernel of ZR_Convolve do not fit 64 bits");
 
+  LaneTaps<T> rows(c);
   i64 work = 0;
   for (i32 y = 0; y < dst->height; ++y) {
     T* const row = reinterpret_cast<T*>(static_cast<char*>(dst->data) + static_cast<i64>(y) * dst->row_bytes);
-    convolve_pixels(c, y, 0, dst->width, row);
+    rows.row(y, dst->width, row);
     work += static_cast<i64>(c.width) * c.height * dst->width;
     if (progress == nullptr || progress->progress == nullptr || work < taps_before_poll) continue;
     if (const i32 stop = progress->progress(progress->refcon, y + 1, dst->height); stop != 0) return stop;

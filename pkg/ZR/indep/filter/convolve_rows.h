@@ -3,6 +3,8 @@
 
 #include <ZR/depth.h>
 
+#include <type_traits>
+
 namespace zr {
 
 // Kernels and worlds of one call. Kernels are width x height taps around (width / 2, height / 2).
@@ -35,11 +37,37 @@ KernelRows kernel_rows_at(const Convolution<T>& c, i32 y) {
 template <class T>
 void convolve_pixels(const Convolution<T>& c, i32 y, i32 first, i32 end, T* dst_row);
 
-// On lanes: some or all pixels of row y whose windows lie between the left and right border of the source. Returns
-// those done; the caller does the others. Made for a call, with scratch of its own.
-template <class T>
-struct PixelSpan {
-  i32 first, end;
+// Taps as lanes take them, at distances in bytes from the window's middle; weights in the order of the channels.
+struct alignas(16) TapPair {
+  i16 weights[8];  // of both taps for alpha, then red, ...
+  i64 first, second;
 };
+struct alignas(16) FloatTap {
+  f32 weights[4];
+  i64 place;
+};
+template <class T>
+using LaneTap = std::conditional_t<std::is_same_v<T, ZR_PixelFloat>, FloatTap, TapPair>;
+
+// Pixels side by side whose windows have the same taps, all in the source. Of whole numbers all sums fit 32 bits, and
+// divisors are positive, as weights have taken their sign.
+template <class T>
+struct LaneConvolution {
+  const LaneTap<T>* taps;
+  i64 count;
+  i32 bias[4];      // 16 bits: 32768 times the weights' sum; samples are taken 32768 lower, to fit signed numbers
+  i32 divisors[4];  // whole numbers
+  f32 float_divisors[4];
+  bool wraps;
+  const T* src;  // of the first pixel's window the middle
+  i32 pixels;
+  T* dst;
+};
+// Does all pixels, or none where they are too few; returns how many.
+template <class T>
+using LaneConvolveFunc = i32(const LaneConvolution<T>& work);
+// The fastest that this processor has, or null.
+template <class T>
+LaneConvolveFunc<T>* lane_convolve();
 
 }  // namespace zr
