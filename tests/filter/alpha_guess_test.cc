@@ -85,7 +85,9 @@ TEST_F(AlphaGuess, KnownPictures) {
       {"colour above alpha", {clear, {10, 80, 0, 10}, red}, {0, {}}},
       {"one opaque colour", {red, red, red, red}, {0, {}}},
       {"opaque colours: nothing tells them from a black matte", {red, blue}, {1, {255, 0, 0, 0}}},
-      {"a grey matte", {{0, 90, 91, 90}, {0, 90, 91, 90}, {0, 91, 92, 90}, {20, 80, 85, 95}, red}, {1, {255, 90, 91, 90}}},
+      {"a grey matte",
+       {{0, 90, 91, 90}, {0, 90, 91, 90}, {0, 91, 92, 90}, {20, 80, 85, 95}, red},
+       {1, {255, 90, 91, 90}}},
       {"clear colours vary", {{0, 90, 90, 90}, {0, 93, 90, 90}, {90, 90, 90, 90}, {200, 1, 2, 3}}, {0, {}}},
       {"the lower of two peaks", {{0, 255, 9, 9}, {0, 254, 9, 9}, {255, 250, 9, 9}, red}, {1, {255, 254, 9, 9}}},
   };

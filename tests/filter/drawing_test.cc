@@ -42,7 +42,8 @@ TEST_F(Drawing, PixelsInsideOnly) {
 template <class T>
 void model_line(const f64 from[2], const f64 to[2], const T& pixel, TestWorld<T>& world) {
   const auto set = [&](i64 x, i64 y) {
-    if (x >= 0 && y >= 0 && x < world.width() && y < world.height()) world.at(static_cast<i32>(x), static_cast<i32>(y)) = pixel;
+    if (x >= 0 && y >= 0 && x < world.width() && y < world.height())
+      world.at(static_cast<i32>(x), static_cast<i32>(y)) = pixel;
   };
   const auto away = [](f64 v) { return static_cast<i64>(65536 * v + (v < 0 ? -0.5 : 0.5)); };
   i64 x = away(from[0]), y = away(from[1]);
@@ -141,8 +142,8 @@ TEST_F(Drawing, Spots) {
         for (i32 dx = -form.half_width; dx <= form.half_width; ++dx) {
           const i64 x = i64{at.x} + dx, y = i64{at.y} + dy;
           if (x < 0 || y < 0 || x >= 11 || y >= 8) continue;
-          const u32 w = weights[static_cast<size_t>((dy + form.half_height) * (2 * form.half_width + 1) + dx +
-                                                    form.half_width)];
+          const u32 w =
+              weights[static_cast<size_t>((dy + form.half_height) * (2 * form.half_width + 1) + dx + form.half_width)];
           ZR_Pixel8& p = expected.at(static_cast<i32>(x), static_cast<i32>(y));
           const auto mix = [w](u32 c, u32 k) { return static_cast<u8>((c * (255 - w) + k * w) / 255); };
           p = {mix(p.alpha, 250), mix(p.red, 0), mix(p.green, 100), mix(p.blue, 255)};

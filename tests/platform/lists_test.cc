@@ -30,6 +30,11 @@ TEST(Lists, BehaveLikeAVector) {
     ASSERT_EQ(SEQ_Insert(list, index, &i), 0);
     expected.insert(index == -1 ? expected.end() : expected.begin() + index, i);
   }
+  ASSERT_EQ(SEQ_AppendClear(list, 0), 0);
+  ASSERT_EQ(SEQ_AppendClear(list, 70), 0);
+  expected.resize(expected.size() + 70);
+  EXPECT_EQ(SEQ_AppendClear(list, -1), ZR_Err_BadParam);
+  EXPECT_EQ(SEQ_AppendClear(list, 0x7fffffff), ZR_Err_OutOfMemory);
   EXPECT_EQ(contents(list), expected);
   SEQ_Dispose(list);
 }
@@ -48,6 +53,7 @@ TEST(Lists, RefuseBadIndicesAndWhatWouldMoveALockedRecord) {
   ASSERT_NE(SEQ_GetAddress(list, 0), nullptr);
   SEQ_Unlock(list);
   EXPECT_EQ(SEQ_Insert(list, -1, &record), ZR_Err_Internal) << "one lock is left";
+  EXPECT_EQ(SEQ_AppendClear(list, 1), ZR_Err_Internal);
   SEQ_Unlock(list);
   EXPECT_EQ(SEQ_Insert(list, -1, &record), 0);
   SEQ_Dispose(list);

@@ -11,6 +11,9 @@
 #include "composite/matte_rows.h"
 #include "copy/track_matte.h"
 #include "iterate/lane_lut_rows.h"
+#include "copy/viewer_rows.h"
+#include "filter/matte_rows.h"
+#include "filter/plane_rows.h"
 #include "support/born_library.h"
 #include "support/edge_rows.h"
 #include "support/gamma_tables.h"
@@ -238,6 +241,44 @@ TEST_F(ByteRows, Tables) {
     compare("tables in place", [&](i32 n, ZR_Pixel8*, ZR_Pixel8*, ZR_Pixel8* d) { tables->row(n, d, d); });
     compare("tables onto what they read next",
             [&](i32 n, ZR_Pixel8*, ZR_Pixel8*, ZR_Pixel8* d) { tables->row(n - 1, d, d + 1); });
+  }
+}
+
+TYPED_TEST(LaneRows, Viewers) {
+  using T = TypeParam;
+  const zr::ViewerGround ground = {{200, 250, 0, 128}, {30, 1, 255, 77}, 0xfffffffd, 4};
+  for (i32 style = 0; style < static_cast<i32>(zr::ViewerStyle::count); ++style)
+    for (const bool reverse : {false, true})
+      this->template compare<ZR_Pixel8>("viewer row", [&](i32 n, T* s, T*, ZR_Pixel8* d) {
+        zr::viewer_row<T>(static_cast<zr::ViewerStyle>(style), reverse)(n, ground, s, d);
+      });
+}
+
+using LaneRows8 = LaneRows<ZR_Pixel8>;
+
+TEST_F(LaneRows8, Mattes) {
+  using P = ZR_Pixel8;
+  const P matte = {255, 1, 130, 254};
+  for (const zr::AlphaPlace place : {zr::AlphaPlace::first, zr::AlphaPlace::last}) {
+    compare("onto black", [&](i32 n, P* s, P*, P* d) { zr::matte_rows(place).onto_black(n, s, d); });
+    compare("onto black", [&](i32 n, P*, P*, P* d) { zr::matte_rows(place).onto_black(n, nullptr, d); });
+    compare("off black", [&](i32 n, P* s, P*, P* d) { zr::matte_rows(place).off_black(n, s, d); });
+    compare("off black", [&](i32 n, P*, P*, P* d) { zr::matte_rows(place).off_black(n, nullptr, d); });
+    compare("matte added", [&](i32 n, P*, P*, P* d) { zr::matte_rows(place).add_matte(n, matte, d); });
+    compare("matte taken", [&](i32 n, P*, P*, P* d) { zr::matte_rows(place).take_matte(n, matte, d); });
+  }
+}
+
+TEST_F(LaneRows8, Planes) {
+  using P = ZR_Pixel8;
+  for (u32 planes = 0; planes < 16; ++planes) {
+    // The packed rows end, or begin, at the edge too: whole pixels of them are looked at.
+    compare("planes out", [&](i32 n, P* s, P*, P* d) {
+      zr::plane_rows().extract(planes, n, s, reinterpret_cast<u8*>(d) + (4 - zr::plane_count(planes)) * n);
+    });
+    compare("planes in", [&](i32 n, P* s, P*, P* d) {
+      zr::plane_rows().insert(planes, n, reinterpret_cast<u8*>(s) + (4 - zr::plane_count(planes)) * n, d);
+    });
   }
 }
 

@@ -42,6 +42,7 @@ void add_row_operations(Operations& list);
 void add_transfer_operations(Operations& list);
 void add_sample_operations(Operations& list);
 void add_copy_operations(Operations& list);
+void add_drawing_operations(Operations& list);
 void add_transform_operations(Operations& list);
 
 // All of them, by name, then depth.

@@ -14,6 +14,7 @@ const Operations& all_operations() {
     add_transfer_operations(all);
     add_sample_operations(all);
     add_copy_operations(all);
+    add_drawing_operations(all);
     add_transform_operations(all);
     std::sort(all.begin(), all.end(), [](const Operation& a, const Operation& b) {
       return std::tie(a.name, a.depth) < std::tie(b.name, b.depth);
