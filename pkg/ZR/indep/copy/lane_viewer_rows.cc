@@ -67,19 +67,29 @@ HWY_INLINE void show(const Px<ViewerMath<T>>& p, const ViewerGround& of, const G
   const Ints kept = reverse ? before.blue : before.alpha;
   Shown out = {reverse ? kept : Ints(shown_white), shown(p.red, T{}), shown(p.green, T{}), shown(p.blue, T{})};
   if (!all(opaque)) {
-    Px<M> b = ground.first;
-    Shown bare = ground.bare_first;
+    constexpr bool shows_bare = style != ViewerStyle::tint;
+    const Bools<i32> clear = as_ints(p.alpha == Number<T>(0));
+    Bools<i32> odd = clear;
     if constexpr (style == ViewerStyle::checker) {
       const Ints x = hn::Iota(Tag<i32>(), static_cast<i32>(of.check_x + static_cast<u32>(i)));
-      const Bools<i32> odd = masked(hn::Xor(x.v, Ints(static_cast<i32>(of.check_y)).v), 8) == 0;
-      const Bools<typename Number<T>::Number> wide_odd = {hn::RebindMask(Tag<typename Number<T>::Number>(), odd.mask)};
-      b = pick(wide_odd, ground.second, b);
-      bare = pick(odd, ground.bare_second, bare);
+      odd = masked(hn::Xor(x.v, Ints(static_cast<i32>(of.check_y)).v), 8) == 0;
     }
-    const auto one = [&](Number<T> c, Number<T> g)
-                         HWY_ATTR { return shown(mixed<T, style>(c, p.alpha, g, ground.first.alpha), T{}); };
-    Shown mix = {kept, one(p.red, b.red), one(p.green, b.green), one(p.blue, b.blue)};
-    if constexpr (style != ViewerStyle::tint) mix = pick(as_ints(p.alpha == Number<T>(0)), bare, mix);
+    const auto bare = [&]() HWY_ATTR {
+      return style == ViewerStyle::checker ? pick(odd, ground.bare_second, ground.bare_first) : ground.bare_first;
+    };
+    Shown mix;
+    if (shows_bare && all(clear)) {
+      mix = bare();
+    } else {
+      Px<M> b = ground.first;
+      if constexpr (style == ViewerStyle::checker)
+        b = pick(Bools<typename Number<T>::Number>{hn::RebindMask(Tag<typename Number<T>::Number>(), odd.mask)},
+                 ground.second, b);
+      const auto one = [&](Number<T> c, Number<T> g)
+                           HWY_ATTR { return shown(mixed<T, style>(c, p.alpha, g, ground.first.alpha), T{}); };
+      mix = {kept, one(p.red, b.red), one(p.green, b.green), one(p.blue, b.blue)};
+      if (shows_bare && !none(clear)) mix = pick(clear, bare(), mix);
+    }
     out = pick(opaque, out, mix);
   }
   store(reverse ? Shown{out.blue, out.green, out.red, out.alpha} : out, dst);

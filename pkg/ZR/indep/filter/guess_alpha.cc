@@ -55,17 +55,19 @@ class AlphaScan {
  private:
   void pixel(const ZR_Pixel8& p) {
     if (p.alpha == 0) {
-      if (clear_ > 0 && (apart(p.red, last_clear_.red) >= 3 || apart(p.green, last_clear_.green) >= 3 ||
-                         apart(p.blue, last_clear_.blue) >= 3))
+      if (!clear_colours_vary_ && clear_ > 0 &&
+          (apart(p.red, last_clear_.red) >= 3 || apart(p.green, last_clear_.green) >= 3 ||
+           apart(p.blue, last_clear_.blue) >= 3))
         clear_colours_vary_ = true;
       count_clear(p, 1);
       last_clear_ = p;
     } else {
-      if (covered_ > 0 &&
+      if (!covered_colours_vary_ && covered_ > 0 &&
           (p.red != last_covered_.red || p.green != last_covered_.green || p.blue != last_covered_.blue))
         covered_colours_vary_ = true;
       if (covered_ == 0 || p.alpha < faintest_.alpha) faintest_ = p;
-      if (p.alpha < p.red || p.alpha < p.green || p.alpha < p.blue) colour_exceeds_alpha_ = true;
+      if (!colour_exceeds_alpha_ && (p.alpha < p.red || p.alpha < p.green || p.alpha < p.blue))
+        colour_exceeds_alpha_ = true;
       ++covered_;
       last_covered_ = p;
     }
