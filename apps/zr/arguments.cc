@@ -31,6 +31,7 @@ std::string exit_code_help() {
 
 constexpr HelpTopic kTopics[] = {
     {"scene", "the scene file", &scene_help},
+    {"effects", "what is done to the layers of a scene", &effects_help},
     {"exit-codes", "what the exit code says", &exit_code_help},
 };
 
@@ -51,6 +52,7 @@ class Parser {
         "Examples:\n"
         "  zr render examples/scenes/demo.json -o out/frame.####.png\n"
         "  zr sheet out/frame.*.png -o out/sheet.png\n"
+        "  zr blur photo.jpg -o soft.png --radius 6 --keep-edges\n"
         "  zr help render\n"
         "  zr list modes\n\n" +
         exit_code_help());

@@ -11,7 +11,7 @@ namespace {
 
 struct ConvolveOptions : PictureOptions {
   std::string kernel, channels;
-  bool normalise = true, clamp = true, straight = false;
+  bool normalised = false, unnormalised = false, unclamped = false, straight = false;
 };
 
 void convolve(const ConvolveOptions& options) {
@@ -21,8 +21,8 @@ void convolve(const ConvolveOptions& options) {
   } catch (const KernelError& error) {
     throw bad_input(std::string("convolve: --kernel ") + error.what());
   }
-  convolution.normalise = options.normalise;
-  convolution.clamp = options.clamp;
+  convolution.normalise = !options.unnormalised;
+  convolution.clamp = !options.unclamped;
   convolution.straight = options.straight;
   if (!options.channels.empty()) {
     convolution.channels = parse_channels(options.channels);
@@ -51,12 +51,10 @@ Run declare(CLI::App& verb) {
                   "What is convolved; the other channels stay (default: argb, or rgb where the taps sum to 0 or no "
                   "pixel is transparent)")
       ->type_name("LETTERS of argb");
-  verb.add_flag("--normalise,!--no-normalise", options->normalise,
-                "Divide by the sum of the taps, if it is not 0: the default; otherwise by 256 for each tap")
-      ->default_str("");
-  verb.add_flag("--clamp,!--no-clamp", options->clamp,
-                "Hold 8-bit sums to 0..255: the default; otherwise they wrap at 65536 first")
-      ->default_str("");
+  CLI::Option* const normalise = verb.add_flag("--normalise", options->normalised,
+                                               "Divide by the sum of the taps, by 1 if that is 0: the default");
+  verb.add_flag("--no-normalise", options->unnormalised, "Divide by 256 for each tap instead")->excludes(normalise);
+  verb.add_flag("--no-clamp", options->unclamped, "8-bit results wrap at 65536 before they are held to 0..255");
   verb.add_flag("--straight", options->straight, "Take colours as they stand, not weighted by alpha");
   verb.footer(
       "Examples:\n"

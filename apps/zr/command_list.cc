@@ -11,6 +11,7 @@
 #include "depths.h"
 #include "image_files.h"
 #include "mode_names.h"
+#include "scene_keys.h"
 #include "tool_host.h"
 
 namespace zr::tool {
@@ -40,6 +41,18 @@ void list_spaces() {
   for (const SpaceName& space : all_spaces()) std::puts(space.name);
 }
 
+void list_commands() {
+  for (const Command* command : all_commands()) std::printf("%-12s %s\n", command->name, command->summary);
+}
+
+void list_effects() {
+  for (const EffectKind& kind : kEffectKinds) {
+    std::string keys;
+    for (const SceneKey& key : kind.keys) keys += (keys.empty() ? "" : ", ") + std::string(key.name);
+    std::printf("%-12s %-27s %s\n", kind.name, kind.meaning, keys.c_str());
+  }
+}
+
 void list_cpu() {
   struct Word {
     int index;
@@ -54,33 +67,42 @@ void list_cpu() {
   std::printf("ZR_CPU   %s (scalar, sse4, avx2 or avx512 caps what is used)\n", cap != nullptr ? cap : "not set");
 }
 
+struct Subject {
+  const char* name;
+  void (*list)();
+};
+constexpr Subject kSubjects[] = {{"commands", &list_commands}, {"modes", &list_modes},   {"effects", &list_effects},
+                                 {"formats", &list_formats},   {"spaces", &list_spaces}, {"cpu", &list_cpu}};
+
 Run declare(CLI::App& verb) {
   const auto what = std::make_shared<std::string>();
+  std::vector<std::string> names;
+  std::string all;
+  for (const Subject& subject : kSubjects) {
+    names.emplace_back(subject.name);
+    all += (all.empty() ? "" : "|") + names.back();
+  }
   verb.add_option("what", *what, "What to list")
       ->required()
-      ->check(CLI::IsMember({"modes", "formats", "spaces", "cpu"}).description(""))
-      ->type_name("modes|formats|spaces|cpu");
+      ->check(CLI::IsMember(names).description(""))
+      ->type_name(all);
   verb.footer(
       "Examples:\n"
+      "  zr list commands   what zr can do\n"
       "  zr list modes      transfer modes by number and name, as scenes use them\n"
+      "  zr list effects    effects of a scene's layers and their keys; zr help effects tells more\n"
       "  zr list formats    picture files that are written and read\n"
       "  zr list spaces     colour spaces by name\n"
       "  zr list cpu        what the processor has and what the library sees");
   return [what] {
-    if (*what == "modes")
-      list_modes();
-    else if (*what == "formats")
-      list_formats();
-    else if (*what == "spaces")
-      list_spaces();
-    else
-      list_cpu();
+    for (const Subject& subject : kSubjects)
+      if (*what == subject.name) subject.list();
   };
 }
 
 }  // namespace
 
-const Command kListCommand = {"list", "List transfer modes, file formats, colour spaces or processor features",
-                              &declare};
+const Command kListCommand = {
+    "list", "List commands, transfer modes, effects, file formats, colour spaces or processor features", &declare};
 
 }  // namespace zr::tool

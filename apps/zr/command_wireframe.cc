@@ -17,7 +17,7 @@ namespace zr::tool {
 namespace {
 
 struct WireframeOptions : PictureOptions {
-  std::string colour = "#ff3b30", background = "none", step = "1";
+  std::string colour = "#00e5ff", background = "none", step = "1";
   bool alone = false, any_alpha = false;
 };
 

@@ -57,5 +57,7 @@ Scene parse_scene(const std::string& text, const std::string& file);
 
 // What each key means, its values and its default: the text of `zr help scene`.
 std::string scene_help();
+// The same of the effects of its layers: the text of `zr help effects`.
+std::string effects_help();
 
 }  // namespace zr::tool

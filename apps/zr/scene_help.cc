@@ -21,13 +21,6 @@ std::string section(const char* title, const Keys& keys) {
   return text;
 }
 
-std::string effect_sections() {
-  std::string text;
-  for (const EffectKind& kind : kEffectKinds)
-    text += section(("Effect \"" + std::string(kind.name) + "\": " + kind.meaning).c_str(), kind.keys);
-  return text;
-}
-
 }  // namespace
 
 std::string scene_help() {
@@ -45,15 +38,24 @@ std::string scene_help() {
              "                      { \"frame\": 48, \"value\": [700, 40] } ] } ] }\n") +
          section("The scene", kSceneKeys) + section("A layer", kLayerKeys) + section("A matte", kMatteKeys) +
          section("Placing a layer or a matte", kPlacementKeys) + section("Motion blur", kMotionBlurKeys) +
-         effect_sections() +
-         "\nAn effect is an object { \"effect\": name, ... } of the keys above. Example of a layer with a soft "
-         "shadow's "
-         "shape:\n"
-         "  { \"image\": \"media/logo.png\", \"effects\": [ { \"effect\": \"fill\", \"colour\": \"#000000\",\n"
-         "      \"keep_alpha\": true }, { \"effect\": \"blur\", \"radius\": 12 } ], \"opacity\": 0.6 }\n" +
          section("A keyframe, in a list of rising frames", kKeyframeKeys) +
          "\nA colour is [red, green, blue], [red, green, blue, alpha], each 0..1, \"#rrggbb\" or \"#rrggbbaa\".\n"
-         "An unknown key is an error.\n";
+         "An unknown key is an error. zr help effects tells of the effects.\n";
+}
+
+std::string effects_help() {
+  std::string text =
+      "Effects change the pixels of a scene's layer before it is placed, one after the other. Example:\n"
+      "\n"
+      "  { \"image\": \"media/logo.png\", \"position\": [12, 16], \"opacity\": 0.6,\n"
+      "    \"effects\": [ { \"effect\": \"fill\", \"colour\": \"#000000\", \"keep_alpha\": true },\n"
+      "                 { \"effect\": \"blur\", \"radius\": 12 } ] },\n"
+      "  { \"image\": \"media/logo.png\" }\n"
+      "\n"
+      "which is a logo above its soft shadow.\n";
+  for (const EffectKind& kind : kEffectKinds)
+    text += section(("\"effect\": \"" + std::string(kind.name) + "\", " + kind.meaning).c_str(), kind.keys);
+  return text + "\nA radius may have keyframes, see zr help scene. An unknown effect or key is an error.\n";
 }
 
 }  // namespace zr::tool

@@ -77,6 +77,7 @@ TEST_P(SceneMistake, IsToldWithItsPlace) {
   }
 }
 #define LAYER(text) "{\"size\":[8,8],\n \"layers\":[ {" text "} ]}"
+#define EFFECT(text) LAYER("\"colour\":\"#000000\", \"effects\": [{" text "}]")
 INSTANTIATE_TEST_SUITE_P(
     ByHand, SceneMistake,
     testing::Values(
@@ -150,11 +151,30 @@ INSTANTIATE_TEST_SUITE_P(
                 "layers[0].matte.scale is \"x\""},
         Mistake{"{\"size\":[8,8],\"layers\":[],\"field\":\"even\"}", "must be \"none\", \"upper\" or \"lower\""},
         Mistake{LAYER("\"colour\":\"#000000\", \"matte\": {}"), "layers[0].matte lacks \"image\""},
+        Mistake{EFFECT("\"effect\":\"blurr\""),
+                "layers[0].effects[0].effect is an unknown effect \"blurr\"; the nearest is \"blur\""},
+        Mistake{EFFECT("\"radius\":1"), "layers[0].effects[0] lacks \"effect\""},
+        Mistake{EFFECT("\"effect\":\"blur\""), "layers[0].effects[0] (blur) lacks \"radius\""},
+        Mistake{EFFECT("\"effect\":\"blur\",\"radius\":-1"), "effects[0].radius is -1; it must be a number 0 to 30000"},
+        Mistake{EFFECT("\"effect\":\"blur\",\"radius\":1,\"raduis\":2"),
+                "layers[0].effects[0] (blur) has an unknown key \"raduis\"; the nearest is \"radius\""},
+        Mistake{EFFECT("\"effect\":\"blur\",\"radius\":1,\"iterations\":2"), "iterations is for the shape \"box\""},
+        Mistake{EFFECT("\"effect\":\"blur\",\"radius\":1,\"channels\":\"argbb\""),
+                "channels is \"argbb\"; it must be one to"},
+        Mistake{EFFECT("\"effect\":\"blur\",\"radius\":1,\"keep_edges\":true,\"grow\":true"), "beside \"keep_edges\""},
+        Mistake{EFFECT("\"effect\":\"convolve\",\"kernel\":\"1 1\""), "layers[0].effects[0].kernel is 2 x 1"},
+        Mistake{EFFECT("\"effect\":\"convolve\",\"kernel\":[[1],[1,1]]"), "kernel has 2 numbers in row 2"},
+        Mistake{EFFECT("\"effect\":\"convolve\",\"kernel\":[[0.5]]"), "kernel[0][0] is 0.5; it must be a whole number"},
+        Mistake{EFFECT("\"effect\":\"lut\""), "layers[0].effects[0] (lut) has no curve"},
+        Mistake{EFFECT("\"effect\":\"lut\",\"rgb\":[1]"), "must be a list of 2 to 256 numbers"},
+        Mistake{EFFECT("\"effect\":\"fill\",\"colour\":\"red\""), "effects[0].colour is \"red\""},
+        Mistake{EFFECT("\"effect\":\"premultiply\",\"direction\":\"on\""), "must be \"forward\" or \"back\""},
         Mistake{LAYER("\"colour\":\"#000000\", \"matte\": {\"image\":\"a\",\"kind\":\"lumma\"}"),
                 "layers[0].matte.kind is \"lumma\""},
         // Places count characters, not bytes, and texts that hold quotes and brackets do not lead astray.
         Mistake{LAYER("\"name\":\"\xC3\xA4\xC3\xB6 ]}\\\"{\", \"colour\":\"#000000\", \"seed\": 0.5"),
                 "s.json:2:61: layers[0].seed is 0.5"}));
+#undef EFFECT
 #undef LAYER
 
 TEST(SceneHelp, NamesEveryKeyThatIsAccepted) {
