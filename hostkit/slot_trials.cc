@@ -219,8 +219,9 @@ void each_depth(Work work) {
 
 template <bool premul>
 void try_copy(ZR_SlotFunc routine, Outcome& out) {
-  const auto copy = reinterpret_cast<i32 (*)(const ZR_ProgressInfo*, ZR_LayerDef*, ZR_LayerDef*, const GX_LRect*,
-                                             const GX_LRect*)>(routine);
+  const auto copy =
+      reinterpret_cast<i32 (*)(const ZR_ProgressInfo*, ZR_LayerDef*, ZR_LayerDef*, const GX_LRect*, const GX_LRect*)>(
+          routine);
   const GX_LRect part{2, 1, 13, 9}, large{0, 0, 19, 13}, small{3, 2, 9, 6};
   const auto at_depth = [&]<class T>() {
     for (const GX_LRect* to : {&part, &large, &small}) {
@@ -249,9 +250,8 @@ void try_premul_rect(ZR_SlotFunc routine, Outcome& out) {
 }
 
 void try_look_up(ZR_SlotFunc routine, Outcome& out) {
-  const auto run =
-      reinterpret_cast<i32 (*)(ZR_InData*, i32, i32, ZR_LayerDef*, const GX_LRect*, const u8*, const u8*, const u8*,
-                               const u8*, ZR_LayerDef*)>(routine);
+  const auto run = reinterpret_cast<i32 (*)(ZR_InData*, i32, i32, ZR_LayerDef*, const GX_LRect*, const u8*, const u8*,
+                                            const u8*, const u8*, ZR_LayerDef*)>(routine);
   u8 table[256];
   for (i32 i = 0; i < 256; ++i) table[i] = static_cast<u8>(255 - i / 2);
   const GX_LRect part{2, 1, 13, 9};
@@ -264,15 +264,16 @@ struct Trial {
   ZR_SlotIndex slot;
   SlotTrial* run;
 };
-#define ZR_ROW_TRIALS(suffix)                                                                        \
-  {ZR_Slot_premul_row##suffix, try_row<Pixel##suffix>}, {ZR_Slot_unmul_row##suffix, try_row<Pixel##suffix>},           \
-      {ZR_Slot_white_fade_row##suffix, try_row<Pixel##suffix>},                                      \
-      {ZR_Slot_white_unfade_row##suffix, try_row<Pixel##suffix>},                                    \
-      {ZR_Slot_grey_fade_row##suffix, try_row<Pixel##suffix>},                                       \
-      {ZR_Slot_grey_unfade_row##suffix, try_row<Pixel##suffix>},                                     \
-      {ZR_Slot_union_alpha_row##suffix, try_union<Pixel##suffix>},                                   \
-      {ZR_Slot_inner_blend##suffix, try_modes<Pixel##suffix, false>},                                \
-      {ZR_Slot_inner_blend_mask##suffix, try_modes<Pixel##suffix, true>}
+#define ZR_ROW_TRIALS(suffix)                                                                                \
+  {ZR_Slot_premul_row##suffix, try_row<Pixel##suffix>}, {ZR_Slot_unmul_row##suffix, try_row<Pixel##suffix>}, \
+      {ZR_Slot_white_fade_row##suffix, try_row<Pixel##suffix>},                                              \
+      {ZR_Slot_white_unfade_row##suffix, try_row<Pixel##suffix>},                                            \
+      {ZR_Slot_grey_fade_row##suffix, try_row<Pixel##suffix>},                                               \
+      {ZR_Slot_grey_unfade_row##suffix, try_row<Pixel##suffix>},                                             \
+      {ZR_Slot_union_alpha_row##suffix, try_union<Pixel##suffix>},                                           \
+      {ZR_Slot_inner_blend##suffix, try_modes<Pixel##suffix, false>}, {                                      \
+    ZR_Slot_inner_blend_mask##suffix, try_modes<Pixel##suffix, true>                                         \
+  }
 using Pixel8 = ZR_Pixel8;
 using Pixel16 = ZR_Pixel16;
 using PixelFloat = ZR_PixelFloat;

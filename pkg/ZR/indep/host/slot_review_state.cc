@@ -51,8 +51,8 @@ void review_slots(const char* routine, const ZR_SlotFunc (&before)[ZR_SlotCount]
       const char* const name = ZR_GetSlotName(slot);
       JRN_Log(30, "ZR", "Modules",
               (std::string("slot ") + std::to_string(slot) + " (" + (name != nullptr ? name : "without a name") +
-               ") of " + routine + " does not do what the routine before it does: " +
-               (wanted == Policy::strict ? "put back" : "kept"))
+               ") of " + routine +
+               " does not do what the routine before it does: " + (wanted == Policy::strict ? "put back" : "kept"))
                   .c_str());
     }
     G_found.push_back({routine, slot, verdict});
