@@ -127,6 +127,22 @@ void add_world_operations(Operations& list) {
     world->InvertAlpha();
     world.digest(digest);
   });
+  add_all(list, "stores-in-bands", []<class T>(Digest& digest) {  // large enough for several bands
+    using Other = std::conditional_t<std::is_same_v<T, ZR_Pixel16>, ZR_Pixel8, ZR_Pixel16>;
+    Picture<T> world(701, 400, Content::mixed, 13);
+    Picture<Other> converted(701, 400, Content::untouched);
+    world->InvertAlpha();
+    converted->CopyRectPossiblyDifferentBitdepth(&world, world.all(), false, 0, 0, nullptr);
+    world.digest(digest);
+    converted.digest(digest);
+    const T colour = half_orange<T>();
+    const GX_LRect part{3, 5, 690, 390};
+    digest.number(pick<T>(&ZR_Fill, &ZR_Fill16, &ZR_FillFloat)(nullptr, &colour, &part, &world));
+    world->FillAlpha();
+    world.digest(digest);
+    world->Clear(&part);
+    world.digest(digest);
+  });
   add_all(list, "copy", []<class T>(Digest& digest) {
     Picture<T> src(odd_width, 25, Content::mixed, 2), dst(odd_width, 25, Content::noise, 3);
     for (const GX_LRect& rect : kRects) dst->CopyRect(&src, rect, rect.top, rect.left);
