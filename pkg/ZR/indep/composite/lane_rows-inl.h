@@ -56,6 +56,15 @@ struct Source {
   }
 };
 
+// A count that fills whole vectors.
+template <i32 count, class T>
+HWY_INLINE void copy_pixels(const T* src, T* dst) {
+  const Tag<u8> d;
+  const auto* from = reinterpret_cast<const u8*>(src);
+  auto* to = reinterpret_cast<u8*>(dst);
+  for (std::size_t i = 0; i < count * sizeof(T); i += hn::Lanes(d)) hn::StoreU(hn::LoadU(d, from + i), d, to + i);
+}
+
 // The pixels of one vector; false when a channel is illegal, and then nothing is written. mask may be null.
 template <class Mode, class T>
 HWY_INLINE bool blend_lanes(Source<typename Lanes<Mode, T>::Math> source, bool keep_alpha, const T* src, const T* mask,
@@ -69,6 +78,10 @@ HWY_INLINE bool blend_lanes(Source<typename Lanes<Mode, T>::Math> source, bool k
   const Wide A = scales_source<Mode> ? s.alpha : covered(s.alpha);
   const auto clear = A == 0;
   if (passes_clear<Mode> && all(clear)) return true;
+  if (std::is_same_v<Mode, InFront> && all(A == M::white)) {  // what lies below is not looked at
+    copy_pixels<Pack::pixels>(src, dst);
+    return true;
+  }
   const Px<M> d = Pack::template load<M>(dst);
   if (!legal(d)) return false;
   Px<M> out = blend_in_row<Mode>(s, A, d);

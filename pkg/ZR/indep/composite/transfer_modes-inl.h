@@ -14,22 +14,13 @@
 #define ZR_COMPOSITE_TRANSFER_MODES_INL_H
 #endif
 
-#include <ZR/transfer_mode.h>
-
 #include <tuple>
 
-#include "composite/mode_colour-inl.h"
-#include "composite/mode_row.h"
+#include "composite/colour_modes-inl.h"
+#include "composite/mode_entry-inl.h"
 #include "simd/formulas.h"
 
 ZR_BEGIN_FORMULAS
-
-template <ZR_TransferMode Number, ModeKind Kind, RowClass Class = usual_row_class(Kind)>
-struct Mode {
-  static constexpr ZR_TransferMode number = Number;
-  static constexpr ModeKind kind = Kind;
-  static constexpr RowClass row_class = Class;
-};
 
 // ------------------------------------------------------------------------------ whole pixels
 
@@ -408,89 +399,6 @@ struct Divide : Mode<XferDivide, ModeKind::weighted> {
   template <class M>
   static ZR_PURE auto full(auto s, auto d) {
     return M::quotient(d, s);
-  }
-};
-
-// ------------------------------------------------------------------------------ whole colours
-
-// recoloured: the new colour from the source's and that of the destination behind which the source has
-// been composited.
-
-struct Hue : Mode<XferHue, ModeKind::colour> {
-  template <class M>
-  static ZR_PURE Px<M> recoloured(const Px<M>& s, const Px<M>& d) {
-    return with_luma(with_saturation(s, saturation_of(d)), luma_of(d));
-  }
-};
-
-struct Saturation : Mode<XferSaturation, ModeKind::colour> {
-  template <class M>
-  static ZR_PURE Px<M> recoloured(const Px<M>& s, const Px<M>& d) {
-    return with_luma(with_saturation(d, saturation_of(s)), luma_of(d));
-  }
-};
-
-struct Color : Mode<XferColor, ModeKind::colour> {
-  template <class M>
-  static ZR_PURE Px<M> recoloured(const Px<M>& s, const Px<M>& d) {
-    return with_luma(s, luma_of(d));
-  }
-};
-
-struct Luminosity : Mode<XferLuminosity, ModeKind::colour> {
-  template <class M>
-  static ZR_PURE Px<M> recoloured(const Px<M>& s, const Px<M>& d) {
-    return with_luma(d, luma_of(s));
-  }
-};
-
-// wanted: whether the pixel is recoloured at all, by the lumas of source and destination.
-
-struct LighterColor : Mode<XferLighterColor, ModeKind::colour> {
-  static ZR_PURE auto wanted(auto source_luma, auto luma) { return source_luma > luma; }
-  template <class M>
-  static ZR_PURE Px<M> recoloured(const Px<M>& s, const Px<M>&) {
-    return s;
-  }
-};
-
-struct DarkerColor : Mode<XferDarkerColor, ModeKind::colour> {
-  static ZR_PURE auto wanted(auto source_luma, auto luma) { return source_luma < luma; }
-  template <class M>
-  static ZR_PURE Px<M> recoloured(const Px<M>& s, const Px<M>&) {
-    return s;
-  }
-};
-
-// ------------------------------------------------------------------------------ alpha only
-
-// alpha: the new alpha of the destination from its own (D), the source's colour and A.
-
-struct MultiplyAlpha : Mode<XferMultiplyAlpha, ModeKind::alpha_only> {
-  template <class M>
-  static ZR_PURE auto alpha(const Px<M>&, auto A, auto D) {
-    return M::mul(D, A);
-  }
-};
-
-struct MultiplyAlphaLuma : Mode<XferMultiplyAlphaLuma, ModeKind::alpha_only> {
-  template <class M>
-  static ZR_PURE auto alpha(const Px<M>& s, auto A, auto D) {
-    return M::luma_alpha(M::mul(D, M::mul(luma_of(s), A)));
-  }
-};
-
-struct MultiplyNotAlpha : Mode<XferMultiplyNotAlpha, ModeKind::alpha_only> {
-  template <class M>
-  static ZR_PURE auto alpha(const Px<M>&, auto A, auto D) {
-    return M::mul(D, M::inv(A));
-  }
-};
-
-struct MultiplyNotAlphaLuma : Mode<XferMultiplyNotAlphaLuma, ModeKind::alpha_only> {
-  template <class M>
-  static ZR_PURE auto alpha(const Px<M>& s, auto A, auto D) {
-    return M::luma_alpha(M::mul(D, M::inv(M::mul(luma_of(s), A))));
   }
 };
 
