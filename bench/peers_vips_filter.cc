@@ -1,5 +1,5 @@
-// libvips' filters on four-band pictures from memory, on one thread. Boxes are its approximate separable convolution,
-// which is exact for a box and takes running sums.
+// libvips' filters on four-band pictures from memory, on one thread. Boxes are separable convolutions:
+// its approximate one, of running sums, gives black pictures for masks of one height.
 #include <vips/vips.h>
 
 #include "filters.h"
@@ -49,11 +49,12 @@ const bool registered = [] {
   for (const Size size : sizes)
     each_depth([&]<class T>() {
       for (const Blur* blur : {&box_10, &box_100})
-        add_blur_peer<T>(*blur, "vips-convasep", size, [=](auto& src, auto& dst) {
+        add_blur_peer<T>(*blur, "vips-convsep", size, [=](auto& src, auto& dst) {
           const int side = 2 * static_cast<int>(blur->radius) + 1;
           VipsImage* const mask = mask_of(side, 1, std::vector<i32>(static_cast<size_t>(side), 1));
           evaluate<T>(src, mask, dst, [](VipsImage* from, VipsImage* box, VipsImage** made) {
-            return vips_convasep(from, made, box, nullptr);
+            return vips_convsep(from, made, box, "precision",
+                                sizeof(T) == 16 ? VIPS_PRECISION_FLOAT : VIPS_PRECISION_INTEGER, nullptr);
           });
         });
       add_blur_peer<T>(gaussian_10, "vips-convsep", size, [](auto& src, auto& dst) {

@@ -15,9 +15,11 @@
 //            thrown, and lines done by then stay.
 // Failure    throws an i32: ZR_Err_OutOfMemory; ZR_Err_Internal, reported, for depths that differ or are unknown, a
 //            radius that is negative or NaN or beyond the range below, and 0 iterations.
-// Exactness  8-bit sums are exact and must fit 32 bits: a box may hold 8192 pixels of a line at once (any radius up
-//            to 524287 on lines that short), a bell may have a radius of 32000. 16-bit and float sums are single
-//            precision in the order of the line, the same bits on every processor and number of threads.
+// Exactness  8-bit sums are exact. They have 32 bits: for a box, 261120 times the pixels of a line (in a later
+//            iteration, of the part that it passes on) that the box holds at once, plus 1024 times the radius, must
+//            stay below 2^31, which any radius up to 4000 does; beyond, ZR_Err_Internal. A bell reaches 32000.
+//            16-bit and float sums are single precision in the order of the line, the same bits on every processor
+//            and number of threads; the alpha of floats, blurred alone by boxes, is summed in double precision.
 #pragma once
 
 #include <ZR/filter.h>
@@ -34,7 +36,7 @@ enum : u32 {
 
 // A box of 2 * radius + 1 pixels, the outermost of which weigh less where the radius is not whole; applied
 // `iterations` times (1 or more), each time widening what is read by ceil(radius). Time does not depend on the
-// radius. `vertical` runs along columns. Radii up to 524287 at 8 bits, 16777216 otherwise.
+// radius. `vertical` runs along columns. Radii up to 1048575.
 ZR_API void ZR_BoxBlur1D(const ZR_ProgressInfo* progress, const ZR_World* src, f32 radius, u32 iterations, u32 flags,
                          bool src_vertical, bool src_premultiplied, bool dst_vertical, bool dst_premultiplied,
                          bool force_copy, ZR_World* dst);

@@ -34,9 +34,11 @@ enum {
  * divisor stays. Channels are filtered as they are: premultiplied pixels for what bears alpha. Results are kept to
  * 0..255 and 0..32768; float results to nothing.
  *
- * size      odd; a kernel has size * size taps, or size, row after row. At most 32767.
- * kernels   any i32, each may be the same array; read only during the call. Integer sums are exact: they cannot
- *           leave 64 bits. Float sums are single precision, taps row by row.
+ * size      odd; a kernel has size * size taps, or size, row after row. At most 65535.
+ * kernels   any i32, each may be the same array; read only during the call. Integer sums are exact, in 64 bits, and
+ *           3 is returned for kernels of which a sum could leave them: taps whose absolute values sum to more than
+ *           2^63 / 65535 (2^63 / 255 for 8 bits). Float products are single precision, summed in double precision row
+ *           by row, and the quotient of sum and divisor is single.
  * rect      not read: all of dst is filled, src lies at its top left corner. One depth; not one world.
  * Polls     progress->progress alone, with (rows done, rows), after a row when more than 2048 taps were worked on
  *           since the last; its answer other than 0 ends the call and is returned. Rows done stay.

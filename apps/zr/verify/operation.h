@@ -44,6 +44,7 @@ void add_sample_operations(Operations& list);
 void add_copy_operations(Operations& list);
 void add_drawing_operations(Operations& list);
 void add_transform_operations(Operations& list);
+void add_filter_operations(Operations& list);
 
 // All of them, by name, then depth.
 const Operations& all_operations();

@@ -16,6 +16,7 @@ const Operations& all_operations() {
     add_copy_operations(all);
     add_drawing_operations(all);
     add_transform_operations(all);
+    add_filter_operations(all);
     std::sort(all.begin(), all.end(), [](const Operation& a, const Operation& b) {
       return std::tie(a.name, a.depth) < std::tie(b.name, b.depth);
     });

@@ -114,7 +114,7 @@ class BoxPass {
     return high;
   }
   void place(i64 position, const T** pixels, i64* step) const {
-    alignas(64) static constexpr T outside[256 / sizeof(T)] = {};
+    alignas(64) static constexpr T outside[most_strip_lines] = {};
     *pixels = in_.has(position) ? in_.at(position) : outside;
     *step = in_.has(position) ? in_.step : 0;
   }

@@ -5,6 +5,8 @@
 #define HWY_TARGET_INCLUDE "filter/lane_box_rows.cc"
 #include <hwy/foreach_target.h>
 
+#include <hwy/cache_control.h>
+
 #include "simd/lanes-inl.h"
 #if ZR_HAS_LANES
 #include "filter/lane_pixels-inl.h"
@@ -75,6 +77,8 @@ void add(i32 pixels, i64 count, const T* from, i64 step, void* sums) {
   }
 }
 
+constexpr i64 rows_ahead = 4;
+
 template <class T, bool straight, bool edged>
 HWY_INLINE void run_form(const BoxRun<T>& run) {
   using Number = BoxSum<T>;
@@ -86,7 +90,11 @@ HWY_INLINE void run_form(const BoxRun<T>& run) {
   const T *leaving = run.leaving, *first = run.first, *entering = run.entering;
   T* out = run.out;
   const i32 channels = 4 * run.pixels;
+  // Columns jump from memory page to page, where no processor looks ahead by itself.
+  const i64 row_bytes = run.pixels * static_cast<i64>(sizeof(T)), ahead = run.entering_step * rows_ahead;
   for (i64 k = 0; k < run.count; ++k) {
+    if (k + rows_ahead < run.count)
+      for (i64 b = 0; b < row_bytes; b += 64) hwy::Prefetch(reinterpret_cast<const char*>(entering + ahead) + b);
     for (i32 c = 0; c < channels; c += lane_count()) {
       const L next = channels_at<Number>(entering, c);
       L sum = hn::LoadU(Tag<Number>(), all + c);

@@ -13,6 +13,7 @@
 #include <atomic>
 #include <cstring>
 
+#include "filter/turn_pixels.h"
 #include "world/guard.h"
 #include "world/premul_rows.h"
 
@@ -20,6 +21,7 @@ namespace zr {
 
 // Vectors of every depth hold up to this many pixels: strips are filtered in whole groups of them.
 inline constexpr i32 strip_group = 8;
+inline constexpr i32 most_strip_lines = 64;
 
 template <class T>
 struct Strip {
@@ -79,8 +81,8 @@ struct LineJob {
   }
   // Lines of a strip. Strips of columns are wide, to make use of memory pages; rows have to pass a corner turn.
   i32 strip_lines() const {
-    const i32 lines = (src.vertical && dst.vertical ? 256 : 64) / static_cast<i32>(sizeof(T));
-    return std::max(lines, strip_group);
+    if (src.vertical && dst.vertical) return most_strip_lines;
+    return std::max(64 / static_cast<i32>(sizeof(T)), strip_group);
   }
   // Whether strips of so many lines are read where they lie.
   bool reads_in_place(i32 lines) const {
@@ -95,13 +97,6 @@ struct LineJob {
 inline i32 padded_lines(i32 lines) { return (lines + strip_group - 1) / strip_group * strip_group; }
 
 // -------------------------------------------------------------------------------- to and from strips
-
-// rows[l * across] are lines; strip position by position, `width` pixels each.
-template <class T>
-void turn_into_strip(const Lines<T>& lines, i64 first_line, i32 count, i64 low, i64 high, i32 width, T* strip) {
-  for (i64 p = low; p < high; ++p)
-    for (i32 l = 0; l < count; ++l) strip[(p - low) * width + l] = *lines.at(p, first_line + l);
-}
 
 // The source between two positions, premultiplied where the call asks for it. Lines that fill up a group are zero.
 template <class T>
@@ -121,7 +116,8 @@ Strip<T> copied_strip(const LineJob<T>& job, i64 src_line, i32 lines, i32 width,
         std::memcpy(out, row, static_cast<std::size_t>(lines) * sizeof(T));
     }
   } else {
-    turn_into_strip(job.src, src_line, lines, low, high, width, memory);
+    turn_pixels(job.src.at(low, src_line), job.src.across, lines, high - low, memory,
+                width * static_cast<i64>(sizeof(T)));
     if (job.call.premultiply) {
       constexpr i64 at_once = 1 << 16;
       const i64 pixels = (high - low) * width;
@@ -157,10 +153,8 @@ void emit_strip(const LineJob<T>& job, i64 dst_line, i32 lines, i32 width, i64 l
     for (i64 p = 0; p < high - low; ++p)
       std::memcpy(job.dst.at(first + p, dst_line), strip + p * width, static_cast<std::size_t>(lines) * sizeof(T));
   } else {
-    for (i32 l = 0; l < lines; ++l) {
-      T* const row = job.dst.at(first, dst_line + l);
-      for (i64 p = 0; p < high - low; ++p) row[p] = strip[p * width + l];
-    }
+    turn_pixels<T>(strip, width * static_cast<i64>(sizeof(T)), high - low, lines, job.dst.at(first, dst_line),
+                   job.dst.across);
   }
 }
 
