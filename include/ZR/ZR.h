@@ -9,7 +9,10 @@
 #include <ZR/depth.h>
 #include <ZR/errors.h>
 #include <ZR/guid.h>
+#include <ZR/lazy_tiles.h>
 #include <ZR/linear_tables.h>
+#include <ZR/mask_alpha.h>
+#include <ZR/mask_buffer.h>
 #include <ZR/module.h>
 #include <ZR/platform.h>
 #include <ZR/prisma.h>

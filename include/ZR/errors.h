@@ -59,7 +59,18 @@ enum ZR_CallSite : u32 {
   ZR_Site_TransformWorld = 0x88,
   ZR_Site_Blur = 0x89,
   ZR_Site_WorldSuite = 0x98,
-  ZR_Site_UnknownDepth = 0x3e7,
+  ZR_Site_MaskNew = 0xb0,
+  ZR_Site_MaskDispose = 0xb1,
+  ZR_Site_MaskFill = 0xb2,
+  ZR_Site_MaskFade = 0xb3,
+  ZR_Site_MaskMerge = 0xb4,
+  ZR_Site_MaskAccumulate = 0xb5,
+  ZR_Site_MaskAccumulateInto = 0xb6,
+  ZR_Site_MaskTransfer = 0xb7,
+  ZR_Site_MaskConvert = 0xb8,
+  ZR_Site_MaskConvertInto = 0xb9,
+  ZR_Site_MaskBlur = 0xba,
+  ZR_Site_LazyTiles = 0xbb,
   ZR_Site_GuessAlpha = 0x90,
   ZR_Site_MatteRow = 0x91,
   ZR_Site_MatteColour = 0x92,
@@ -67,6 +78,7 @@ enum ZR_CallSite : u32 {
   ZR_Site_PaintSpot = 0x94,
   ZR_Site_Wireframe = 0x95,
   ZR_Site_Planes = 0x96,
+  ZR_Site_UnknownDepth = 0x3e7,
 };
 
 // Indices of the library's own texts.

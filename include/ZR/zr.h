@@ -252,6 +252,7 @@ ZR_API i32 transform_world_adapter(const ZR_ProgressInfo* progress, i32 quality,
 #include <ZR/copy_bits.h>
 #include <ZR/drawing.h>
 #include <ZR/filter.h>
+#include <ZR/mask_buffer.h>
 #include <ZR/pixel_measures.h>
 #include <ZR/sample.h>
 #include <ZR/transform_world.h>
