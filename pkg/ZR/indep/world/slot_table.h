@@ -64,6 +64,18 @@ using IterateGenericFunc = i32(i32 iterations, void* refcon, ZR_GenericFunc);
 using PremulRectFunc = i32(const ZR_ProgressInfo*, i32 forward, const GX_LRect*, ZR_LayerDef*);
 using OpenDestinationFunc = i32(void* first, void* record);  // a record of 32 bytes
 using ModuleOwnFunc = i32(void*, void*);                     // called by nobody here
+// Combines n values of a mask with those under it; dst may be `under`.
+template <class S, class D>
+using UnoModeRowFunc = i32(i32 n, i32 mode, const S* src, const D* under, D* dst);
+using UnoModeRow8 = UnoModeRowFunc<u8, u8>;
+using UnoModeRow16To8 = UnoModeRowFunc<u16, u8>;
+using UnoModeRow16 = UnoModeRowFunc<u16, u16>;
+using UnoModeRow8To16 = UnoModeRowFunc<u8, u16>;
+template <class C>
+using UnoFadeRowFunc = i32(i32 n, i32 factor, C* row);
+using UnoConvertRowFunc = i32(i32 n, i32 divisor, const u16* src, u8* dst);
+template <class C>
+using UnoScanFunc = i32(i32 flags, i32 radius, i32 first, i32 last, i32 length, const C* src, C* dst);
 template <class T>
 using RowFunc = i32(i32 n, const T* src, T* dst);
 template <class T>
@@ -126,6 +138,19 @@ ZR_SLOT(bilinear_span16, SampleSpanFunc<ZR_Pixel16>)
 ZR_SLOT(bilinear_no_clip8_x4, SampleFourFunc)
 ZR_SLOT(bilinear_translate_no_clip8_x4, SampleFourTranslateFunc)
 ZR_SLOT(sample_compute_weight, SampleWeightFunc)
+ZR_SLOT(box_blur_uno_scan, UnoScanFunc<u8>)
+ZR_SLOT(box_blur_deep_uno_scan, UnoScanFunc<u16>)
+ZR_SLOT(uno_row55, UnoScanFunc<u8>)
+ZR_SLOT(uno_row93, UnoScanFunc<u16>)
+ZR_SLOT(uno_row56, UnoModeRow8)
+ZR_SLOT(uno_row62, UnoModeRow16To8)
+ZR_SLOT(uno_row81, UnoModeRow16)
+ZR_SLOT(uno_row82, UnoModeRow8To16)
+ZR_SLOT(uno_row85, UnoFadeRowFunc<u8>)
+ZR_SLOT(uno_row88, UnoFadeRowFunc<u16>)
+ZR_SLOT(uno_row89, UnoFadeRowFunc<u8>)
+ZR_SLOT(uno_row113, UnoFadeRowFunc<u16>)
+ZR_SLOT(uno_row114, UnoConvertRowFunc)
 ZR_SLOT(transform_row8, TransformRowsFunc<ZR_Pixel8>)
 ZR_SLOT(transform_row16, TransformRowsFunc<ZR_Pixel16>)
 ZR_SLOT(transform_rowFloat, TransformRowsFunc<ZR_PixelFloat>)
