@@ -14,21 +14,6 @@
 namespace zr {
 namespace {
 
-// ------------------------------------------------------------------------------ rows in bands
-
-// Runs body(y) for y in 0..rows-1 through the generic iterator. The band with row 0 asks for abort before it starts.
-template <class Body>
-i32 rows_with_abort(const ZR_ProgressInfo* progress, i32 rows, i64 row_bytes, const Body& body) {
-  return for_bands(rows, row_bytes, band_of_work, [&](i32 top, i32 bottom) -> i32 {
-    if (top == 0 && progress != nullptr && progress->abort != nullptr) {
-      const i32 stop = progress->abort(progress->refcon);
-      if (stop != 0) return stop;
-    }
-    for (i32 y = top; y < bottom; ++y) body(y);
-    return ZR_Err_None;
-  });
-}
-
 // `rect` (null: everything) cut to width x height; false when nothing is left.
 bool clip(const GX_LRect* rect, i32 width, i32 height, GX_LRect* out) {
   *out = {0, 0, width, height};
@@ -69,15 +54,15 @@ i32 premul_colour_rows(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const 
   const auto source = [&](i32 y) { return from.At(area.left, area.top + y); };
   const auto target = [&](i32 y) { return to.At(area.left, area.top + y); };
   if (forward)
-    return rows_with_abort(progress, rows, row_bytes,
+    return for_rows(progress, rows, row_bytes,
                            [&](i32 y) { matte_row<T, true>(width, matte, source(y), target(y)); });
   // Taking black away is the plain division, which makes colours under alpha 0 white.
   if (is_black(matte)) {
     RowFunc<T>* const row = plain_row<T>(false);
     if (row == nullptr) return empty_row_slot();
-    return rows_with_abort(progress, rows, row_bytes, [&](i32 y) { row(width, source(y), target(y)); });
+    return for_rows(progress, rows, row_bytes, [&](i32 y) { row(width, source(y), target(y)); });
   }
-  return rows_with_abort(progress, rows, row_bytes,
+  return for_rows(progress, rows, row_bytes,
                          [&](i32 y) { matte_row<T, false>(width, matte, source(y), target(y)); });
 }
 
@@ -117,7 +102,7 @@ i32 ZR_PremulRect_S(const ZR_ProgressInfo* progress, i32 forward, const GX_LRect
       if (row == nullptr) return zr::empty_row_slot();
       const ZR_WorldX<T> world(dst, false);
       const i32 width = area.right - area.left;
-      return zr::rows_with_abort(progress, area.bottom - area.top,
+      return zr::for_rows(progress, area.bottom - area.top,
                                  static_cast<i64>(width) * static_cast<i64>(sizeof(T)),
                                  [&](i32 y) { row(width, nullptr, world.At(area.left, area.top + y)); });
     });

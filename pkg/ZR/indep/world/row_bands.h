@@ -21,18 +21,32 @@ inline i32 rows_in_band(i32 rows, i64 row_bytes, i64 band_bytes) {
 // Calls body(top, bottom), which gives 0 or an error, for bands of rows 0 to rows - 1 through the generic iterator;
 // a non-zero answer is returned, and bands not yet begun stay undone.
 template <class Body>
-i32 for_bands(i32 rows, i64 row_bytes, i64 band_bytes, const Body& body) {
+i32 for_bands(i32 rows, i64 row_bytes, i64 band_bytes, const Body& body,
+              decltype(&ZR_IterateGeneric) iterate = &ZR_IterateGeneric) {
   if (rows < 1) return 0;
   struct Job {
     const Body* body;
     i32 rows, band_rows;
   };
   Job job = {&body, rows, rows_in_band(rows, row_bytes, band_bytes)};
-  return ZR_IterateGeneric((rows - 1) / job.band_rows + 1, &job, [](void* refcon, i32, i32 band, i32) -> i32 {
+  return iterate((rows - 1) / job.band_rows + 1, &job, [](void* refcon, i32, i32 band, i32) -> i32 {
     const Job& work = *static_cast<const Job*>(refcon);
     const i32 top = band * work.band_rows;
     return (*work.body)(top, top + std::min(work.band_rows, work.rows - top));
   });
+}
+
+// Calls body(y), which cannot fail, for rows 0 to rows - 1. The band with row 0 asks progress->abort before it starts.
+template <class Body>
+i32 for_rows(const ZR_ProgressInfo* progress, i32 rows, i64 row_bytes, const Body& body,
+             decltype(&ZR_IterateGeneric) iterate = &ZR_IterateGeneric) {
+  const auto band = [&](i32 top, i32 bottom) -> i32 {
+    if (top == 0 && progress != nullptr && progress->abort != nullptr)
+      if (const i32 stop = progress->abort(progress->refcon); stop != 0) return stop;
+    for (i32 y = top; y < bottom; ++y) body(y);
+    return ZR_Err_None;
+  };
+  return for_bands(rows, row_bytes, band_of_work, band, iterate);
 }
 
 // Calls body(top, bottom), which cannot fail, for bands of rows `top` to `bottom` - 1 of stores or moves; throws what
