@@ -98,7 +98,7 @@ ZR_API i32 ZR_ConvertDeepUnoBuffer(const ZR_ProgressInfo* progress, const ZR_Uno
  * times under ZR_UnoScan_Wide; results are those of ZR_BoxBlur1D and ZR_GaussianBlur1D on alpha, within rounding,
  * and what lies outside a line counts as 0. A box costs the same for every radius.
  * Returns 0; ZR_Err_Internal for null lines and a negative radius; ZR_Err_OutOfMemory. Any number of threads. The
- * taps of the latest bell are kept until another radius comes; radius 0 keeps none. */
+ * taps of the latest bell are kept until another radius comes; small ones (to 2.71) keep none. */
 enum { ZR_UnoScan_Plain = 0, ZR_UnoScan_Wide = 1 };
 ZR_API i32 ZR_BoxBlurUnoScan(i32 flags, i32 radius, i32 first, i32 last, i32 length, const u8* src, u8* dst);
 ZR_API i32 ZR_BoxBlurDeepUnoScan(i32 flags, i32 radius, i32 first, i32 last, i32 length, const u16* src, u16* dst);

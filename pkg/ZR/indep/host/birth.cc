@@ -18,6 +18,7 @@
 #include "host/accel_modules_state.h"
 #include "host/life_state.h"
 #include "host/slot_defaults.h"
+#include "mask/scan_weights_state.h"
 #include "world/constants_state.h"
 #include "world/dither_state.h"
 #include "world/guard.h"
@@ -109,6 +110,11 @@ i32 bind_colour_engine() {
 
 i32 free_colour_settings() { return free_emergency_settings(); }
 
+i32 free_mask_taps() {
+  free_bell_taps();
+  return ZR_Err_None;
+}
+
 i32 let_colour_engine_go() {
   TON_PRISMA_Unbind();
   return ZR_Err_None;
@@ -144,6 +150,7 @@ constexpr Step death_steps[] = {
     {"multiply tables", give_multiply_tables_back},
     {"modules", unload_modules},
     {"scratch", give_scratch_back},
+    {"mask taps", free_mask_taps},
     {"colour settings", free_colour_settings},
     {"colour engine", let_colour_engine_go},
     {"registries", clear_registries},

@@ -69,6 +69,7 @@ void fill_default_slots() {
   set_slot<ZR_Slot_premul_rect>(&ZR_PremulRect_S);
   set_slot<ZR_Slot_iterate_generic>(&ZR_IterateGeneric_Static);
   fill_sampler_slots();
+  fill_mask_slots();
   fill_slots_of_depth<ZR_Pixel8>();
   fill_slots_of_depth<ZR_Pixel16>();
   fill_slots_of_depth<ZR_PixelFloat>();

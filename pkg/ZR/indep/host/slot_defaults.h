@@ -7,5 +7,7 @@ namespace zr {
 void fill_default_slots();
 // Those of the samplers; called by fill_default_slots.
 void fill_sampler_slots();
+// Those of mask buffers; the same.
+void fill_mask_slots();
 
 }  // namespace zr
