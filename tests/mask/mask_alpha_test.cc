@@ -1,0 +1,134 @@
+// Masks merged into the alpha of worlds, and alphas pulled toward a value.
+#include <ZR/mask_alpha.h>
+#include <ZR/world.h>
+
+#include "mask/masks.h"
+#include "support/worlds.h"
+
+namespace {
+
+constexpr i32 width = 41, height = 29;
+
+template <class T, class C>
+zr::Channel<T> product(zr::Channel<T> alpha, C m) {
+  using A = zr::Channel<T>;
+  using P = Plain<A>;
+  A value;
+  if constexpr (std::is_same_v<A, C>)
+    value = m;
+  else if constexpr (sizeof(A) == 4)
+    value = static_cast<f32>(m) * (sizeof(C) == 1 ? 0.003921569f : 0x1p-15f);
+  else if constexpr (sizeof(A) == 2)
+    value = zr::widen_8_to_16(m);
+  else
+    value = zr::narrow_16_to_8(m);
+  return static_cast<A>(P::mul(alpha, value));
+}
+
+struct MergeCase {
+  const char* name;
+  i32 x, y;
+  GX_LRect clip;  // none where it is empty
+  GX_LRect area;  // the same
+};
+constexpr MergeCase merges[] = {
+    {"over all", -3, -2, {}, {}},
+    {"inside", 7, 5, {}, {}},
+    {"of an area", -2, 4, {}, {5, 3, 30, 17}},
+    {"clipped", 4, 3, {2, 1, 9, 7}, {}},
+    {"of an area beyond the world", 4, 3, {-9, -9, 90, 90}, {-10, -10, 100, 100}},
+    {"that do not meet", 90, 0, {}, {2, 2, 20, 20}},
+    {"clipped away", 0, 0, {200, 0, 210, 10}, {}},
+    {"far off", INT32_MAX, INT32_MIN, {}, {}},
+};
+
+using MaskAlpha = BornLibrary;
+
+TEST_F(MaskAlpha, IsTheStatedStepsForEveryPairOfDepths) {
+  const auto run = [&]<class T, class C>() {
+    const Mask<C> mask(50, 19, 5);
+    for (const MergeCase& one : merges) {
+      TestWorld<T> world(width, height);
+      world.randomise(8);
+      TestWorld<T> result = world;
+      const bool clips = one.clip.right > 0, part = one.area.right > 0;
+      const auto inside = [&](i32 x, i32 y) {
+        return !part || (x >= one.area.left && x < one.area.right && y >= one.area.top && y < one.area.bottom);
+      };
+      bool any = false;
+      for (const bool second : {false, true})
+        for (i32 y = 0; y < height; ++y)
+          for (i32 x = 0; x < width; ++x) {
+            const i64 mx = i64{x} - one.x, my = i64{y} - one.y;
+            bool counts = mx >= 0 && mx < mask.width && my >= 0 && my < mask.height;
+            if (clips)
+              counts =
+                  counts && mx >= one.clip.left && mx < one.clip.right && my >= one.clip.top && my < one.clip.bottom;
+            if (!inside(x, y)) continue;
+            any = any || counts;
+            if (!second) continue;
+            if (!any) result.at(x, y) = T{};
+            auto& alpha = result.at(x, y).alpha;
+            alpha = counts ? product<T>(alpha, mask.at(static_cast<i32>(mx), static_cast<i32>(my))) : zr::Channel<T>{0};
+          }
+      ZR_WorldX<T> typed(world.layer(), false);
+      ZR_MergeMaskAlpha(nullptr, one.x, one.y, clips ? &one.clip : nullptr, &mask, part ? &one.area : nullptr, &typed);
+      EXPECT_EQ(world, result) << one.name << ", " << depth_of<C> << " onto " << typed.GetBitDepth();
+      EXPECT_TRUE(world.guards_intact());
+    }
+  };
+  const auto onto = [&]<class T>() { run.template operator()<T, u8>(), run.template operator()<T, u16>(); };
+  onto.operator()<ZR_Pixel8>();
+  onto.operator()<ZR_Pixel16>();
+  onto.operator()<ZR_PixelFloat>();
+}
+
+TEST_F(MaskAlpha, ThrowsWhatStopsIt) {
+  TestWorld<ZR_Pixel8> world(width, height);
+  world.randomise(2);
+  const TestWorld<ZR_Pixel8> before = world;
+  ZR_WorldX<ZR_Pixel8> typed(world.layer(), false);
+  const Mask<u8> mask(50, 50, 1);
+  const Mask<f32> real(50, 50, 1);
+  const ZR_ProgressInfo stop = {nullptr, [](void*) -> i32 { return 31; }, nullptr};
+  const auto thrown = [&](const ZR_ProgressInfo* progress, const ZR_UnoBuffer* of, ZR_World* into) {
+    try {
+      ZR_MergeMaskAlpha(progress, 0, 0, nullptr, of, nullptr, into);
+    } catch (const i32 error) {
+      return error;
+    }
+    return 0;
+  };
+  EXPECT_EQ(thrown(&stop, &mask, &typed), 31);
+  EXPECT_EQ(thrown(nullptr, &real, &typed), 3);
+  EXPECT_EQ(caught.take_verification(), "Unexpected bitdepth in ZRp_MergeMaskAlphaScanIter()");
+  EXPECT_EQ(thrown(nullptr, &mask, nullptr), 3);
+  EXPECT_EQ(world, before);
+}
+
+// Every alpha and mask of 8 bits; the product rounds the same way up and down.
+TEST(BlendSingleChannel, PullsAlphaTowardTheTarget) {
+  for (const i32 target : {0, 100, 255})
+    for (const i32 opacity : {255, 128, 0})
+      for (i32 a = 0; a < 256; ++a)
+        for (i32 m = 0; m < 256; ++m) {
+          ZR_Pixel8 pixel = {static_cast<u8>(a), 1, 2, 3};
+          const u8 mask = static_cast<u8>(m);
+          ZR_BlendSingleChannel<ZR_Pixel8, u8>(1, static_cast<u8>(opacity), static_cast<u8>(target), &mask, &pixel);
+          const i64 t = Plain<u8>::mul(m, opacity), way = std::abs(target - a);
+          const i64 result = target < a ? a - Plain<u8>::mul(way, t) : a + Plain<u8>::mul(way, t);
+          ASSERT_EQ(pixel.alpha, result) << a << " to " << target << " by " << m << " and " << opacity;
+          ASSERT_EQ(pixel.red * 100 + pixel.green * 10 + pixel.blue, 123);
+        }
+  ZR_Pixel16 deep[] = {{20000, 1, 2, 3}, {100, 4, 5, 6}};
+  const u16 masks[] = {16384, 32768};
+  ZR_BlendSingleChannel<ZR_Pixel16, u16>(2, 32768, 10001, masks, deep);
+  EXPECT_EQ(deep[0].alpha, 20000 + ((-9999 * 16384 - 1 + 16383) >> 15));
+  EXPECT_EQ(deep[1].alpha, 10001);
+  ZR_PixelFloat real = {0.25f, 1, 2, 3};
+  const f32 half = 0.5f;
+  ZR_BlendSingleChannel<ZR_PixelFloat, f32>(1, 0.5f, 1.0f, &half, &real);
+  EXPECT_EQ(real.alpha, 0.25f + 0.75f * 0.25f);
+}
+
+}  // namespace
