@@ -21,9 +21,7 @@ constexpr Place places[] = {
     {"at the ends of numbers", {INT32_MIN, INT32_MIN, INT32_MAX, INT32_MAX}, {INT32_MIN + 3, INT32_MIN + 2}},
     {"far off", {0, 0, 5, 5}, {INT32_MAX, INT32_MIN}},
 };
-constexpr struct {
-  f32 opacity, ceiling;
-} scales[] = {{1, 1}, {0.5f, 1}, {1, 0.25f}, {0.3f, 0.7f}, {0, 1}, {1, 0}};
+constexpr struct { f32 opacity, ceiling; } scales[] = {{1, 1}, {0.5f, 1}, {1, 0.25f}, {0.3f, 0.7f}, {0, 1}, {1, 0}};
 
 template <class To, class From>
 auto at_depth(From v) {

@@ -54,16 +54,14 @@ i32 premul_colour_rows(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const 
   const auto source = [&](i32 y) { return from.At(area.left, area.top + y); };
   const auto target = [&](i32 y) { return to.At(area.left, area.top + y); };
   if (forward)
-    return for_rows(progress, rows, row_bytes,
-                           [&](i32 y) { matte_row<T, true>(width, matte, source(y), target(y)); });
+    return for_rows(progress, rows, row_bytes, [&](i32 y) { matte_row<T, true>(width, matte, source(y), target(y)); });
   // Taking black away is the plain division, which makes colours under alpha 0 white.
   if (is_black(matte)) {
     RowFunc<T>* const row = plain_row<T>(false);
     if (row == nullptr) return empty_row_slot();
     return for_rows(progress, rows, row_bytes, [&](i32 y) { row(width, source(y), target(y)); });
   }
-  return for_rows(progress, rows, row_bytes,
-                         [&](i32 y) { matte_row<T, false>(width, matte, source(y), target(y)); });
+  return for_rows(progress, rows, row_bytes, [&](i32 y) { matte_row<T, false>(width, matte, source(y), target(y)); });
 }
 
 template <class Colour>
@@ -102,9 +100,8 @@ i32 ZR_PremulRect_S(const ZR_ProgressInfo* progress, i32 forward, const GX_LRect
       if (row == nullptr) return zr::empty_row_slot();
       const ZR_WorldX<T> world(dst, false);
       const i32 width = area.right - area.left;
-      return zr::for_rows(progress, area.bottom - area.top,
-                                 static_cast<i64>(width) * static_cast<i64>(sizeof(T)),
-                                 [&](i32 y) { row(width, nullptr, world.At(area.left, area.top + y)); });
+      return zr::for_rows(progress, area.bottom - area.top, static_cast<i64>(width) * static_cast<i64>(sizeof(T)),
+                          [&](i32 y) { row(width, nullptr, world.At(area.left, area.top + y)); });
     });
   });
 }

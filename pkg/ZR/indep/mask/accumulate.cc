@@ -2,7 +2,7 @@
 #include <algorithm>
 #include <cmath>
 
-#include "iterate/row_bands.h"
+#include "world/row_bands.h"
 #include "mask/mask_rows.h"
 #include "world/slot_table.h"
 

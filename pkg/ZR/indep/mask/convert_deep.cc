@@ -1,7 +1,7 @@
 // Deep mask buffers brought down to other depths by a divisor.
 #include <algorithm>
 
-#include "iterate/row_bands.h"
+#include "world/row_bands.h"
 #include "mask/convert_rows.h"
 #include "mask/mask_values.h"
 #include "world/slot_table.h"

@@ -1,5 +1,5 @@
 // Inverting and fading mask buffers.
-#include "iterate/row_bands.h"
+#include "world/row_bands.h"
 #include "mask/mask_rows.h"
 #include "world/slot_table.h"
 

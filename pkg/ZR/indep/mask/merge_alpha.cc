@@ -4,7 +4,7 @@
 
 #include <algorithm>
 
-#include "iterate/row_bands.h"
+#include "world/row_bands.h"
 #include "mask/mask_rows.h"
 
 namespace zr {
