@@ -72,7 +72,7 @@ TYPED_TEST_SUITE(Blurs, Depths);
 
 TYPED_TEST(Blurs, EqualTheModelInEveryForm) {
   constexpr u32 flag_words[] = {15, 31, 1, 17, 14, 30, 5, 22, 0};
-  constexpr f32 radii[] = {0, 0.5f, 1, 2.3f, 7, 11.75f, 40};
+  constexpr f32 radii[] = {0, 0.5f, 2.3f, 7, 40};
   for (int level = 0; level < 4 && Instructions::has(level); ++level) {
     const Instructions instructions(level);
     u32 turn = 0;
@@ -99,7 +99,7 @@ TYPED_TEST(Blurs, EqualTheModelOnLargerWorlds) {
     u32 seed = 0;
     for (const u32 iterations : {0u, 1u, 3u})
       for (const u32 form : {0u, 1u, 2u, 3u})
-        for (const f32 radius : {10.0f, 10.6f, 90.0f}) {
+        for (const f32 radius : {10.6f, 90.0f}) {
           const BlurCase c = {radius, iterations, 15, (form & 1) != 0, true, (form & 1) != 0, (form & 2) != 0, false};
           this->check({153, 141, {0, 0}}, c, {153, 141, {0, 0}}, ++seed);
           if (this->HasFatalFailure()) return;
