@@ -17,14 +17,14 @@ OIIO::ImageBuf picture_of(ZR_WorldX<T>& world) {
 }
 
 OIIO::ImageBuf mask_of(int width, int height, const std::vector<i32>& taps) {
-  OIIO::ImageSpec spec(width, height, 1, OIIO::TypeDesc::FLOAT);
-  spec.x = -(width / 2);
-  spec.y = -(height / 2);
-  spec.full_x = spec.x, spec.full_y = spec.y, spec.full_width = width, spec.full_height = height;
-  OIIO::ImageBuf mask(spec);
+  OIIO::ImageSpec layout(width, height, 1, OIIO::TypeDesc::FLOAT);
+  layout.x = -(width / 2);
+  layout.y = -(height / 2);
+  layout.full_x = layout.x, layout.full_y = layout.y, layout.full_width = width, layout.full_height = height;
+  OIIO::ImageBuf mask(layout);
   for (int i = 0; i < width * height; ++i) {
     const float tap = static_cast<float>(taps[static_cast<size_t>(i)]);
-    mask.setpixel(spec.x + i % width, spec.y + i / width, &tap, 1);
+    mask.setpixel(layout.x + i % width, layout.y + i / width, &tap, 1);
   }
   return mask;
 }
