@@ -10,7 +10,7 @@ namespace zr::tool {
 namespace {
 
 struct ConvolveOptions : PictureOptions {
-  std::string kernel, channels;
+  std::string kernel, channels = "auto";
   bool normalised = false, unnormalised = false, unclamped = false, straight = false;
 };
 
@@ -24,10 +24,10 @@ void convolve(const ConvolveOptions& options) {
   convolution.normalise = !options.unnormalised;
   convolution.clamp = !options.unclamped;
   convolution.straight = options.straight;
-  if (!options.channels.empty()) {
+  if (options.channels != "auto") {
     convolution.channels = parse_channels(options.channels);
     if (!convolution.channels)
-      throw bad_input("convolve: --channels is \"" + options.channels + "\"; it must be " + kChannelsExpected);
+      throw bad_input("convolve: --channels is \"" + options.channels + "\"; it must be auto or " + kChannelsExpected);
   }
   PictureTask task;
   task.extra_bytes = [&](const ImageInfo& info, i32 depth) {
@@ -47,10 +47,11 @@ Run declare(CLI::App& verb) {
                   "Rows of whole numbers with ; between them: a square, one row or one column, odd on each side")
       ->required()
       ->type_name("\"TAPS; TAPS\"");
-  verb.add_option("--channels", options->channels,
-                  "What is convolved; the other channels stay (default: argb, or rgb where the taps sum to 0 or no "
-                  "pixel is transparent)")
-      ->type_name("LETTERS of argb");
+  verb.add_option(
+          "--channels", options->channels,
+          "What is convolved, the others stay; auto is argb, or rgb if the taps sum to 0 or no pixel is transparent")
+      ->type_name("auto|LETTERS of argb")
+      ->capture_default_str();
   CLI::Option* const normalise = verb.add_flag("--normalise", options->normalised,
                                                "Divide by the sum of the taps, by 1 if that is 0: the default");
   verb.add_flag("--no-normalise", options->unnormalised, "Divide by 256 for each tap instead")->excludes(normalise);

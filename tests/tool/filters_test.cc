@@ -126,7 +126,7 @@ TEST_F(Filters, KernelsAreAppliedAsTheyStand) {
   } rows[] = {
       {"--kernel '0 0 1'", {50, 90, 0, 60, 100, 0, 70, 110, 0}},  // not mirrored
       {"--kernel '1;0;0'", {0, 0, 0, 10, 50, 90, 20, 60, 100}},
-      {"--kernel '1 2 1;2 4 2,;1 2 1;'", {17, 38, 43, 30, 60, 65, 23, 43, 48}},
+      {"--kernel '1 2 1;2 4 2,;1 2 1;'", {15, 40, 45, 25, 60, 65, 22, 50, 52}},
       {"--kernel '-1 0 1'", {50, 80, 0, 60, 80, 0, 70, 80, 0}},  // no alpha is taken from a sum of 0
       {"--kernel '3' --no-normalise --channels g", {0, 0, 1, 0, 0, 1, 0, 0, 1}},
       {"--kernel '999' --no-normalise --channels g", {39, 195, 255, 78, 234, 255, 117, 255, 255}},
@@ -137,7 +137,8 @@ TEST_F(Filters, KernelsAreAppliedAsTheyStand) {
   }
   EXPECT_THAT(read("out.png", 'r'), ElementsAre(10, 50, 90, 20, 60, 100, 30, 70, 110)) << "the other channels stay";
   write("edge.png", 3, {{255, 200, 0, 0}, {0, 0, 255, 0}, {0, 0, 255, 0}});
-  EXPECT_THAT(after("convolve edge.png --kernel '1 1 1'", 'r'), ElementsAre(200, 200, 0));
+  EXPECT_THAT(after("convolve edge.png --kernel '1 1 1'", 'r'), ElementsAre(198, 198, 0))
+      << "66 of 255, divided by alpha 85";
   EXPECT_THAT(after("convolve edge.png --kernel '1 1 1' --straight", 'g'), ElementsAre(85, 170, 170));
 }
 
@@ -192,8 +193,12 @@ TEST_F(Filters, MattesAreGuessedAndTakenAway) {
        {"black.png", "white.png", "blue.png", "blue.png --colour '#1428e6'", "marked.tif", "blue.png --depth 16"}) {
     const std::vector<int> red = after("unmatte " + call, 'r'), alpha = read("out.png", 'a');
     for (size_t i = 0; i < red.size(); ++i) {
-      if (alpha[i] == 0) EXPECT_EQ(red[i], 0) << call;
-      if (alpha[i] >= 60) EXPECT_NEAR(red[i], 210 + static_cast<int>(i % 3), 4) << call << " pixel " << i;
+      if (alpha[i] == 0) {
+        EXPECT_EQ(red[i], 0) << call;
+      }
+      if (alpha[i] >= 60) {
+        EXPECT_NEAR(red[i], 210 + static_cast<int>(i % 3), 4) << call << " pixel " << i;
+      }
     }
   }
   EXPECT_EQ(after("unmatte straight.png", 'r'), read("straight.png", 'r'));
