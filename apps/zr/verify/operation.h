@@ -45,6 +45,7 @@ void add_copy_operations(Operations& list);
 void add_drawing_operations(Operations& list);
 void add_transform_operations(Operations& list);
 void add_filter_operations(Operations& list);
+void add_mask_operations(Operations& list);
 
 // All of them, by name, then depth.
 const Operations& all_operations();

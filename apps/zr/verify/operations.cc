@@ -17,6 +17,7 @@ const Operations& all_operations() {
     add_drawing_operations(all);
     add_transform_operations(all);
     add_filter_operations(all);
+    add_mask_operations(all);
     std::sort(all.begin(), all.end(), [](const Operation& a, const Operation& b) {
       return std::tie(a.name, a.depth) < std::tie(b.name, b.depth);
     });
