@@ -27,21 +27,17 @@ class ZR_API ZR_LazyOperator {
   void DoIt(GX_Rect rect) { DoItImp(rect); }
 };
 
-namespace zr {
-
 // Which tiles are done.
-class ZR_API TileMap {
+class ZR_API ZR_LazyTileMap {
  public:
-  TileMap(i16 tile_size, GX_Vector2T<i16> extent);
-  // Runs the operation on the tiles under the rectangle that are not done, joined along rows.
-  void make_valid(i32 left, i32 top, i32 right, i32 bottom, GX_Vector2T<i16> extent, ZR_LazyOperator& work);
+  ZR_LazyTileMap(i16 tile_size, GX_Vector2T<i16> extent);
+  // Runs `work` on the tiles under the rectangle that are not done, joined along rows.
+  void MakeValid(i32 left, i32 top, i32 right, i32 bottom, GX_Vector2T<i16> extent, ZR_LazyOperator& work);
 
  private:
   i16 tile_size_, columns_, rows_;
   std::vector<std::vector<bool>> valid_;  // by rows
 };
-
-}  // namespace zr
 
 class ZR_API ZR_LazyTiles {
  public:
@@ -56,7 +52,7 @@ class ZR_API ZR_LazyTiles {
 
  private:
   boost::scoped_ptr<ZR_LazyOperator> operator_;
-  zr::TileMap tiles_;
+  ZR_LazyTileMap tiles_;
   GX_Vector2T<i16> offset_ = {0, 0};
 };
 
@@ -70,7 +66,7 @@ class ZR_API ZR_LazyTilesCondition {
 
  private:
   boost::scoped_ptr<ZR_LazyOperator> operator_;
-  zr::TileMap tiles_;
+  ZR_LazyTileMap tiles_;
   bool condition_;
 };
 

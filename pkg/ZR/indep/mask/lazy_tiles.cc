@@ -22,14 +22,16 @@ GX_Vector2T<i16> take(boost::scoped_ptr<ZR_LazyOperator>* from, boost::scoped_pt
 }
 
 }  // namespace
+}  // namespace zr
 
-TileMap::TileMap(i16 tile_size, GX_Vector2T<i16> extent)
+ZR_LazyTileMap::ZR_LazyTileMap(i16 tile_size, GX_Vector2T<i16> extent)
     : tile_size_(tile_size),
-      columns_(tiles_in(extent.x, tile_size)),
-      rows_(tiles_in(extent.y, tile_size)),
+      columns_(zr::tiles_in(extent.x, tile_size)),
+      rows_(zr::tiles_in(extent.y, tile_size)),
       valid_(static_cast<std::size_t>(rows_), std::vector<bool>(static_cast<std::size_t>(columns_))) {}
 
-void TileMap::make_valid(i32 left, i32 top, i32 right, i32 bottom, GX_Vector2T<i16> extent, ZR_LazyOperator& work) {
+void ZR_LazyTileMap::MakeValid(i32 left, i32 top, i32 right, i32 bottom, GX_Vector2T<i16> extent,
+                               ZR_LazyOperator& work) {
   // An operator whose extent has grown since has no tiles there.
   const i32 size = tile_size_, width = std::min<i32>(extent.x, columns_ * size),
             height = std::min<i32>(extent.y, rows_ * size);
@@ -55,16 +57,14 @@ void TileMap::make_valid(i32 left, i32 top, i32 right, i32 bottom, GX_Vector2T<i
   }
 }
 
-}  // namespace zr
-
 ZR_LazyTiles::ZR_LazyTiles(i16 tile_size, boost::scoped_ptr<ZR_LazyOperator>* work)
     : tiles_(tile_size, zr::take(work, &operator_)) {}
 
 void ZR_LazyTiles::MakeValid(const GX_Rect& rect) {
   const auto moved = [](i16 edge, i16 by) { return static_cast<i16>(edge + by); };
   const GX_Vector2T<i16> extent = operator_->GetExtent();
-  tiles_.make_valid(moved(rect.left, offset_.x), moved(rect.top, offset_.y), moved(rect.right, offset_.x),
-                    moved(rect.bottom, offset_.y), extent, *operator_);
+  tiles_.MakeValid(moved(rect.left, offset_.x), moved(rect.top, offset_.y), moved(rect.right, offset_.x),
+                   moved(rect.bottom, offset_.y), extent, *operator_);
 }
 
 ZR_LazyTilesCondition::ZR_LazyTilesCondition(i16 tile_size, boost::scoped_ptr<ZR_LazyOperator>* work, bool condition)
@@ -74,8 +74,8 @@ void ZR_LazyTilesCondition::ConditionalMakeValid(const GX_Rect& rect) {
   if (!condition_) return;
   // Asked twice, and the lesser answer counts: kept for operators whose target shrinks meanwhile.
   const GX_Vector2T<i16> one = operator_->GetExtent(), other = operator_->GetExtent();
-  tiles_.make_valid(rect.left, rect.top, rect.right, rect.bottom, {std::min(one.x, other.x), std::min(one.y, other.y)},
-                    *operator_);
+  tiles_.MakeValid(rect.left, rect.top, rect.right, rect.bottom, {std::min(one.x, other.x), std::min(one.y, other.y)},
+                   *operator_);
 }
 
 GX_Vector2T<i16> ZR_LazyWorldCopyOperator::GetExtent() const {

@@ -52,27 +52,39 @@ void dithered_values(i32 n, const u16* noise, const C* src, const C* under, C* d
     for (i32 i = 0; i < n; ++i) dst[i] = dithered<MaskMath<C>>(src[i], under[i], static_cast<C>(noise[i]));
 }
 
-// Ceilings and factors beyond the depth's values are legal here.
+// Ceilings and factors beyond the depth's values are legal here, and their sums wrap like their products.
+i32 wide_fold(i32 t) { return wrap_add(wrap_add(t, wrap_add(t, 128) >> 8), 128) >> 8; }
+template <class C>
+C wide_mul(Factor<C> v, Factor<C> factor) {
+  if constexpr (std::is_same_v<C, u8>)
+    return static_cast<u8>(wide_fold(wrap_mul(v, factor)));
+  else
+    return static_cast<C>(MaskDepth<C>::mul(v, factor));
+}
+
 template <class C>
 void rise_values(i32 n, Factor<C> ceiling, const C* src, const C* under, C* dst) {
-  using D = MaskDepth<C>;
   for (i32 i = 0; i < n; ++i) {
     const Factor<C> d = under[i];
-    if constexpr (std::is_same_v<C, f32>)
-      dst[i] = d < ceiling ? d + D::smul(src[i], ceiling - d) : d;
-    else
-      dst[i] = static_cast<C>(d < ceiling ? wrap_add(d, D::smul(src[i], wrap_sub(ceiling, d))) : d);
+    if (!(d < ceiling)) {
+      dst[i] = under[i];
+    } else if constexpr (std::is_same_v<C, f32>) {
+      dst[i] = d + src[i] * (ceiling - d);
+    } else {
+      const i32 product = wrap_mul(src[i], wrap_sub(ceiling, d));
+      dst[i] = static_cast<C>(d + (std::is_same_v<C, u8> ? wide_fold(product) : product >> 15));
+    }
   }
 }
 
 template <class C>
 void fade_values(i32 n, Factor<C> factor, C* row) {
-  for (i32 i = 0; i < n; ++i) row[i] = static_cast<C>(MaskDepth<C>::mul(row[i], factor));
+  for (i32 i = 0; i < n; ++i) row[i] = wide_mul<C>(row[i], factor);
 }
 
 template <class C>
 void invert_values(i32 n, Factor<C> factor, C* row) {
-  for (i32 i = 0; i < n; ++i) row[i] = static_cast<C>(MaskDepth<C>::mul(MaskMath<C>::inv(row[i]), factor));
+  for (i32 i = 0; i < n; ++i) row[i] = wide_mul<C>(MaskMath<C>::inv(row[i]), factor);
 }
 
 template <class C>
