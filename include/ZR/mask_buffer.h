@@ -95,11 +95,12 @@ ZR_API i32 ZR_ConvertDeepUnoBuffer(const ZR_ProgressInfo* progress, const ZR_Uno
 
 /* One line of a blur of masks: `length` values from src to dst, which do not overlap, of which first..last (both
  * included, cut to the line) are made. Gathering columns into lines is the caller's. radius is 16.16 and counts 1.4
- * times under ZR_UnoScan_Wide; results are those of ZR_BoxBlur1D and ZR_GaussianBlur1D on alpha, within rounding,
- * and what lies outside a line counts as 0. A box costs the same for every radius.
- * Returns 0; ZR_Err_Internal for null lines and a negative radius; ZR_Err_OutOfMemory. Any number of threads. The
- * taps of the latest bell are kept until another radius comes; small ones (to 2.71) keep none. */
-enum { ZR_UnoScan_Plain = 0, ZR_UnoScan_Wide = 1 };
+ * times under ZR_UnoScan_Wide (the low byte of flags is the caller's own, such as a direction); results are those of
+ * ZR_BoxBlur1D and ZR_GaussianBlur1D on alpha, within rounding, and what lies outside a line counts as 0. A box costs
+ * the same for every radius. Returns 0; ZR_Err_Internal for null lines and a negative radius; ZR_Err_OutOfMemory. Any
+ * number of threads. The taps of the latest bell are kept until another radius comes; small ones (to 2.71) keep none.
+ */
+enum { ZR_UnoScan_Plain = 0, ZR_UnoScan_Wide = 0x100 };
 ZR_API i32 ZR_BoxBlurUnoScan(i32 flags, i32 radius, i32 first, i32 last, i32 length, const u8* src, u8* dst);
 ZR_API i32 ZR_BoxBlurDeepUnoScan(i32 flags, i32 radius, i32 first, i32 last, i32 length, const u16* src, u16* dst);
 ZR_API i32 ZR_GBlurUnoScan(i32 flags, i32 radius, i32 first, i32 last, i32 length, const u8* src, u8* dst);

@@ -9,22 +9,6 @@ namespace {
 
 constexpr i32 width = 41, height = 29;
 
-template <class T, class C>
-zr::Channel<T> product(zr::Channel<T> alpha, C m) {
-  using A = zr::Channel<T>;
-  using P = Plain<A>;
-  A value;
-  if constexpr (std::is_same_v<A, C>)
-    value = m;
-  else if constexpr (sizeof(A) == 4)
-    value = static_cast<f32>(m) * (sizeof(C) == 1 ? 0.003921569f : 0x1p-15f);
-  else if constexpr (sizeof(A) == 2)
-    value = zr::widen_8_to_16(m);
-  else
-    value = zr::narrow_16_to_8(m);
-  return static_cast<A>(P::mul(alpha, value));
-}
-
 struct MergeCase {
   const char* name;
   i32 x, y;
@@ -69,7 +53,12 @@ TEST_F(MaskAlpha, IsTheStatedStepsForEveryPairOfDepths) {
             if (!second) continue;
             if (!any) result.at(x, y) = T{};
             auto& alpha = result.at(x, y).alpha;
-            alpha = counts ? product<T>(alpha, mask.at(static_cast<i32>(mx), static_cast<i32>(my))) : zr::Channel<T>{0};
+            using A = zr::Channel<T>;
+            if (counts)
+              alpha = static_cast<A>(
+                  Plain<A>::mul(alpha, at_depth<A>(mask.at(static_cast<i32>(mx), static_cast<i32>(my)))));
+            else
+              alpha = 0;
           }
       ZR_WorldX<T> typed(world.layer(), false);
       ZR_MergeMaskAlpha(nullptr, one.x, one.y, clips ? &one.clip : nullptr, &mask, part ? &one.area : nullptr, &typed);

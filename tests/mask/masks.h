@@ -34,6 +34,18 @@ struct Mask : ZR_UnoBuffer {
   std::vector<C> all() const { return {values(), values() + width * height}; }
 };
 
+template <class To, class From>
+To at_depth(From v) {
+  if constexpr (sizeof(To) == sizeof(From))
+    return v;
+  else if constexpr (sizeof(To) == 1)
+    return zr::narrow_16_to_8(v);
+  else if constexpr (sizeof(To) == 2)
+    return zr::widen_8_to_16(v);
+  else
+    return static_cast<f32>(v) * (sizeof(From) == 1 ? 0.003921569f : 0x1p-15f);
+}
+
 // Products and sums in numbers that hold them whole.
 template <class C>
 struct Plain {

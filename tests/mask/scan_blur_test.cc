@@ -1,8 +1,5 @@
-// Scan blurs of masks against blurs of worlds, and against the sums written down plainly.
+// Scan blurs of masks against blurs of worlds, which have a plain model of their own.
 #include <ZR/blur.h>
-#include <ZR/filter.h>
-
-#include <cmath>
 
 #include "mask/masks.h"
 
@@ -13,21 +10,6 @@ constexpr i32 lengths[] = {1, 2, 7, 64, 300, 1111};
 
 template <class C>
 using Scan = i32 (*)(i32, i32, i32, i32, i32, const C*, C*);
-
-// The mean of a line around one position under the weights of a box or a bell, what is outside being 0.
-template <class C>
-f64 mean_at(bool bell, f64 radius, const std::vector<C>& line, i32 at) {
-  const i32 reach = static_cast<i32>(std::ceil(radius));
-  f64 sum = 0, total = 0;
-  for (i32 k = -reach; k <= reach; ++k) {
-    f64 weight = std::abs(k) == reach && reach > 0 ? 1 - (reach - radius) : 1;
-    if (bell) weight = k == 0 ? 255 : std::floor(ZRp_GaussianValue(std::abs(k) / (1 + radius)) * 255);
-    total += weight;
-    const i32 i = at + k;
-    if (i >= 0 && i < static_cast<i32>(line.size())) sum += weight * line[static_cast<size_t>(i)];
-  }
-  return sum / total;
-}
 
 // Alpha of a world of one row after its blur.
 template <class C>
@@ -55,15 +37,11 @@ struct ScanBlurs : BornLibrary {
       for (const i32 radius : radii) {
         std::vector<C> made(line.size());
         ASSERT_EQ(scan(0, radius, 0, length - 1, length, line.data(), made.data()), 0);
-        const f64 real_radius = radius / 65536.0;
-        const std::vector<C> world = world_blur(bell, static_cast<f32>(real_radius), line);
+        const std::vector<C> world = world_blur(bell, static_cast<f32>(radius) / 65536, line);
         for (i32 i = 0; i < length; ++i) {
           const auto at = static_cast<size_t>(i);
           // 8 bits agree exactly, deep worlds sum in single precision.
           ASSERT_LE(std::abs(made[at] - world[at]), sizeof(C) == 1 ? 0 : 1)
-              << radius << " of " << length << " at " << i;
-          const f64 mean = mean_at(bell, real_radius, line, i);
-          ASSERT_LE(std::fabs(made[at] - mean), sizeof(C) == 1 && !bell ? 0.51 + 0.26 : 0.5001)
               << radius << " of " << length << " at " << i;
         }
       }
