@@ -8,6 +8,13 @@ find_package(Boost 1.70 REQUIRED)
 find_path(ZR_XXHASH_FOLDER xxhash.h REQUIRED)
 find_path(ZR_HIGHWAY_FOLDER hwy/highway.h REQUIRED)
 
+# Highway checks indices in builds for sanitizers and debuggers, and then needs its library to say what it found.
+set(zr_highway)
+if(ZR_SANITIZE OR CMAKE_BUILD_TYPE STREQUAL "Debug")
+  find_library(ZR_HIGHWAY hwy REQUIRED)
+  set(zr_highway ${ZR_HIGHWAY})
+endif()
+
 get_property(zr_sources GLOBAL PROPERTY ZR_LIBRARY_SOURCES)
 add_library(zr_objects OBJECT ${zr_sources})
 target_include_directories(zr_objects
@@ -27,7 +34,7 @@ add_library(zr_internal INTERFACE)
 target_include_directories(zr_internal INTERFACE
   ${PROJECT_SOURCE_DIR}/include ${PROJECT_SOURCE_DIR}/platform ${PROJECT_SOURCE_DIR}/pkg/ZR/indep)
 target_link_libraries(zr_internal INTERFACE zr_objects $<TARGET_OBJECTS:zr_objects> zr_rules
-  spdlog::spdlog PkgConfig::LCMS2 Boost::headers Threads::Threads ${CMAKE_DL_LIBS})
+  spdlog::spdlog PkgConfig::LCMS2 Boost::headers Threads::Threads ${zr_highway} ${CMAKE_DL_LIBS})
 
 add_library(zr SHARED)
 add_library(zr_static STATIC)
@@ -41,7 +48,7 @@ set_target_properties(zr_static PROPERTIES OUTPUT_NAME zr EXPORT_NAME zr_static)
 foreach(library zr zr_static)
   target_link_libraries(${library} PRIVATE $<BUILD_INTERFACE:zr_objects> $<BUILD_INTERFACE:zr_rules>)
   target_sources(${library} PRIVATE $<TARGET_OBJECTS:zr_objects>)
-  target_link_libraries(${library} PRIVATE spdlog::spdlog PkgConfig::LCMS2 Threads::Threads ${CMAKE_DL_LIBS})
+  target_link_libraries(${library} PRIVATE spdlog::spdlog PkgConfig::LCMS2 Threads::Threads ${zr_highway} ${CMAKE_DL_LIBS})
   target_link_libraries(${library} PUBLIC Boost::headers)
   target_include_directories(${library} INTERFACE
     $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include> $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)

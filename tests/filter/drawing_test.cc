@@ -206,7 +206,7 @@ TEST_F(Drawing, PlanesOutAndIn) {
   EXPECT_EQ(ZR_ExtractPlanes(nullptr, nullptr, 1, &handle, &row_bytes), 3);
   EXPECT_EQ(ZR_ExtractPlanes(nullptr, world, 1, nullptr, &row_bytes), 3);
   caught.clear();
-  for (const u64 n : {1, 2}) {
+  for (const u64 n : {u64{1}, u64{2}}) {
     HB_FailNthAllocation(n);
     EXPECT_EQ(ZR_ExtractPlanes(nullptr, world, 7, &handle, &row_bytes), 4);
     EXPECT_NE(caught.take_message().find("image plane buffer"), std::string::npos);
