@@ -25,7 +25,8 @@ using SlotTrial = void(ZR_SlotFunc routine, Outcome& out);
 // The trial of a slot, or null for one whose signature has none: mask rows, whole transfers, linear light.
 SlotTrial* slot_trial(i32 slot);
 
-// A ZR_SlotCheck: 1 where the outcomes differ or one throws. Memory and crashes of a routine are beyond it.
+// A ZR_SlotCheck: 1 where the outcomes differ or one throws, -1 without a trial. Memory and crashes of a routine are
+// beyond it.
 i32 check_slot(void*, i32 slot, ZR_SlotFunc before, ZR_SlotFunc now);
 
 }  // namespace zr

@@ -39,6 +39,14 @@ struct HostkitOptions {
 //   - fn may throw an i32: it counts as returned. Other exceptions become codes; none crosses threads.
 //   - Calls from several threads at once are independent and share the threads.
 // A body that a module brought for this slot is replaced.
+//
+// Birth checks the slots that acceleration modules rewrote (<ZR/module.h>, preference "module.check"): rows, samplers,
+// copies and functions of modes are run on a small fixed set of pixels, beside the routine that stood there before, and
+// must give the same bytes. What it cannot tell:
+//   - whole transfers, transforms, blurs, mask rows and linear light have no trial: they are taken as they are;
+//   - pixels and sizes that are not in the set, calls from several threads, and anything but results;
+//   - a routine, or the entry of a module, that crashes, writes outside its pixels or never returns takes the process
+//     along, during the check as later. Exceptions and codes it survives.
 class Hostkit {
  public:
   // Throws std::runtime_error when birth fails, or when there is one already; nothing is left changed then.

@@ -76,7 +76,7 @@ extern "C" {
 ZR_API const char* ZR_GetSlotName(i32 slot);
 
 /* Compares two routines of a slot, on the main thread, while the library is being born: 0 where `now` does what
- * `before` does, or where that cannot be told. A Hostkit brings one (<ZR/hostkit.h>). */
+ * `before` does, above 0 where it does not, below where that cannot be told. A Hostkit brings one (<ZR/hostkit.h>). */
 typedef i32 (*ZR_SlotCheck)(void* refcon, i32 slot, ZR_SlotFunc before, ZR_SlotFunc now);
 /* The check of the following births: asked for each slot that a routine of a module rewrote, after it was loaded and
  * before the suites are made. A slot that was emptied counts as one that differs, unasked. What differs is named in the
@@ -94,9 +94,10 @@ typedef struct ZR_ModuleFile {
 ZR_API i32 ZR_GetModuleFile(i32 index, ZR_ModuleFile* out);
 /* The same for the slots that accepted modules rewrote, in the order of loading. Valid until death. */
 typedef enum ZR_SlotVerdict {
-  ZR_SlotVerdict_Replaced = 0, /* and in use: not checked, or found equal */
+  ZR_SlotVerdict_Replaced = 0, /* in use, not checked or without a check */
   ZR_SlotVerdict_Kept = 1,     /* differs and is in use */
-  ZR_SlotVerdict_PutBack = 2   /* differs and is not in use */
+  ZR_SlotVerdict_PutBack = 2,  /* differs and is not in use */
+  ZR_SlotVerdict_Equal = 3     /* in use, checked */
 } ZR_SlotVerdict;
 typedef struct ZR_ModuleSlot {
   const char* routine; /* the module's name for its routine */

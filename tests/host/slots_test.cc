@@ -1,6 +1,7 @@
 // The slot table after birth, and what replacing a slot does.
 #include <ZR/composite.h>
 #include <ZR/copy_bits.h>
+#include <ZR/module.h>
 #include <ZR/summed_area.h>
 
 #include <bitset>
@@ -24,8 +25,13 @@ TEST_F(Slots, HoldARoutineWhereTheLibraryHasOneAndNullElsewhere) {
   std::bitset<ZR_SlotCount> expected;
   for (const Range& range : filled)
     for (int slot = range.first; slot <= range.last; ++slot) expected.set(static_cast<size_t>(slot));
-  for (size_t slot = 0; slot < ZR_SlotCount; ++slot)
-    EXPECT_EQ(ZRp_G_OverFuncs[slot] != nullptr, expected[slot]) << "slot " << slot;
+  for (size_t slot = 0; slot < ZR_SlotCount; ++slot) {
+    const char* const name = ZR_GetSlotName(static_cast<i32>(slot));
+    EXPECT_EQ(ZRp_G_OverFuncs[slot] != nullptr, expected[slot]) << "slot " << slot << ' ' << (name ? name : "");
+    EXPECT_EQ(name != nullptr, expected[slot] || slot <= ZR_Slot_module1) << "slot " << slot;
+  }
+  EXPECT_EQ(ZR_GetSlotName(-1), nullptr);
+  EXPECT_EQ(ZR_GetSlotName(ZR_SlotCount), nullptr);
 }
 
 // Routines with an exported name or with a name agreed between floors stand in the slot of that number.

@@ -126,6 +126,7 @@ i32 load_routine(ADDIN_File* file, i32 index) {
   if (const i32 error = ADDIN_RegisterRoutine(file, index, &routine); error != ZR_Err_None) return error;
   HeldRoutine held(routine);
   const SlotImage before;
+  const size_t reviewed = slot_review_count();
   if (const i32 error = held.prepare(); error != ZR_Err_None) return error;
   LoadedModule& module = held.module();
   fill_block(module.block);
@@ -135,7 +136,7 @@ i32 load_routine(ADDIN_File* file, i32 index) {
   if (result == ZR_Err_None) result = held.keep();
   if (result != ZR_Err_None) {
     before.put_back();
-    forget_slot_review_of(info.name);
+    forget_slot_review_from(reviewed);
   }
   return result;
 }

@@ -32,9 +32,10 @@ Policy policy() {
   return Policy::strict;
 }
 
-bool differs(i32 slot, ZR_SlotFunc before, ZR_SlotFunc now) {
-  if (before == nullptr) return false;  // nothing to compare with
-  return now == nullptr || G_check(G_check_refcon, slot, before, now) != 0;
+// As a ZR_SlotCheck answers.
+i32 compare(i32 slot, ZR_SlotFunc before, ZR_SlotFunc now) {
+  if (before == nullptr) return -1;  // nothing to compare with
+  return now == nullptr ? 1 : G_check(G_check_refcon, slot, before, now);
 }
 
 }  // namespace
@@ -44,8 +45,9 @@ void review_slots(const char* routine, const ZR_SlotFunc (&before)[ZR_SlotCount]
   for (i32 slot = 0; slot < ZR_SlotCount; ++slot) {
     const ZR_SlotFunc now = ZRp_G_OverFuncs[slot];
     if (now == before[slot]) continue;
-    i32 verdict = ZR_SlotVerdict_Replaced;
-    if (wanted != Policy::off && differs(slot, before[slot], now)) {
+    const i32 answer = wanted != Policy::off ? compare(slot, before[slot], now) : -1;
+    i32 verdict = answer == 0 ? ZR_SlotVerdict_Equal : ZR_SlotVerdict_Replaced;
+    if (answer > 0) {
       verdict = wanted == Policy::strict ? ZR_SlotVerdict_PutBack : ZR_SlotVerdict_Kept;
       if (wanted == Policy::strict) ZRp_G_OverFuncs[slot] = before[slot];
       const char* const name = ZR_GetSlotName(slot);
@@ -61,8 +63,10 @@ void review_slots(const char* routine, const ZR_SlotFunc (&before)[ZR_SlotCount]
 
 void forget_slot_review() { decltype(G_found)().swap(G_found); }
 
-void forget_slot_review_of(const char* routine) {
-  while (!G_found.empty() && G_found.back().routine == routine) G_found.pop_back();
+size_t slot_review_count() { return G_found.size(); }
+
+void forget_slot_review_from(size_t count) {
+  if (G_found.size() > count) G_found.resize(count);
 }
 
 }  // namespace zr

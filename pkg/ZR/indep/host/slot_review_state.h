@@ -9,6 +9,8 @@ namespace zr {
 // puts back what is not to stay. `routine` lives until it is forgotten.
 void review_slots(const char* routine, const ZR_SlotFunc (&before)[ZR_SlotCount]);
 void forget_slot_review();
-void forget_slot_review_of(const char* routine);  // the last that was reviewed
+// For a routine that is refused after its review: what was found since there were `count` slots.
+size_t slot_review_count();
+void forget_slot_review_from(size_t count);
 
 }  // namespace zr
