@@ -12,10 +12,10 @@
 namespace zr::tool {
 namespace {
 
-constexpr const Command* kCommands[] = {&kRenderCommand,    &kSheetCommand,      &kTransformCommand, &kResizeCommand,
-                                        &kBlurCommand,      &kConvolveCommand,   &kConvertCommand,   &kDisplayCommand,
-                                        &kInfoCommand,      &kGuessAlphaCommand, &kUnmatteCommand,   &kViewCommand,
-                                        &kWireframeCommand, &kGalleryCommand,    &kListCommand,      &kVerifyCommand};
+constexpr const Command* kCommands[] = {
+    &kRenderCommand,    &kSheetCommand,   &kTransformCommand, &kResizeCommand,     &kBlurCommand,    &kConvolveCommand,
+    &kConvertCommand,   &kDisplayCommand, &kInfoCommand,      &kGuessAlphaCommand, &kUnmatteCommand, &kViewCommand,
+    &kWireframeCommand, &kGalleryCommand, &kListCommand,      &kModulesCommand,    &kVerifyCommand};
 constexpr const char* kVersion = "zr " ZR_TOOL_VERSION;
 
 std::string exit_code_help() {
