@@ -15,7 +15,7 @@ namespace {
 constexpr const Command* kCommands[] = {
     &kRenderCommand,    &kSheetCommand,   &kTransformCommand, &kResizeCommand,     &kBlurCommand,    &kConvolveCommand,
     &kConvertCommand,   &kDisplayCommand, &kInfoCommand,      &kGuessAlphaCommand, &kUnmatteCommand, &kViewCommand,
-    &kWireframeCommand, &kGalleryCommand, &kListCommand,      &kModulesCommand,    &kVerifyCommand};
+    &kWireframeCommand, &kMaskCommand,    &kGalleryCommand,   &kListCommand,       &kModulesCommand, &kVerifyCommand};
 constexpr const char* kVersion = "zr " ZR_TOOL_VERSION;
 
 std::string exit_code_help() {

@@ -10,6 +10,7 @@
 #include "colour_space.h"
 #include "depths.h"
 #include "image_files.h"
+#include "mask_shapes.h"
 #include "mode_names.h"
 #include "scene_keys.h"
 #include "tool_host.h"
@@ -21,6 +22,10 @@ void list_modes() {
   std::puts("number  name                     how alpha enters");
   for (const ModeName& mode : all_modes())
     std::printf("%6d  %-24s %s\n", mode.number, mode.name.c_str(), mode.kind.c_str());
+}
+
+void list_mask_modes() {
+  for (const MaskMode& mode : mask_modes()) std::printf("%-16s %s\n", mode.name, mode.meaning);
 }
 
 void list_formats() {
@@ -71,8 +76,13 @@ struct Subject {
   const char* name;
   void (*list)();
 };
-constexpr Subject kSubjects[] = {{"commands", &list_commands}, {"modes", &list_modes},   {"effects", &list_effects},
-                                 {"formats", &list_formats},   {"spaces", &list_spaces}, {"cpu", &list_cpu}};
+constexpr Subject kSubjects[] = {{"commands", &list_commands},
+                                 {"modes", &list_modes},
+                                 {"mask-modes", &list_mask_modes},
+                                 {"effects", &list_effects},
+                                 {"formats", &list_formats},
+                                 {"spaces", &list_spaces},
+                                 {"cpu", &list_cpu}};
 
 Run declare(CLI::App& verb) {
   const auto what = std::make_shared<std::string>();
@@ -90,6 +100,7 @@ Run declare(CLI::App& verb) {
       "Examples:\n"
       "  zr list commands   what zr can do\n"
       "  zr list modes      transfer modes by number and name, as scenes use them\n"
+      "  zr list mask-modes how the shapes of a mask are combined, in zr mask and in scenes\n"
       "  zr list effects    effects of a scene's layers and their keys; zr help effects tells more\n"
       "  zr list formats    picture files that are written and read\n"
       "  zr list spaces     colour spaces by name\n"
@@ -103,6 +114,7 @@ Run declare(CLI::App& verb) {
 }  // namespace
 
 const Command kListCommand = {
-    "list", "List commands, transfer modes, effects, file formats, colour spaces or processor features", &declare};
+    "list", "List commands, transfer modes, mask modes, effects, file formats, colour spaces or processor features",
+    &declare};
 
 }  // namespace zr::tool

@@ -81,17 +81,6 @@ GX_Matrix3 parse_matrix(const std::string& text) {
   return matrix;
 }
 
-void parse_size(const std::string& text, i32& width, i32& height) {
-  const char *begin = text.data(), *const end = begin + text.size();
-  const auto [cross, first] = std::from_chars(begin, end, width);
-  const bool crossed = first == std::errc() && cross != end && *cross == 'x';
-  const auto [stop, second] = std::from_chars(crossed ? cross + 1 : end, end, height);
-  const auto fits = [](i32 side) { return side >= 1 && side <= kLargestSide; };
-  if (!crossed || second != std::errc() || stop != end || !fits(width) || !fits(height))
-    throw bad_input("transform: --size is \"" + text + "\"; it must be WIDTHxHEIGHT, each 1 to " +
-                    std::to_string(kLargestSide));
-}
-
 Request parse_request(const TransformOptions& options) {
   Request request;
   request.exact = !options.matrix.empty();
@@ -109,7 +98,7 @@ Request parse_request(const TransformOptions& options) {
   if (!(std::abs(surface) > unleaned * 1e-12))
     throw bad_input("transform: this " + std::string(request.exact ? "--matrix" : "--scale and --skew") +
                     " flattens the picture to nothing" + (request.exact ? "" : "; neither scale may be 0"));
-  if (!options.size.empty()) parse_size(options.size, request.width, request.height);
+  if (!options.size.empty()) parse_size(options.size, "transform: --size", request.width, request.height);
   if (options.background != "none") {
     request.background = parse_colour(options.background);
     if (!request.background)

@@ -21,7 +21,7 @@ struct Command {
 
 extern const Command kRenderCommand, kListCommand, kGalleryCommand, kConvertCommand, kDisplayCommand, kInfoCommand,
     kSheetCommand, kTransformCommand, kResizeCommand, kVerifyCommand, kBlurCommand, kConvolveCommand,
-    kGuessAlphaCommand, kUnmatteCommand, kViewCommand, kWireframeCommand, kModulesCommand;
+    kGuessAlphaCommand, kUnmatteCommand, kViewCommand, kWireframeCommand, kMaskCommand, kModulesCommand;
 
 std::span<const Command* const> all_commands();
 // Help that belongs to no verb: {name, text}.

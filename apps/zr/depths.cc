@@ -1,6 +1,7 @@
 // Depths and sizes of pictures as people write them.
 #include "depths.h"
 
+#include <charconv>
 #include <cstdio>
 
 #include "tool_error.h"
@@ -13,6 +14,16 @@ i32 parse_depth(const std::string& text, const std::string& where) {
   for (const i32 depth : {8, 16, 32})
     if (text == depth_name(depth)) return depth;
   throw bad_input(where + " is \"" + text + "\"; it must be 8, 16 or float");
+}
+
+void parse_size(const std::string& text, const std::string& where, i32& width, i32& height) {
+  const char *begin = text.data(), *const end = begin + text.size();
+  const auto [cross, first] = std::from_chars(begin, end, width);
+  const bool crossed = first == std::errc() && cross != end && *cross == 'x';
+  const auto [stop, second] = std::from_chars(crossed ? cross + 1 : end, end, height);
+  const auto fits = [](i32 side) { return side >= 1 && side <= kLargestSide; };
+  if (!crossed || second != std::errc() || stop != end || !fits(width) || !fits(height))
+    throw bad_input(where + " is \"" + text + "\"; it must be WIDTHxHEIGHT, each 1 to " + std::to_string(kLargestSide));
 }
 
 std::string bytes_text(u64 bytes) {

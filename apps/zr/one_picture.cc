@@ -9,9 +9,7 @@
 #include "common_options.h"
 #include "depths.h"
 #include "output_files.h"
-#include "stopwatch.h"
 #include "tool_error.h"
-#include "tool_host.h"
 
 namespace zr::tool {
 namespace {
@@ -69,8 +67,14 @@ void turn_picture(const PictureOptions& options, const std::string& verb, const 
   Stopwatch reading;
   Picture picture = task.stored ? load_stored(options.input, depth, verb) : load_picture(options.input, depth, verb);
   reading.stop();
+  finish_picture(options, host, reading, [&] { return work(std::move(picture), depth); });
+}
+
+void finish_picture(const PictureOptions& options, const ToolHost& host, const Stopwatch& reading,
+                    const std::function<Finished()>& work) {
+  const OutputFormat& format = output_format_of(options.output);
   Stopwatch working;
-  const Finished finished = work(std::move(picture), depth);
+  const Finished finished = work();
   working.stop();
   Stopwatch writing;
   OutputFolders folders;

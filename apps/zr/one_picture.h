@@ -7,6 +7,8 @@
 #include <string>
 
 #include "image_files.h"
+#include "stopwatch.h"
+#include "tool_host.h"
 
 namespace zr::tool {
 
@@ -33,6 +35,10 @@ struct Finished {
 // `work` while the host lives, and writes what it gives. `profiles` are other files that are read.
 void turn_picture(const PictureOptions& options, const std::string& verb, const std::vector<std::string>& profiles,
                   const std::function<Finished(Picture picture, i32 depth)>& work, const PictureTask& task = {});
+
+// The end of the former, for a picture that comes from no file: makes it, writes it and tells of it.
+void finish_picture(const PictureOptions& options, const ToolHost& host, const Stopwatch& reading,
+                    const std::function<Finished()>& work);
 
 // RGB of a picture that may be ink: CMYK is converted to sRGB by its profile. The ICC data are what goes with it.
 Finished without_ink(Picture picture, i32 depth, const std::string& file, const std::string& verb);

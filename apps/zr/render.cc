@@ -24,11 +24,22 @@ void fill(OwnedWorld& world, const ZR_PixelFloat& colour, const std::string& wha
   check(ZR_FillFloat(nullptr, &colour, nullptr, world.layer()), what);
 }
 
+ImageInfo size_of(const Scene& scene, const Layer& layer) {
+  if (layer.image.empty()) return {layer.width, layer.height, 0};
+  return probe_image(layer.image, scene.file + ": " + layer.place + ".image");
+}
+
+// The masked picture, and its mask while it is drawn.
+u64 masked_bytes(const Scene& scene, const Layer& layer) {
+  const ImageInfo size = size_of(scene, layer);
+  return world_bytes(size.width, size.height, scene.depth) +
+         mask_bytes(size.width, size.height, mask_depth_for(scene.depth), layer.mask);
+}
+
 // The picture before and after an effect, and one in between.
 u64 effect_bytes(const Scene& scene, const Layer& layer) {
   const GX_LPoint growth = largest_growth(layer.effects);
-  ImageInfo size{layer.width, layer.height, 0};
-  if (!layer.image.empty()) size = probe_image(layer.image, scene.file + ": " + layer.place + ".image");
+  const ImageInfo size = size_of(scene, layer);
   const i64 width = i64{size.width} + 2 * i64{growth.x}, height = i64{size.height} + 2 * i64{growth.y};
   if (width > kLargestSide || height > kLargestSide)
     throw bad_input(scene.file + ": " + layer.place + ".effects make the layer grow to " + std::to_string(width) +
@@ -69,6 +80,8 @@ u64 memory_needed(const Scene& scene) {
   for (const Layer& layer : scene.layers)
     if (layer.image.empty()) worlds += world_bytes(layer.width, layer.height, scene.depth);
   for (const Layer& layer : scene.layers)
+    if (!layer.mask.empty()) worlds += masked_bytes(scene, layer);
+  for (const Layer& layer : scene.layers)
     if (!layer.effects.empty()) worlds += effect_bytes(scene, layer);
   for (const SceneImage& image : images_of(scene)) {
     stop_if_interrupted();
@@ -91,6 +104,8 @@ Renderer::Renderer(const Scene& scene) : scene_(scene), canvas_(scene.width, sce
     const auto made = solids_.emplace(&layer, OwnedWorld(layer.width, layer.height, scene.depth)).first;
     fill(made->second, layer.colour, layer.place);
   }
+  for (const Layer& layer : scene.layers)
+    if (!layer.mask.empty()) apply_mask(layer);
 }
 
 const OwnedWorld& Renderer::draw(i32 frame) {
@@ -146,8 +161,23 @@ ZR_MaskWorld Renderer::matte_of(const Layer& layer, i32 frame) {
   return mask;
 }
 
+// Others may show the same image, so the mask goes onto a copy.
+void Renderer::apply_mask(const Layer& layer) {
+  const std::string where = layer.place + ".mask";
+  OwnedWorld picture = copied(own_pixels(layer), where);
+  const OwnedMask mask =
+      draw_mask(picture.width(), picture.height(), mask_depth_for(scene_.depth), layer.mask, {}, where);
+  merge_mask(*mask, picture, where);
+  masked_.emplace(&layer, std::move(picture));
+}
+
+OwnedWorld& Renderer::own_pixels(const Layer& layer) {
+  if (const auto masked = masked_.find(&layer); masked != masked_.end()) return masked->second;
+  return layer.image.empty() ? solids_.at(&layer) : images_.at(layer.image);
+}
+
 Renderer::Source Renderer::source_of(const Layer& layer, i32 frame) {
-  OwnedWorld& own = layer.image.empty() ? solids_.at(&layer) : images_.at(layer.image);
+  OwnedWorld& own = own_pixels(layer);
   if (layer.effects.empty()) return {own, {0, 0}};
   const auto kept = filtered_.find(&layer);
   if (kept != filtered_.end() && stand_still(layer.effects)) return {kept->second.world, kept->second.grown};

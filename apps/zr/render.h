@@ -36,8 +36,10 @@ class Renderer {
  private:
   void choose_spaces();
   OwnedWorld load(const SceneImage& image) const;
+  void apply_mask(const Layer& layer);
+  OwnedWorld& own_pixels(const Layer& layer);
   ZR_MaskWorld matte_of(const Layer& layer, i32 frame);
-  // A layer's pixels after its effects, and what they have added on each side.
+  // A layer's pixels after its mask and effects, and what they have added on each side.
   struct Source {
     OwnedWorld& world;
     GX_LPoint grown;
@@ -54,6 +56,7 @@ class Renderer {
   std::optional<OwnedWorld> matte_;           // of the frame's size, once a matte needs it
   std::map<std::string, OwnedWorld> images_;  // by file name
   std::map<const Layer*, OwnedWorld> solids_;
+  std::map<const Layer*, OwnedWorld> masked_;  // pixels of layers with a mask, after it
   std::map<const Layer*, Filtered> filtered_;  // after effects: for all frames, or the latest
 };
 

@@ -9,6 +9,7 @@
 #include "nearest_name.h"
 #include "scene_effects.h"
 #include "scene_keys.h"
+#include "scene_mask.h"
 #include "scene_node.h"
 #include "scene_values.h"
 #include "tool_error.h"
@@ -83,6 +84,7 @@ Layer read_layer(const SceneNode& node, const Scene& scene) {
     if (node.has("size")) read_size(node.at("size"), layer.width, layer.height);
   }
   if (node.has("name")) node.at("name").string("a text");
+  if (node.has("mask")) layer.mask = read_mask(node.at("mask"));
   if (node.has("effects")) layer.effects = read_effects(node.at("effects"));
   layer.placement = read_placement(node, scene.placement);
   if (node.has("opacity")) layer.opacity = read_keyed(node.at("opacity"), &read_opacity);

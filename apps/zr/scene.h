@@ -11,6 +11,7 @@
 #include "depths.h"
 #include "effects.h"
 #include "frame_names.h"
+#include "mask_shapes.h"
 #include "placement.h"
 
 namespace zr::tool {
@@ -26,6 +27,7 @@ struct Layer {
   std::string image;  // path; empty for a solid
   ZR_PixelFloat colour{1, 0, 0, 0};
   i32 width = 0, height = 0;    // of a solid
+  std::vector<MaskShape> mask;  // of its own pixels, before its effects
   std::vector<Effect> effects;  // on its own pixels, before it is placed
   Placement placement;
   Keyed<f64> opacity{1.0};

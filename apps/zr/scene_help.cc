@@ -36,9 +36,9 @@ std::string scene_help() {
              "      { \"image\": \"media/balloon.png\", \"mode\": \"screen\", \"opacity\": 0.8,\n"
              "        \"position\": [ { \"frame\": 1, \"value\": [0, 300] },\n"
              "                      { \"frame\": 48, \"value\": [700, 40] } ] } ] }\n") +
-         section("The scene", kSceneKeys) + section("A layer", kLayerKeys) + section("A matte", kMatteKeys) +
-         section("Placing a layer or a matte", kPlacementKeys) + section("Motion blur", kMotionBlurKeys) +
-         section("A keyframe, in a list of rising frames", kKeyframeKeys) +
+         section("The scene", kSceneKeys) + section("A layer", kLayerKeys) + section("A shape of a mask", kMaskKeys) +
+         section("A matte", kMatteKeys) + section("Placing a layer or a matte", kPlacementKeys) +
+         section("Motion blur", kMotionBlurKeys) + section("A keyframe, in a list of rising frames", kKeyframeKeys) +
          "\nA colour is [red, green, blue], [red, green, blue, alpha], each 0..1, \"#rrggbb\" or \"#rrggbbaa\".\n"
          "An unknown key is an error. zr help effects tells of the effects.\n";
 }

@@ -36,6 +36,7 @@ inline constexpr std::array kLayerKeys = {
     SceneKey{"colour", "colour", "", "a solid, instead of \"image\""},
     SceneKey{"size", "[width, height], each 1..30000", "the scene's", "of a solid"},
     SceneKey{"name", "text", "", "for the reader only"},
+    SceneKey{"mask", "list of shapes", "none", "multiplies the alpha of its own pixels, before the effects"},
     SceneKey{"effects", "list of effects", "none",
              "what is done to its own pixels first, in this order; see zr help effects"},
     SceneKey{"opacity", "0..1 or keyframes", "1", ""},
@@ -49,6 +50,17 @@ inline constexpr std::array kMatteKeys = {
     SceneKey{"image", "file name", "", "relative to the scene file"},
     SceneKey{"kind", "\"alpha\", \"inverted-alpha\", \"luma\" or \"inverted-luma\"", "alpha",
              "inverted kinds are open outside of the image"},
+};
+// Of each shape of a layer's mask.
+inline constexpr std::array kMaskKeys = {
+    SceneKey{"shape", "\"rectangle\", \"ellipse\" or \"polygon\"", "", ""},
+    SceneKey{"box", "[x, y, width, height], each to 1000000", "",
+             "of a rectangle, or around an ellipse; pixels of the layer"},
+    SceneKey{"points", "3 to 1000 points [x, y]", "", "of a polygon, filled where it winds around"},
+    SceneKey{"feather", "0..1000", "0", "radius of a Gaussian blur of the shape"},
+    SceneKey{"mode", "name, see zr list mask-modes", "screen",
+             "how it joins the shapes before; a first one that subtracts, intersects or darkens finds a full mask"},
+    SceneKey{"opacity", "0..1", "1", "of the shape"},
 };
 // Of layers and of mattes.
 inline constexpr std::array kPlacementKeys = {
