@@ -24,20 +24,20 @@ typedef struct Tint {
   f64 middle_x, middle_y, reach; /* reach: squared distance of the corners */
 } Tint;
 
-static u8 between(u8 from, u8 to, i32 of_100) { return (u8)(from + (to - from) * of_100 / 100); }
+/* luminance: hundredths of a level. */
+static u8 between(u8 from, u8 to, i32 luminance) { return (u8)(from + (to - from) * luminance / 25500); }
 
 static i32 two_colours(void* refcon, i32 x, i32 y, const void* in, void* out) {
   const Tint* const tint = (const Tint*)refcon;
   const ZR_Pixel8* const from = (const ZR_Pixel8*)in;
   ZR_Pixel8* const to = (ZR_Pixel8*)out;
-  i32 luminance = 0; /* hundredths of a level: 0..25500 */
+  i32 luminance = 0;
   const i32 error = tint->colours->luminance(NULL, from, &luminance);
-  const i32 brightness = luminance / 255;
   (void)x, (void)y;
   to->alpha = from->alpha;
-  to->red = between(tint->dark.red, tint->light.red, brightness);
-  to->green = between(tint->dark.green, tint->light.green, brightness);
-  to->blue = between(tint->dark.blue, tint->light.blue, brightness);
+  to->red = between(tint->dark.red, tint->light.red, luminance);
+  to->green = between(tint->dark.green, tint->light.green, luminance);
+  to->blue = between(tint->dark.blue, tint->light.blue, luminance);
   return error; /* anything but 0 stops the walk */
 }
 
@@ -47,7 +47,7 @@ static i32 darken_corners(void* refcon, i32 x, i32 y, const void* in, void* out)
   ZR_Pixel8* const pixel = (ZR_Pixel8*)out;
   const f64 dx = x + 0.5 - tint->middle_x, dy = y + 0.5 - tint->middle_y;
   const f64 far = (dx * dx + dy * dy) / tint->reach; /* 0 in the middle, 1 in the corners */
-  const f64 light = 1 - 0.75 * far * far;
+  const f64 light = 1 - 0.6 * far * far;
   (void)in;
   pixel->red = (u8)(pixel->red * light + 0.5);
   pixel->green = (u8)(pixel->green * light + 0.5);
