@@ -65,7 +65,7 @@ T mean_of(const Lanes<f64>& sum, const ZR_SampPB& params) {
 PixelRange boxes_inside(const SampleRun& run, const ZR_SampPB& params) {
   const ZR_LayerDef& src = *params.src;
   // No box reads the pixel behind it where all of them end with a whole one.
-  const bool whole = ((run.step_x | (run.x + params.x_radius - 32768)) & 0xffff) == 0;
+  const bool whole = ((run.step_x | (wrap_add(run.x, params.x_radius) ^ 32768)) & 0xffff) == 0;
   const i64 end = (std::min(src.width, 32767) - i64{1}) * 65536 + (whole ? 65536 : 0);
   const auto inside = [&](i32 i) {
     const i64 x = run.x + static_cast<i64>(i) * run.step_x + 32768;
