@@ -69,9 +69,7 @@ const GroundRows<T>* ground_rows() {
       &ground_row<T, ModeKind::grey_ground, false>, &ground_row<T, ModeKind::grey_ground, true>, &union_row<T>};
   return &rows;
 }
-template const GroundRows<ZR_Pixel8>* ground_rows<ZR_Pixel8>();
-template const GroundRows<ZR_Pixel16>* ground_rows<ZR_Pixel16>();
-template const GroundRows<ZR_PixelFloat>* ground_rows<ZR_PixelFloat>();
+ZR_ROWS_OF_DEPTHS(const GroundRows, ground_rows)
 
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
@@ -79,18 +77,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-template <class T>
-const GroundRows<T>* lane_ground_rows() {
-  ZR_RETURN_BEST(ground_rows<T>());
-  return nullptr;
-}
-template const GroundRows<ZR_Pixel8>* lane_ground_rows<ZR_Pixel8>();
-template const GroundRows<ZR_Pixel16>* lane_ground_rows<ZR_Pixel16>();
-template const GroundRows<ZR_PixelFloat>* lane_ground_rows<ZR_PixelFloat>();
-
-}  // namespace zr
+ZR_LANE_ROWS(const GroundRows, ground_rows)
 #endif

@@ -71,7 +71,7 @@ template <class T>
 class LaneTaps {
  public:
   // Lanes serve kernels whose numbers fit theirs, and not the largest ones.
-  explicit LaneTaps(const Convolution<T>& c) : c_(c), row_(lane_convolve<T>()) {
+  explicit LaneTaps(const Convolution<T>& c) : c_(c), row_(lane_convolve_row<T>()) {
     const i64 taps = static_cast<i64>(c.width) * c.height;
     if (row_ == nullptr || taps > most_taps || !fits(taps)) return;
     taps_ = static_cast<LaneTap<T>*>(HB_AllocatePtr(static_cast<u64>(taps) * sizeof(LaneTap<T>),

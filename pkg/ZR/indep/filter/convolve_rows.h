@@ -68,6 +68,6 @@ template <class T>
 using LaneConvolveFunc = i32(const LaneConvolution<T>& work);
 // The fastest that this processor has, or null.
 template <class T>
-LaneConvolveFunc<T>* lane_convolve();
+LaneConvolveFunc<T>* lane_convolve_row();
 
 }  // namespace zr

@@ -158,9 +158,7 @@ const BellRows<T>* bell_rows() {
   static constexpr BellRows<T> rows = {&run_bell<T, false>, &run_bell<T, true>};
   return &rows;
 }
-template const BellRows<ZR_Pixel8>* bell_rows<ZR_Pixel8>();
-template const BellRows<ZR_Pixel16>* bell_rows<ZR_Pixel16>();
-template const BellRows<ZR_PixelFloat>* bell_rows<ZR_PixelFloat>();
+ZR_ROWS_OF_DEPTHS(const BellRows, bell_rows)
 
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
@@ -168,18 +166,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-template <class T>
-const BellRows<T>* lane_bell_rows() {
-  ZR_RETURN_BEST(bell_rows<T>());
-  return nullptr;
-}
-template const BellRows<ZR_Pixel8>* lane_bell_rows<ZR_Pixel8>();
-template const BellRows<ZR_Pixel16>* lane_bell_rows<ZR_Pixel16>();
-template const BellRows<ZR_PixelFloat>* lane_bell_rows<ZR_PixelFloat>();
-
-}  // namespace zr
+ZR_LANE_ROWS(const BellRows, bell_rows)
 #endif

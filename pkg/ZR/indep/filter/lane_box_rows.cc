@@ -130,9 +130,7 @@ const BoxRows<T>* box_rows() {
   static constexpr BoxRows<T> rows = {&add<T>, &run_box<T, false>, &run_box<T, true>};
   return &rows;
 }
-template const BoxRows<ZR_Pixel8>* box_rows<ZR_Pixel8>();
-template const BoxRows<ZR_Pixel16>* box_rows<ZR_Pixel16>();
-template const BoxRows<ZR_PixelFloat>* box_rows<ZR_PixelFloat>();
+ZR_ROWS_OF_DEPTHS(const BoxRows, box_rows)
 
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
@@ -140,18 +138,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-template <class T>
-const BoxRows<T>* lane_box_rows() {
-  ZR_RETURN_BEST(box_rows<T>());
-  return nullptr;
-}
-template const BoxRows<ZR_Pixel8>* lane_box_rows<ZR_Pixel8>();
-template const BoxRows<ZR_Pixel16>* lane_box_rows<ZR_Pixel16>();
-template const BoxRows<ZR_PixelFloat>* lane_box_rows<ZR_PixelFloat>();
-
-}  // namespace zr
+ZR_LANE_ROWS(const BoxRows, box_rows)
 #endif

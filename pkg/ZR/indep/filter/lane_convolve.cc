@@ -156,9 +156,7 @@ template <class T>
 LaneConvolveFunc<T>* convolve_row() {
   return &convolve_span<T>;
 }
-template LaneConvolveFunc<ZR_Pixel8>* convolve_row<ZR_Pixel8>();
-template LaneConvolveFunc<ZR_Pixel16>* convolve_row<ZR_Pixel16>();
-template LaneConvolveFunc<ZR_PixelFloat>* convolve_row<ZR_PixelFloat>();
+ZR_ROWS_OF_DEPTHS(LaneConvolveFunc, convolve_row)
 
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
@@ -166,18 +164,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-template <class T>
-LaneConvolveFunc<T>* lane_convolve() {
-  ZR_RETURN_BEST(convolve_row<T>());
-  return nullptr;
-}
-template LaneConvolveFunc<ZR_Pixel8>* lane_convolve<ZR_Pixel8>();
-template LaneConvolveFunc<ZR_Pixel16>* lane_convolve<ZR_Pixel16>();
-template LaneConvolveFunc<ZR_PixelFloat>* lane_convolve<ZR_PixelFloat>();
-
-}  // namespace zr
+ZR_LANE_ROWS(LaneConvolveFunc, convolve_row)
 #endif

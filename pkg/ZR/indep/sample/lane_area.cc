@@ -316,9 +316,7 @@ LaneRowFunc<T>* box_row() {
   else
     return nullptr;
 }
-template LaneRowFunc<ZR_Pixel8>* box_row<ZR_Pixel8>();
-template LaneRowFunc<ZR_Pixel16>* box_row<ZR_Pixel16>();
-template LaneRowFunc<ZR_PixelFloat>* box_row<ZR_PixelFloat>();
+ZR_ROWS_OF_DEPTHS(LaneRowFunc, box_row)
 
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
@@ -326,18 +324,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-template <class T>
-LaneRowFunc<T>* lane_box_row() {
-  ZR_RETURN_BEST(box_row<T>());
-  return nullptr;
-}
-template LaneRowFunc<ZR_Pixel8>* lane_box_row<ZR_Pixel8>();
-template LaneRowFunc<ZR_Pixel16>* lane_box_row<ZR_Pixel16>();
-template LaneRowFunc<ZR_PixelFloat>* lane_box_row<ZR_PixelFloat>();
-
-}  // namespace zr
+ZR_LANE_ROWS(LaneRowFunc, box_row)
 #endif

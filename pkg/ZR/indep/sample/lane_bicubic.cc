@@ -111,9 +111,7 @@ const LaneRows<T>* bicubic_rows() {
   }();
   return &rows;
 }
-template const LaneRows<ZR_Pixel8>* bicubic_rows<ZR_Pixel8>();
-template const LaneRows<ZR_Pixel16>* bicubic_rows<ZR_Pixel16>();
-template const LaneRows<ZR_PixelFloat>* bicubic_rows<ZR_PixelFloat>();
+ZR_ROWS_OF_DEPTHS(const LaneRows, bicubic_rows)
 
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
@@ -121,18 +119,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-template <class T>
-const LaneRows<T>* lane_bicubic_rows() {
-  ZR_RETURN_BEST(bicubic_rows<T>());
-  return nullptr;
-}
-template const LaneRows<ZR_Pixel8>* lane_bicubic_rows<ZR_Pixel8>();
-template const LaneRows<ZR_Pixel16>* lane_bicubic_rows<ZR_Pixel16>();
-template const LaneRows<ZR_PixelFloat>* lane_bicubic_rows<ZR_PixelFloat>();
-
-}  // namespace zr
+ZR_LANE_ROWS(const LaneRows, bicubic_rows)
 #endif

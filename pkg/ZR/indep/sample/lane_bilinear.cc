@@ -336,9 +336,7 @@ const LaneRows<T>* bilinear_rows() {
   }();
   return &rows;
 }
-template const LaneRows<ZR_Pixel8>* bilinear_rows<ZR_Pixel8>();
-template const LaneRows<ZR_Pixel16>* bilinear_rows<ZR_Pixel16>();
-template const LaneRows<ZR_PixelFloat>* bilinear_rows<ZR_PixelFloat>();
+ZR_ROWS_OF_DEPTHS(const LaneRows, bilinear_rows)
 
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
@@ -346,18 +344,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-template <class T>
-const LaneRows<T>* lane_bilinear_rows() {
-  ZR_RETURN_BEST(bilinear_rows<T>());
-  return nullptr;
-}
-template const LaneRows<ZR_Pixel8>* lane_bilinear_rows<ZR_Pixel8>();
-template const LaneRows<ZR_Pixel16>* lane_bilinear_rows<ZR_Pixel16>();
-template const LaneRows<ZR_PixelFloat>* lane_bilinear_rows<ZR_PixelFloat>();
-
-}  // namespace zr
+ZR_LANE_ROWS(const LaneRows, bilinear_rows)
 #endif

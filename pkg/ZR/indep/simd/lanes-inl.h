@@ -16,6 +16,8 @@
 #include <limits>
 #include <type_traits>
 
+#include "simd/variant.h"
+
 #ifndef ZR_IN_LANES
 #define ZR_IN_LANES
 #endif

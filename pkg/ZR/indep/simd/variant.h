@@ -23,3 +23,20 @@ enum CpuWord { cpu_sse2 = 2, cpu_sse4 = 6, cpu_avx2 = 7, cpu_avx512 = 8 };
 #else
 #define ZR_RETURN_BEST(...) static_cast<void>(0)
 #endif
+
+// The end of a file of lane rows. The first, inside the namespace of an instruction set, compiles NAME<T>() there for
+// the three depths; the second, compiled once, defines lane_NAME<T>(), which returns what the best compiled set's
+// NAME<T>() does, null where there is none.
+#define ZR_ROWS_OF_DEPTHS(RESULT, NAME)            \
+  template RESULT<ZR_Pixel8>* NAME<ZR_Pixel8>();   \
+  template RESULT<ZR_Pixel16>* NAME<ZR_Pixel16>(); \
+  template RESULT<ZR_PixelFloat>* NAME<ZR_PixelFloat>();
+#define ZR_LANE_ROWS(RESULT, NAME)       \
+  namespace zr {                         \
+  template <class T>                     \
+  RESULT<T>* lane_##NAME() {             \
+    ZR_RETURN_BEST(NAME<T>());           \
+    return nullptr;                      \
+  }                                      \
+  ZR_ROWS_OF_DEPTHS(RESULT, lane_##NAME) \
+  }

@@ -36,9 +36,7 @@ const PremulRows<T>* premul_rows() {
   static constexpr PremulRows<T> rows = {&row<T, false>, &row<T, true>};
   return &rows;
 }
-template const PremulRows<ZR_Pixel8>* premul_rows<ZR_Pixel8>();
-template const PremulRows<ZR_Pixel16>* premul_rows<ZR_Pixel16>();
-template const PremulRows<ZR_PixelFloat>* premul_rows<ZR_PixelFloat>();
+ZR_ROWS_OF_DEPTHS(const PremulRows, premul_rows)
 
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
@@ -46,18 +44,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-template <class T>
-const PremulRows<T>* lane_premul_rows() {
-  ZR_RETURN_BEST(premul_rows<T>());
-  return nullptr;
-}
-template const PremulRows<ZR_Pixel8>* lane_premul_rows<ZR_Pixel8>();
-template const PremulRows<ZR_Pixel16>* lane_premul_rows<ZR_Pixel16>();
-template const PremulRows<ZR_PixelFloat>* lane_premul_rows<ZR_PixelFloat>();
-
-}  // namespace zr
+ZR_LANE_ROWS(const PremulRows, premul_rows)
 #endif
