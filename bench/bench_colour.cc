@@ -3,6 +3,7 @@
 #include <ZR/linear_tables.h>
 #include <ZR/transfer_mode.h>
 
+#include "divided.h"
 #include "workloads.h"
 
 namespace bench {
@@ -45,7 +46,7 @@ void linear_in_front(benchmark::State& state, Size size) {
   const GX_LRect all{0, 0, size.width, size.height};
   const ZR_CompositeModePlus mode(XferInFront, 1.0f, tables.get(), false, 0);
   for (auto _ : state)
-    if (ZR_TransferRect(nullptr, 0, 0, 0, &all, src.get(), &mode, tables.get(), nullptr, 0, 0, dst.get()) != 0)
+    if (transfer_rect(nullptr, 0, 0, 0, &all, src.get(), &mode, tables.get(), nullptr, 0, 0, dst.get()) != 0)
       state.SkipWithError("ZR_TransferRect failed");
   count_bytes<T>(state, size, 3);
 }

@@ -2,6 +2,7 @@
 #include <ZR/callback_block.h>
 #include <ZR/viewer_blit.h>
 
+#include "divided.h"
 #include "workloads.h"
 
 namespace bench {
@@ -90,13 +91,14 @@ void outline(benchmark::State& state, Size size, Layer layer) {
 
 void to_hls(benchmark::State& state, Size size) {
   const auto src = make_world<ZR_Pixel8>(size, Layer::opaque);
-  i32 hls[3];
   for (auto _ : state)
-    for (i32 y = 0; y < size.height; ++y)
+    each_line(size.height, [&](i32 y) {
+      i32 hls[3];
       for (i32 x = 0; x < size.width; ++x) {
         ZR_RGBtoHLS_Straight(nullptr, src->At(x, y), hls);
         benchmark::DoNotOptimize(hls);
       }
+    });
   count_bytes<ZR_Pixel8>(state, size, 1);
 }
 

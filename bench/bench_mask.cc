@@ -3,6 +3,7 @@
 
 #include <algorithm>
 
+#include "divided.h"
 #include "masks.h"
 
 namespace bench {
@@ -33,8 +34,9 @@ void blur(benchmark::State& state, Size size, i32 (*scan)(i32, i32, i32, i32, i3
   const C* const from = static_cast<C*>(*src->data);
   C* const to = static_cast<C*>(*dst->data);
   for (auto _ : state)
-    for (i64 y = 0; y < size.height; ++y)
+    each_line(size.height, [&](i64 y) {
       scan(ZR_UnoScan_Plain, radius << 16, 0, size.width - 1, size.width, from + y * size.width, to + y * size.width);
+    });
   count_values<C>(state, size, 2);
 }
 

@@ -3,6 +3,7 @@
 
 #include <vector>
 
+#include "divided.h"
 #include "placements.h"
 #include "workloads.h"
 
@@ -16,8 +17,8 @@ void transform(benchmark::State& state, Size size, Layer layer, i32 quality, con
   const GX_LRect all{0, 0, size.width, size.height};
   const ZR_CompositeModePlus mode(XferInFront, 1.0f, nullptr, false, 0);
   for (auto _ : state)
-    if (ZR_TransformWorld(nullptr, quality, 0, 0, src.get(), &mode, nullptr, nullptr, matrices.data(),
-                          static_cast<i32>(matrices.size()), true, &all, dst.get()) != 0) {
+    if (transform_world(nullptr, quality, 0, 0, src.get(), &mode, nullptr, nullptr, matrices.data(),
+                        static_cast<i32>(matrices.size()), true, &all, dst.get()) != 0) {
       state.SkipWithError("ZR_TransformWorld failed");
       break;
     }

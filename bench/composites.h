@@ -3,6 +3,7 @@
 
 #include <ZR/transfer_mode.h>
 
+#include "divided.h"
 #include "workloads.h"
 
 namespace bench {
@@ -75,8 +76,8 @@ template <class T>
 bool run_ours(const Composite& work, CompositePictures<T>& pictures) {
   const GX_LRect all{0, 0, pictures.src->width, pictures.src->height};
   const ZR_CompositeModePlus mode(work.xfer, 1.0f, nullptr, false, 0);
-  return ZR_TransferRect(nullptr, 0, 0, 0, &all, pictures.src.get(), &mode, nullptr,
-                         work.masked ? &pictures.mask : nullptr, 0, 0, pictures.dst.get()) == 0;
+  return transfer_rect(nullptr, 0, 0, 0, &all, pictures.src.get(), &mode, nullptr,
+                       work.masked ? &pictures.mask : nullptr, 0, 0, pictures.dst.get()) == 0;
 }
 
 }  // namespace bench
