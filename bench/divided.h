@@ -1,5 +1,5 @@
-// What a host does with ZR_BENCH_THREADS above 1: composites and transforms go in bands over the Hostkit's threads, work
-// on single lines is dealt out by ZR_IterateGeneric. With one thread the calls are the library's own.
+// What a host does with ZR_BENCH_THREADS above 1: composites and transforms go in bands over the Hostkit's threads,
+// work on single lines is dealt out by ZR_IterateGeneric. With one thread the calls are the library's own.
 #pragma once
 
 #include <ZR/hostkit.h>

@@ -8,6 +8,7 @@ target_compile_options(zr_rules INTERFACE
   $<$<BOOL:${ZR_WARNINGS_ARE_ERRORS}>:-Werror>)
 if(ZR_SANITIZE)
   target_compile_options(zr_rules INTERFACE -fsanitize=${ZR_SANITIZE} -fno-omit-frame-pointer -g)
+  target_compile_definitions(zr_rules INTERFACE ZR_SANITIZED)  # no instructions that the sanitizer cannot see
   add_link_options(-fsanitize=${ZR_SANITIZE})  # programs that link products only need it too
   if(ZR_SANITIZE MATCHES "undefined")
     target_compile_options(zr_rules INTERFACE -fno-sanitize-recover=undefined)
