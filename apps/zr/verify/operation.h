@@ -31,9 +31,21 @@ template <class Body>
 void add_all(Operations& list, const std::string& name, Body body) {
   add_for<ZR_Pixel8, ZR_Pixel16, ZR_PixelFloat>(list, name, body);
 }
+// Adds `body.template operator()<Pixel>(Digest&, Content)`: with mixed pixels under its name and, for the depths that
+// have such, with illegal ones as "hostile/NAME".
+template <class... Pixels, class Body>
+void add_with_hostile(Operations& list, const std::string& name, Body body) {
+  const auto add = [&]<class Pixel>(const std::string& full_name, Content content) {
+    add_for<Pixel>(list, full_name,
+                   [body, content]<class T>(Digest& digest) { body.template operator()<T>(digest, content); });
+  };
+  (add.template operator()<Pixels>(name, Content::mixed), ...);
+  ((std::is_same_v<Pixels, ZR_Pixel8> ? void() : add.template operator()<Pixels>("hostile/" + name, Content::hostile)),
+   ...);
+}
 template <class Body>
-void add_8_and_16(Operations& list, const std::string& name, Body body) {
-  add_for<ZR_Pixel8, ZR_Pixel16>(list, name, body);
+void add_all_with_hostile(Operations& list, const std::string& name, Body body) {
+  add_with_hostile<ZR_Pixel8, ZR_Pixel16, ZR_PixelFloat>(list, name, body);
 }
 
 // The entries of one file each.

@@ -57,22 +57,26 @@ constexpr GX_Matrix3 kMatrices[] = {
 
 void add_copy_operations(Operations& list) {
   static constexpr std::span<const Scale> all = kScales;
-  add_all(list, "copy-draft-to-8",
-          []<class T>(Digest& digest) { copies<T, ZR_Pixel8>(digest, &ZR_CopyBits_Draft, Content::mixed, all); });
-  add_all(list, "copy-draft-to-16",
-          []<class T>(Digest& digest) { copies<T, ZR_Pixel16>(digest, &ZR_CopyBits_Draft, Content::mixed, all); });
-  add_all(list, "copy-draft-to-float",
-          []<class T>(Digest& digest) { copies<T, ZR_PixelFloat>(digest, &ZR_CopyBits_Draft, Content::mixed, all); });
-  add_all(list, "copy-high-quality",
-          []<class T>(Digest& digest) { copies<T, T>(digest, &ZR_CopyBits_HQ_Straight, Content::mixed, all); });
+  add_all_with_hostile(list, "copy-draft-to-8", []<class T>(Digest& digest, Content content) {
+    copies<T, ZR_Pixel8>(digest, &ZR_CopyBits_Draft, content, all);
+  });
+  add_all_with_hostile(list, "copy-draft-to-16", []<class T>(Digest& digest, Content content) {
+    copies<T, ZR_Pixel16>(digest, &ZR_CopyBits_Draft, content, all);
+  });
+  add_all_with_hostile(list, "copy-draft-to-float", []<class T>(Digest& digest, Content content) {
+    copies<T, ZR_PixelFloat>(digest, &ZR_CopyBits_Draft, content, all);
+  });
+  add_all_with_hostile(list, "copy-high-quality", []<class T>(Digest& digest, Content content) {
+    copies<T, T>(digest, &ZR_CopyBits_HQ_Straight, content, all);
+  });
   add_for<ZR_Pixel8>(list, "copy-high-quality-premul", []<class T>(Digest& digest) {
     copies<T, T>(digest, &ZR_CopyBits_HQ_Premul, Content::premul, all);
   });
-  add_all(list, "copy-high-quality-to-8", []<class T>(Digest& digest) {  // of equal size
-    copies<T, ZR_Pixel8>(digest, &ZR_CopyBits_HQ_Straight, Content::mixed, all.first(1));
+  add_all_with_hostile(list, "copy-high-quality-to-8", []<class T>(Digest& digest, Content content) {  // of equal size
+    copies<T, ZR_Pixel8>(digest, &ZR_CopyBits_HQ_Straight, content, all.first(1));
   });
-  add_all(list, "matrix-copy", []<class T>(Digest& digest) {
-    Picture<T> src(odd_width, kHeight, Content::mixed, 52);
+  add_all_with_hostile(list, "matrix-copy", []<class T>(Digest& digest, Content content) {
+    Picture<T> src(odd_width, kHeight, content, 52);
     const GX_LRect clip{9, 3, 90, 28};
     for (const GX_Matrix3& matrix : kMatrices)
       for (const bool src2dst : {false, true}) {

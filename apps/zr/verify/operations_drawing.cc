@@ -109,8 +109,8 @@ void planes(Digest& digest) {
 }
 
 template <class T>
-void lines_and_outlines(Digest& digest) {
-  Picture<T> world(odd_width, 43, Content::mixed, 27);
+void lines_and_outlines(Digest& digest, Content content) {
+  Picture<T> world(odd_width, 43, content, 27);
   for (const i32 step : {1, 3}) {
     ZR_Wireframe frame{};
     digest.number(
@@ -146,8 +146,8 @@ void spots(Digest& digest) {
 }
 
 template <class T>
-void viewer(Digest& digest) {
-  Picture<T> src(odd_width, 43, Content::mixed, 31);
+void viewer(Digest& digest, Content content) {
+  Picture<T> src(odd_width, 43, content, 31);
   Picture<ZR_Pixel8> dst(odd_width, 43, Content::untouched);
   const ZR_PixelFloat grey = {0.5f, 0.4f, 0.4f, 0.4f}, pale = {0.75f, 0.9f, 0.7f, 0.5f}, black = {1, 0, 0, 0};
   for (const ZR_SpecialCaseBlitStyle style : {ZR_BlitStyle_Flat, ZR_BlitStyle_Checker, ZR_BlitStyle_Tint})
@@ -161,8 +161,8 @@ void viewer(Digest& digest) {
 }  // namespace
 
 void add_drawing_operations(Operations& list) {
-  add_all(list, "measures", []<class T>(Digest& digest) {
-    measure<T>(digest, pick<T>(kMeasures8, kMeasures16, kMeasuresFloat), Content::mixed);
+  add_all_with_hostile(list, "measures", []<class T>(Digest& digest, Content content) {
+    measure<T>(digest, pick<T>(kMeasures8, kMeasures16, kMeasuresFloat), content);
   });
   add_for<ZR_Pixel8>(list, "measures-premul",
                      []<class>(Digest& digest) { measure(digest, kMeasuresPremul, Content::premul); });
@@ -170,8 +170,10 @@ void add_drawing_operations(Operations& list) {
   add_for<ZR_Pixel8>(list, "black-mattes", []<class>(Digest& digest) { matte_family(digest); });
   add_for<ZR_Pixel8>(list, "planes", []<class>(Digest& digest) { planes(digest); });
   add_for<ZR_Pixel8>(list, "paint-spot", []<class>(Digest& digest) { spots(digest); });
-  add_all(list, "outlines-and-lines", []<class T>(Digest& digest) { lines_and_outlines<T>(digest); });
-  add_all(list, "viewer-blit", []<class T>(Digest& digest) { viewer<T>(digest); });
+  add_all_with_hostile(list, "outlines-and-lines",
+                       []<class T>(Digest& digest, Content content) { lines_and_outlines<T>(digest, content); });
+  add_all_with_hostile(list, "viewer-blit",
+                       []<class T>(Digest& digest, Content content) { viewer<T>(digest, content); });
 }
 
 }  // namespace zr::tool

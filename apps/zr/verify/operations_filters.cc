@@ -12,11 +12,11 @@ constexpr i32 kHeight = 61;
 
 // Every direction and alpha on both sides, with the places of both worlds apart.
 template <class T>
-void blurs(Digest& digest, f32 radius, u32 iterations) {
+void blurs(Digest& digest, f32 radius, u32 iterations, Content content) {
   for (u32 form = 0; form < 16; ++form) {
     const u32 flags = form % 5 == 4 ? 14 : form % 3 == 1 ? 31 : form % 7 == 5 ? 1 : 15;
     const bool down = (form & 1) != 0, premultiplied = (form & 2) != 0;
-    Picture<T> src(odd_width, kHeight, premultiplied ? Content::premul : Content::mixed, 70);
+    Picture<T> src(odd_width, kHeight, premultiplied ? premul_of(content) : content, 70);
     Picture<T> dst(odd_width - 4, kHeight + 3, Content::untouched);
     src->origin = {2, -1};
     i32 error = 0;
@@ -43,8 +43,8 @@ std::vector<i32> noise_taps(i32 count, i32 limit, u64 seed) {
 }
 
 template <class T>
-void convolve(Digest& digest, i32 size, u32 flags, i32 limit) {
-  Picture<T> src(odd_width, kHeight, Content::mixed, 71), dst(odd_width, kHeight, Content::untouched);
+void convolve(Digest& digest, i32 size, u32 flags, i32 limit, Content content) {
+  Picture<T> src(odd_width, kHeight, content, 71), dst(odd_width, kHeight, Content::untouched);
   const i32 count = (flags & ZR_ConvolveFlag_1D) != 0 ? size : size * size;
   std::array<std::vector<i32>, 4> kernels;
   for (u32 k = 0; k < 4; ++k) kernels[k] = noise_taps(count, limit, 72 + k);
@@ -56,20 +56,20 @@ void convolve(Digest& digest, i32 size, u32 flags, i32 limit) {
 }  // namespace
 
 void add_filter_operations(Operations& list) {
-  add_all(list, "blur/box", []<class T>(Digest& digest) {
-    for (const f32 radius : {1.0f, 5.25f, 40.0f}) blurs<T>(digest, radius, 1);
+  add_all_with_hostile(list, "blur/box", []<class T>(Digest& digest, Content content) {
+    for (const f32 radius : {1.0f, 5.25f, 40.0f}) blurs<T>(digest, radius, 1, content);
   });
-  add_all(list, "blur/box-thrice", []<class T>(Digest& digest) {
-    for (const f32 radius : {2.0f, 9.7f}) blurs<T>(digest, radius, 3);
+  add_all_with_hostile(list, "blur/box-thrice", []<class T>(Digest& digest, Content content) {
+    for (const f32 radius : {2.0f, 9.7f}) blurs<T>(digest, radius, 3, content);
   });
-  add_all(list, "blur/gaussian", []<class T>(Digest& digest) {
-    for (const f32 radius : {0.5f, 6.0f, 31.5f}) blurs<T>(digest, radius, 0);
+  add_all_with_hostile(list, "blur/gaussian", []<class T>(Digest& digest, Content content) {
+    for (const f32 radius : {0.5f, 6.0f, 31.5f}) blurs<T>(digest, radius, 0, content);
   });
-  add_all(list, "convolve", []<class T>(Digest& digest) {
+  add_all_with_hostile(list, "convolve", []<class T>(Digest& digest, Content content) {
     for (const u32 flags : {0u, 2u, 6u, 3u, 35u})
       for (const i32 size : {1, 3, 7, 15}) {
-        convolve<T>(digest, size, flags, 60);
-        convolve<T>(digest, size, flags, 100000);  // beyond 16 bits
+        convolve<T>(digest, size, flags, 60, content);
+        convolve<T>(digest, size, flags, 100000, content);  // beyond 16 bits
       }
   });
   add_for<ZR_Pixel8>(list, "gaussian-kernel", []<class>(Digest& digest) {

@@ -14,8 +14,8 @@ const T kMattes[] = {convert_colour<T>(ZR_PixelFloat{1, 0, 0, 0}), convert_colou
                      convert_colour<T>(ZR_PixelFloat{1, 0.5f, 0.25f, 0.875f})};
 
 template <class T>
-void premul_colour(Digest& digest, i32 forward) {
-  Picture<T> src(odd_width, 25, Content::mixed, 4);
+void premul_colour(Digest& digest, i32 forward, Content content) {
+  Picture<T> src(odd_width, 25, content, 4);
   const GX_LRect part{5, 3, 99, 20};
   for (const T& colour : kMattes<T>) {
     Picture<T> dst(odd_width, 25, Content::untouched);
@@ -87,8 +87,8 @@ void byte_tables(Digest& digest) {
 }
 
 template <class T>
-void matte_rows(Digest& digest) {
-  Picture<T> src(odd_width, 4, Content::mixed, 10);
+void matte_rows(Digest& digest, Content content) {
+  Picture<T> src(odd_width, 4, content, 10);
   std::vector<T> out(96);
   for (u32 kind = 0; kind < 4; ++kind)
     for (const i32 offset : {-40, -1, 0, 7, 95, 200}) {
@@ -102,15 +102,15 @@ void matte_rows(Digest& digest) {
 }  // namespace
 
 void add_row_operations(Operations& list) {
-  add_all(list, "premultiply", []<class T>(Digest& digest) {
-    Picture<T> world(odd_width, kBandedHeight, Content::mixed, 4);
+  add_all_with_hostile(list, "premultiply", []<class T>(Digest& digest, Content content) {
+    Picture<T> world(odd_width, kBandedHeight, content, 4);
     const GX_LRect part{3, 20, 90, 25};
     digest.number(ZR_Premul(nullptr, kForward, &world));
     digest.number(ZR_PremulRect(nullptr, kForward, &part, &world));
     world.digest(digest);
   });
-  add_all(list, "unmultiply", []<class T>(Digest& digest) {
-    Picture<T> world(odd_width, kBandedHeight, Content::mixed, 5), premul(odd_width, 30, Content::premul, 6);
+  add_all_with_hostile(list, "unmultiply", []<class T>(Digest& digest, Content content) {
+    Picture<T> world(odd_width, kBandedHeight, content, 5), premul(odd_width, 30, premul_of(content), 6);
     digest.number(ZR_Premul(nullptr, kBack, &world));
     world.digest(digest);
     const GX_LRect part{3, 20, 90, 25};
@@ -119,17 +119,22 @@ void add_row_operations(Operations& list) {
     digest.number(ZR_Premul(nullptr, kBack, &premul));
     premul.digest(digest);
   });
-  add_8_and_16(list, "premultiply-world", []<class T>(Digest& digest) {
-    Picture<T> world(odd_width, 25, Content::mixed, 4);
+  add_with_hostile<ZR_Pixel8, ZR_Pixel16>(list, "premultiply-world", []<class T>(Digest& digest, Content content) {
+    Picture<T> world(odd_width, 25, content, 4);
     world->Premultiply();
     world.digest(digest);
     world->Unmultiply();
     world.digest(digest);
   });
-  add_all(list, "premultiply-colour", []<class T>(Digest& digest) { premul_colour<T>(digest, kForward); });
-  add_all(list, "unmultiply-colour", []<class T>(Digest& digest) { premul_colour<T>(digest, kBack); });
-  add_all(list, "blend", []<class T>(Digest& digest) { blend<T>(digest, &ZR_Blend, Content::mixed); });
-  add_all(list, "blend-premul", []<class T>(Digest& digest) { blend<T>(digest, &ZR_Blend_Premul, Content::premul); });
+  add_all_with_hostile(list, "premultiply-colour",
+                       []<class T>(Digest& digest, Content content) { premul_colour<T>(digest, kForward, content); });
+  add_all_with_hostile(list, "unmultiply-colour",
+                       []<class T>(Digest& digest, Content content) { premul_colour<T>(digest, kBack, content); });
+  add_all_with_hostile(list, "blend",
+                       []<class T>(Digest& digest, Content content) { blend<T>(digest, &ZR_Blend, content); });
+  add_all_with_hostile(list, "blend-premul", []<class T>(Digest& digest, Content content) {
+    blend<T>(digest, &ZR_Blend_Premul, premul_of(content));
+  });
   add_for<ZR_Pixel8>(list, "composite-rect", []<class>(Digest& digest) {
     composite_behind(digest, &ZR_CompositeRectDraft_Straight, Content::mixed);
     composite_behind(digest, &ZR_CompositeRectBest_Straight, Content::mixed);
@@ -156,7 +161,8 @@ void add_row_operations(Operations& list) {
     dst.digest(digest);
   });
   add_for<ZR_Pixel8>(list, "iterate-lut", []<class>(Digest& digest) { byte_tables(digest); });
-  add_8_and_16(list, "matte-rows", []<class T>(Digest& digest) { matte_rows<T>(digest); });
+  add_with_hostile<ZR_Pixel8, ZR_Pixel16>(
+      list, "matte-rows", []<class T>(Digest& digest, Content content) { matte_rows<T>(digest, content); });
 }
 
 }  // namespace zr::tool

@@ -62,22 +62,22 @@ template <class T>
 using Span = i32 (*)(const ZR_ProgressInfo*, i32, i32, i32, const ZR_SampPB*, AlphaSum<T>*, T*);
 
 template <class T>
-void points(Digest& digest, Point<T> sample, i32 margin, Content content = Content::mixed) {
+void points(Digest& digest, Point<T> sample, i32 margin, Content content) {
   at_positions<T>(digest, margin, content, [&](Position at, const ZR_SampPB& params, T* result) {
     return sample(nullptr, at.x, at.y, &params, result);
   });
 }
 template <class T>
-void pluses(Digest& digest, Plus<T> sample) {
-  at_positions<T>(digest, -4, Content::mixed, [&](Position at, const ZR_SampPB& params, T* result) {
+void pluses(Digest& digest, Plus<T> sample, Content content) {
+  at_positions<T>(digest, -4, content, [&](Position at, const ZR_SampPB& params, T* result) {
     u8 all_in = 9;
     const i32 error = sample(nullptr, at.x, at.y, &params, &all_in, result);
     return error * 256 + all_in;
   });
 }
 template <class T>
-void translates(Digest& digest, Translate<T> sample) {
-  at_positions<T>(digest, 2, Content::mixed, [&](Position at, const ZR_SampPB& params, T* result) {
+void translates(Digest& digest, Translate<T> sample, Content content) {
+  at_positions<T>(digest, 2, content, [&](Position at, const ZR_SampPB& params, T* result) {
     f64 weights[4];
     ZR_SubpixelSampleComputeWeight(static_cast<u16>(at.x & 0xffff), static_cast<u16>(at.y & 0xffff), weights);
     return sample(nullptr, at.x, at.y, weights, &params, result);
@@ -85,8 +85,8 @@ void translates(Digest& digest, Translate<T> sample) {
 }
 
 template <class T>
-void spans(Digest& digest, Span<T> sample) {
-  Picture<T> src(kWidth, kHeight, Content::mixed, 32);
+void spans(Digest& digest, Span<T> sample, Content content) {
+  Picture<T> src(kWidth, kHeight, content, 32);
   const ZR_SampPB params = params_of(&src);
   Random random(33);
   for (i32 i = 0; i < 150; ++i) {
@@ -97,7 +97,10 @@ void spans(Digest& digest, Span<T> sample) {
     std::vector<T> results(static_cast<size_t>(count));
     digest.number(sample(nullptr, count, at.x, at.y, &params, &sum, results.data()));
     digest.pixels<T>(results);
-    digest.bytes(&sum, sizeof sum);
+    if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+      digest.floats({&sum, 1});
+    else
+      digest.bytes(&sum, sizeof sum);
   }
 }
 
@@ -159,8 +162,8 @@ void table_means(Digest& digest, const ZR_SummedAreaTable& table, const Entry* e
 }
 
 template <class T>
-void summed_area(Digest& digest) {
-  Picture<T> src(kWidth, kHeight, Content::mixed, 38);
+void summed_area(Digest& digest, Content content) {
+  Picture<T> src(kWidth, kHeight, content, 38);
   const size_t channels = static_cast<size_t>(kWidth) * kHeight * 4;
   for (const bool use_double : {false, true}) {
     const ZR_SummedAreaTable table(&src, use_double);
@@ -177,67 +180,81 @@ void summed_area(Digest& digest) {
 }  // namespace
 
 void add_sample_operations(Operations& list) {
-  add_all(list, "sample-nearest", []<class T>(Digest& digest) {
-    points<T>(digest, pick<T>(&ZR_NNSample, &ZR_NNSample16, &ZR_NNSampleFloat), -4);
+  add_all_with_hostile(list, "sample-nearest", []<class T>(Digest& digest, Content content) {
+    points<T>(digest, pick<T>(&ZR_NNSample, &ZR_NNSample16, &ZR_NNSampleFloat), -4, content);
   });
-  add_all(list, "sample-bilinear", []<class T>(Digest& digest) {
+  add_all_with_hostile(list, "sample-bilinear", []<class T>(Digest& digest, Content content) {
     points<T>(digest, pick<T>(&ZR_SubpixelSample_Straight, &ZR_SubpixelSample_Straight16, &ZR_SubpixelBilinearFloat),
-              -4);
+              -4, content);
   });
-  add_all(list, "sample-bilinear-plus", []<class T>(Digest& digest) {
-    pluses<T>(digest, pick<T>(&ZR_SubpixelSamplePlus_Straight, &ZR_SubpixelSamplePlus_Straight16,
-                              &ZR_SubpixelSpanSampleAllInBilinearFloat));
+  add_all_with_hostile(list, "sample-bilinear-plus", []<class T>(Digest& digest, Content content) {
+    pluses<T>(digest,
+              pick<T>(&ZR_SubpixelSamplePlus_Straight, &ZR_SubpixelSamplePlus_Straight16,
+                      &ZR_SubpixelSpanSampleAllInBilinearFloat),
+              content);
   });
-  add_all(list, "sample-bilinear-no-clip", []<class T>(Digest& digest) {
+  add_all_with_hostile(list, "sample-bilinear-no-clip", []<class T>(Digest& digest, Content content) {
     points<T>(digest,
               pick<T>(&ZR_SubpixelSampleNoClip_Straight, &ZR_SubpixelSampleNoClip_Straight16,
                       &ZR_SubpixelNoClipBilinearFloat),
-              1);
+              1, content);
   });
-  add_all(list, "sample-bilinear-translate", []<class T>(Digest& digest) {
+  add_all_with_hostile(list, "sample-bilinear-translate", []<class T>(Digest& digest, Content content) {
     translates<T>(digest,
                   pick<T>(&ZR_SubpixelSampleTranslateNoClip_Straight, &ZR_SubpixelSampleTranslateNoClip_Straight16,
-                          &ZR_SubpixelSampleTranslateNoClipBilinearFloat));
+                          &ZR_SubpixelSampleTranslateNoClipBilinearFloat),
+                  content);
   });
-  add_all(list, "sample-bilinear-span", []<class T>(Digest& digest) {
-    spans<T>(digest, pick<T>(&ZR_SubpixelSpanSampleTranslateNoClip_Straight,
-                             &ZR_SubpixelSpanSampleTranslateNoClip_Straight16, &ZR_SubpixelSpanSampleBilinearFloat));
+  add_all_with_hostile(list, "sample-bilinear-span", []<class T>(Digest& digest, Content content) {
+    spans<T>(digest,
+             pick<T>(&ZR_SubpixelSpanSampleTranslateNoClip_Straight, &ZR_SubpixelSpanSampleTranslateNoClip_Straight16,
+                     &ZR_SubpixelSpanSampleBilinearFloat),
+             content);
   });
   add_for<ZR_Pixel8>(list, "sample-bilinear-four", []<class>(Digest& digest) { four_at_once(digest); });
   add_for<ZR_Pixel8>(list, "sample-bilinear-premul", []<class T>(Digest& digest) {
     points<T>(digest, &ZR_SubpixelSample_Premul, -4, Content::premul);
   });
-  add_all(list, "sample-bicubic", []<class T>(Digest& digest) {
-    points<T>(digest, pick<T>(&ZR_SubpixelBicubic8, &ZR_SubpixelBicubic16, &ZR_SubpixelBicubicFloat), -4);
+  add_all_with_hostile(list, "sample-bicubic", []<class T>(Digest& digest, Content content) {
+    points<T>(digest, pick<T>(&ZR_SubpixelBicubic8, &ZR_SubpixelBicubic16, &ZR_SubpixelBicubicFloat), -4, content);
   });
-  add_all(list, "sample-bicubic-plus", []<class T>(Digest& digest) {
-    pluses<T>(digest, pick<T>(&ZR_SubpixelSpanSampleAllInBicubic8, &ZR_SubpixelSpanSampleAllInBicubic16,
-                              &ZR_SubpixelSpanSampleAllInBicubicFloat));
+  add_all_with_hostile(list, "sample-bicubic-plus", []<class T>(Digest& digest, Content content) {
+    pluses<T>(digest,
+              pick<T>(&ZR_SubpixelSpanSampleAllInBicubic8, &ZR_SubpixelSpanSampleAllInBicubic16,
+                      &ZR_SubpixelSpanSampleAllInBicubicFloat),
+              content);
   });
-  add_all(list, "sample-bicubic-no-clip", []<class T>(Digest& digest) {
+  add_all_with_hostile(list, "sample-bicubic-no-clip", []<class T>(Digest& digest, Content content) {
     points<T>(digest, pick<T>(&ZR_SubpixelNoClipBicubic8, &ZR_SubpixelNoClipBicubic16, &ZR_SubpixelNoClipBicubicFloat),
-              3);
+              3, content);
   });
-  add_all(list, "sample-bicubic-translate", []<class T>(Digest& digest) {
-    translates<T>(digest, pick<T>(&ZR_SubpixelSampleTranslateNoClipBicubic8, &ZR_SubpixelSampleTranslateNoClipBicubic16,
-                                  &ZR_SubpixelSampleTranslateNoClipBicubicFloat));
+  add_all_with_hostile(list, "sample-bicubic-translate", []<class T>(Digest& digest, Content content) {
+    translates<T>(digest,
+                  pick<T>(&ZR_SubpixelSampleTranslateNoClipBicubic8, &ZR_SubpixelSampleTranslateNoClipBicubic16,
+                          &ZR_SubpixelSampleTranslateNoClipBicubicFloat),
+                  content);
   });
-  add_all(list, "sample-bicubic-span", []<class T>(Digest& digest) {
-    spans<T>(digest, pick<T>(&ZR_SubpixelSpanSampleBicubic8, &ZR_SubpixelSpanSampleBicubic16,
-                             &ZR_SubpixelSpanSampleBicubicFloat));
+  add_all_with_hostile(list, "sample-bicubic-span", []<class T>(Digest& digest, Content content) {
+    spans<T>(
+        digest,
+        pick<T>(&ZR_SubpixelSpanSampleBicubic8, &ZR_SubpixelSpanSampleBicubic16, &ZR_SubpixelSpanSampleBicubicFloat),
+        content);
   });
-  add_8_and_16(list, "sample-area", []<class T>(Digest& digest) {
-    boxes<T>(digest, pick<T>(&ZR_AreaSample_Straight, &ZR_AreaSample_Straight16), Content::mixed);
+  add_with_hostile<ZR_Pixel8, ZR_Pixel16>(list, "sample-area", []<class T>(Digest& digest, Content content) {
+    boxes<T>(digest, pick<T>(&ZR_AreaSample_Straight, &ZR_AreaSample_Straight16), content);
   });
   add_for<ZR_Pixel8>(list, "sample-area-premul",
                      []<class T>(Digest& digest) { boxes<T>(digest, &ZR_AreaSample_Premul, Content::premul); });
-  add_all(list, "sample-area-bilinear",
-          []<class T>(Digest& digest) { boxes<T>(digest, &ZR_AreaSample_CPlusPlus<T, 1>, Content::mixed); });
-  add_all(list, "sample-area-bicubic",
-          []<class T>(Digest& digest) { boxes<T>(digest, &ZR_AreaSample_CPlusPlus<T, 2>, Content::mixed); });
-  add_all(list, "summed-area", []<class T>(Digest& digest) { summed_area<T>(digest); });
-  add_all(list, "horizontal-sums", []<class T>(Digest& digest) {
-    Picture<T> src(kWidth, kHeight, Content::mixed, 40);
+  add_all_with_hostile(list, "sample-area-bilinear", []<class T>(Digest& digest, Content content) {
+    boxes<T>(digest, &ZR_AreaSample_CPlusPlus<T, 1>, content);
+  });
+  add_all_with_hostile(list, "sample-area-bicubic", []<class T>(Digest& digest, Content content) {
+    boxes<T>(digest, &ZR_AreaSample_CPlusPlus<T, 2>, content);
+  });
+  add_all_with_hostile(list, "summed-area",
+                       []<class T>(Digest& digest, Content content) { summed_area<T>(digest, content); });
+  add_all_with_hostile(list, "horizontal-sums", []<class T>(Digest& digest, Content content) {
+    Picture<T> src(kWidth, kHeight, content, 40);
     const ZR_HorizontalSumTable<T> table(&src, 50, 40, 1.5, 3.5, 2.0, 1.0, 1.0, 0.0, false, nullptr, nullptr);
     digest.number(table.PaddingX());
     for (i32 y = 0; y < kHeight; ++y)

@@ -26,18 +26,18 @@ i32 transfer(const Transfer& how, Picture<T>& src, const GX_LRect& rect, i32 x, 
 
 // The whole picture over a mixed and an opaque one, and rows of every length up to two vectors of bytes.
 template <class T>
-void over_pictures(Digest& digest, const Transfer& how) {
-  Picture<T> src(odd_width, kHeight, Content::mixed, 20);
-  for (const Content content : {Content::mixed, Content::opaque}) {
-    Picture<T> dst(odd_width, kHeight, content, 21);
+void over_pictures(Digest& digest, Content content, const Transfer& how) {
+  Picture<T> src(odd_width, kHeight, content, 20);
+  for (const Content under : {content, Content::opaque}) {
+    Picture<T> dst(odd_width, kHeight, under, 21);
     digest.number(transfer(how, src, src.all(), 0, 0, dst));
     dst.digest(digest);
   }
 }
 template <class T>
-void over_short_rows(Digest& digest, const Transfer& how) {
+void over_short_rows(Digest& digest, Content content, const Transfer& how) {
   constexpr i32 widths[] = {1, 2, 3, 4, 5, 7, 8, 9, 15, 16, 17, 31, 33};
-  Picture<T> src(odd_width, kHeight, Content::mixed, 22), dst(odd_width, kHeight, Content::mixed, 23);
+  Picture<T> src(odd_width, kHeight, content, 22), dst(odd_width, kHeight, content, 23);
   i32 y = 0;
   for (const i32 width : widths) {
     digest.number(transfer(how, src, {y, y, y + width, y + 1}, 2 * y, y, dst));
@@ -47,12 +47,12 @@ void over_short_rows(Digest& digest, const Transfer& how) {
 }
 
 template <class T>
-void transfer_plain(Digest& digest, i32 mode) {
-  over_pictures<T>(digest, {{mode, 1.0f, nullptr, false, kSeed}});
-  over_short_rows<T>(digest, {{mode, 1.0f, nullptr, false, kSeed}});
-  over_pictures<T>(digest, {{mode, 0.6f, nullptr, false, kSeed}});
-  over_pictures<T>(digest, {{mode, 0.8f, nullptr, true, kSeed}, nullptr, nullptr, 1});
-  over_pictures<T>(digest, {{mode, 0.0f, nullptr, false, kSeed}, nullptr, nullptr, 2});
+void transfer_plain(Digest& digest, i32 mode, Content content) {
+  over_pictures<T>(digest, content, {{mode, 1.0f, nullptr, false, kSeed}});
+  over_short_rows<T>(digest, content, {{mode, 1.0f, nullptr, false, kSeed}});
+  over_pictures<T>(digest, content, {{mode, 0.6f, nullptr, false, kSeed}});
+  over_pictures<T>(digest, content, {{mode, 0.8f, nullptr, true, kSeed}, nullptr, nullptr, 1});
+  over_pictures<T>(digest, content, {{mode, 0.0f, nullptr, false, kSeed}, nullptr, nullptr, 2});
 }
 
 template <class T>
@@ -66,25 +66,25 @@ ZR_MaskWorld mask_of(Picture<T>& picture, u32 kind, i32 x, i32 y) {
 }
 
 template <class T>
-void transfer_masked(Digest& digest, i32 mode, const ZR_LinearBlendingTables* tables) {
-  Picture<T> picture(odd_width, kHeight, Content::mixed, 24);
+void transfer_masked(Digest& digest, i32 mode, Content content, const ZR_LinearBlendingTables* tables) {
+  Picture<T> picture(odd_width, kHeight, content, 24);
   for (u32 kind = 0; kind < 4; ++kind) {
     const i32 shift = static_cast<i32>(kind) * 3;
     const ZR_MaskWorld mask = mask_of(picture, kind, shift, shift / 3);
-    over_pictures<T>(digest, {{mode, kind == 1 ? 0.7f : 1.0f, nullptr, kind == 2, kSeed}, tables, &mask});
+    over_pictures<T>(digest, content, {{mode, kind == 1 ? 0.7f : 1.0f, nullptr, kind == 2, kSeed}, tables, &mask});
   }
 }
 
 template <class T>
-void transfer_linear(Digest& digest, i32 mode) {
+void transfer_linear(Digest& digest, i32 mode, Content content) {
   const ZR_LinearBlendingTables* const tables = &square_tables();
-  over_pictures<T>(digest, {{mode, 1.0f, nullptr, false, kSeed}, tables});
-  over_short_rows<T>(digest, {{mode, 0.6f, nullptr, false, kSeed}, tables});
-  transfer_masked<T>(digest, mode, tables);
+  over_pictures<T>(digest, content, {{mode, 1.0f, nullptr, false, kSeed}, tables});
+  over_short_rows<T>(digest, content, {{mode, 0.6f, nullptr, false, kSeed}, tables});
+  transfer_masked<T>(digest, mode, content, tables);
 }
 
 template <class T>
-void single_pixels(Digest& digest, i32 mode) {
+void single_pixels(Digest& digest, i32 mode, Content content) {
   constexpr const ZR_LinearBlendingTables* stored = nullptr;
   const auto plain = pick<T>(&ZR_Get_Xfer1_table8, &ZR_Get_Xfer1_table16, &ZR_Get_Xfer1_tableF)(mode);
   const auto faint =
@@ -93,7 +93,7 @@ void single_pixels(Digest& digest, i32 mode) {
       pick<T>(&ZR_Get_Xfer1_Opacity2_table8, &ZR_Get_Xfer1_Opacity2_table16, &ZR_Get_Xfer1_Opacity2_tableF)(mode);
   const T opacity = convert_colour<T>(ZR_PixelFloat{0.5f, 0.9f, 0, 0});
   for (const auto* tables : {stored, &square_tables()}) {
-    Picture<T> src(odd_width, 3, Content::mixed, 25), dst(odd_width, 3, Content::mixed, 26);
+    Picture<T> src(odd_width, 3, content, 25), dst(odd_width, 3, content, 26);
     for (i32 x = 0; x < odd_width; ++x) {
       if (plain != nullptr) plain(*src->At(x, 0), tables, dst->At(x, 0));
       if (faint != nullptr) faint(*src->At(x, 1), tables, opacity.alpha, dst->At(x, 1));
@@ -111,11 +111,18 @@ void add_transfer_operations(Operations& list) {
   for (const ZR_TransferModeInfo& info : std::span(modes, static_cast<size_t>(count))) {
     const i32 mode = info.mode;
     const std::string name = info.short_name;
-    add_all(list, "transfer/" + name, [mode]<class T>(Digest& digest) { transfer_plain<T>(digest, mode); });
-    add_all(list, "transfer-mask/" + name,
-            [mode]<class T>(Digest& digest) { transfer_masked<T>(digest, mode, nullptr); });
-    add_all(list, "transfer-linear/" + name, [mode]<class T>(Digest& digest) { transfer_linear<T>(digest, mode); });
-    if (mode >= 0) add_all(list, "pixel/" + name, [mode]<class T>(Digest& digest) { single_pixels<T>(digest, mode); });
+    add_all_with_hostile(list, "transfer/" + name, [mode]<class T>(Digest& digest, Content content) {
+      transfer_plain<T>(digest, mode, content);
+    });
+    add_all_with_hostile(list, "transfer-mask/" + name, [mode]<class T>(Digest& digest, Content content) {
+      transfer_masked<T>(digest, mode, content, nullptr);
+    });
+    add_all_with_hostile(list, "transfer-linear/" + name, [mode]<class T>(Digest& digest, Content content) {
+      transfer_linear<T>(digest, mode, content);
+    });
+    if (mode < 0) continue;
+    add_all_with_hostile(list, "pixel/" + name,
+                         [mode]<class T>(Digest& digest, Content content) { single_pixels<T>(digest, mode, content); });
   }
 }
 

@@ -74,21 +74,22 @@ struct Drawing {
 
 template <class T>
 void draw(Digest& digest, const Drawing& how, const std::vector<GX_Matrix3>& matrices, Content content) {
-  Picture<T> src(odd_width, kHeight, content, 60), dst(odd_width, kHeight, Content::mixed, 61);
+  Picture<T> src(odd_width, kHeight, content, 60),
+      dst(odd_width, kHeight, content == Content::opaque ? Content::mixed : content, 61);
   digest.number(ZR_TransformWorld(nullptr, how.quality, 0, how.field, &src, &how.mode, how.tables, how.mask,
                                   matrices.data(), static_cast<i32>(matrices.size()), true, &how.area, &dst));
   dst.digest(digest);
 }
 
 template <class T>
-void in_every_quality(Digest& digest, const std::vector<GX_Matrix3>& matrices) {
-  for (const i32 quality : {0, 1, 2, 3}) draw<T>(digest, {quality}, matrices, Content::mixed);
+void in_every_quality(Digest& digest, const std::vector<GX_Matrix3>& matrices, Content content) {
+  for (const i32 quality : {0, 1, 2, 3}) draw<T>(digest, {quality}, matrices, content);
   draw<T>(digest, {1}, matrices, Content::opaque);
 }
 
 template <class T>
-void with_masks(Digest& digest, const std::vector<GX_Matrix3>& matrices) {
-  Picture<T> picture(odd_width, kHeight, Content::mixed, 62);
+void with_masks(Digest& digest, const std::vector<GX_Matrix3>& matrices, Content content) {
+  Picture<T> picture(odd_width, kHeight, content, 62);
   for (u32 kind = 0; kind < 4; ++kind) {
     ZR_MaskWorld mask{};
     picture->FillOutEffectWorld(&mask.world);
@@ -96,7 +97,7 @@ void with_masks(Digest& digest, const std::vector<GX_Matrix3>& matrices) {
     mask.offset_y = static_cast<i32>(kind);
     mask.kind = kind;
     const ZR_CompositeModePlus mode(kind == 3 ? XferScreen : XferInFront, kind == 2 ? 0.4f : 1.0f, nullptr, false, 0);
-    draw<T>(digest, {.mask = &mask, .mode = mode}, matrices, Content::mixed);
+    draw<T>(digest, {.mask = &mask, .mode = mode}, matrices, content);
   }
 }
 
@@ -104,25 +105,26 @@ void with_masks(Digest& digest, const std::vector<GX_Matrix3>& matrices) {
 
 void add_transform_operations(Operations& list) {
   for (const Placement& place : placements())
-    add_all(list, std::string("transform/") + place.name,
-            [&place]<class T>(Digest& digest) { in_every_quality<T>(digest, place.matrices); });
-  add_all(list, "transform-mask", []<class T>(Digest& digest) {
-    with_masks<T>(digest, {around(kTurned)});
-    with_masks<T>(digest, motion(kStill, kSheared, 3));
+    add_all_with_hostile(
+        list, std::string("transform/") + place.name,
+        [&place]<class T>(Digest& digest, Content content) { in_every_quality<T>(digest, place.matrices, content); });
+  add_all_with_hostile(list, "transform-mask", []<class T>(Digest& digest, Content content) {
+    with_masks<T>(digest, {around(kTurned)}, content);
+    with_masks<T>(digest, motion(kStill, kSheared, 3), content);
   });
-  add_all(list, "transform-fields", []<class T>(Digest& digest) {
+  add_all_with_hostile(list, "transform-fields", []<class T>(Digest& digest, Content content) {
     for (const i32 field : {1, 2})
       for (const Affine& place : {kTurned, Affine{1, 0, 0, 1, 7.5, 2.5}, Affine{0.37, 0, 0, 0.37, 0, 0}})
-        draw<T>(digest, {.field = field, .area = {9, 3, 100, 31}}, {around(place)}, Content::mixed);
+        draw<T>(digest, {.field = field, .area = {9, 3, 100, 31}}, {around(place)}, content);
   });
-  add_all(list, "transform-linear", []<class T>(Digest& digest) {
-    draw<T>(digest, {.tables = &square_tables()}, {around(kTurned)}, Content::mixed);
-    draw<T>(digest, {.tables = &square_tables()}, motion(kStill, kSheared, 3), Content::mixed);
+  add_all_with_hostile(list, "transform-linear", []<class T>(Digest& digest, Content content) {
+    draw<T>(digest, {.tables = &square_tables()}, {around(kTurned)}, content);
+    draw<T>(digest, {.tables = &square_tables()}, motion(kStill, kSheared, 3), content);
   });
-  add_all(list, "transform-modes", []<class T>(Digest& digest) {
+  add_all_with_hostile(list, "transform-modes", []<class T>(Digest& digest, Content content) {
     for (const i32 mode : {+XferCopy, +XferBehind, +XferDissolve, +XferMultiply, +XferHue, +XferAlphaAdd}) {
       const ZR_CompositeModePlus how(mode, 0.75f, nullptr, mode == XferMultiply, 77);
-      draw<T>(digest, {.mode = how}, {around(kSheared)}, Content::mixed);
+      draw<T>(digest, {.mode = how}, {around(kSheared)}, content);
     }
   });
 }

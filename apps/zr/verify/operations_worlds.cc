@@ -40,33 +40,35 @@ class Shifted {
 struct Conversion {
   bool dither = false;
   std::vector<size_t> shifts = {0, 1};  // of the source rows
+  bool vector_rule = false;
 };
 template <class From, class To>
 void add_conversion(Operations& list, const char* name, const Conversion& how) {
-  list.push_back({name, Depth<From>::bits, [how](Digest& digest) {
-                    Picture<From> picture(odd_width, 25, Content::mixed, 11);
-                    for (const size_t shift : how.shifts) {
-                      Shifted<From> src(picture, shift);
-                      Picture<To> dst(odd_width, 25, Content::untouched);
-                      dst->CopyRectPossiblyDifferentBitdepth(&src, picture.all(), how.dither, 0, 0, nullptr);
-                      for (const GX_LRect& rect : kRects)  // most of these begin where no vector does
-                        dst->CopyRectPossiblyDifferentBitdepth(&src, rect, how.dither, rect.top, rect.left / 5,
-                                                               nullptr);
-                      for (const i32 field : {0, 1, 2})
-                        if (how.dither) dst->CopyRectPossiblyDifferentBitdepthWithField(&src, kRects[4], field);
-                      dst.digest(digest);
-                    }
-                  }});
+  const size_t before = list.size();
+  add_with_hostile<From>(list, name, [how]<class>(Digest& digest, Content content) {
+    Picture<From> picture(odd_width, 25, content, 11);
+    for (const size_t shift : how.shifts) {
+      Shifted<From> src(picture, shift);
+      Picture<To> dst(odd_width, 25, Content::untouched);
+      dst->CopyRectPossiblyDifferentBitdepth(&src, picture.all(), how.dither, 0, 0, nullptr);
+      for (const GX_LRect& rect : kRects)  // most of these begin where no vector does
+        dst->CopyRectPossiblyDifferentBitdepth(&src, rect, how.dither, rect.top, rect.left / 5, nullptr);
+      for (const i32 field : {0, 1, 2})
+        if (how.dither) dst->CopyRectPossiblyDifferentBitdepthWithField(&src, kRects[4], field);
+      dst.digest(digest);
+    }
+  });
+  for (size_t i = before; i < list.size(); ++i) list[i].vector_rule = how.vector_rule;
 }
 
 template <class From, class To>
 void add_linear_conversion(Operations& list, const char* name) {
-  list.push_back({name, Depth<From>::bits, [](Digest& digest) {
-                    Picture<From> src(odd_width, 43, Content::mixed, 12);
-                    Picture<To> dst(odd_width, 43, Content::untouched);
-                    ZR_DepthConvertWorld(square_tables().to_linear, &src, &dst);
-                    dst.digest(digest);
-                  }});
+  add_with_hostile<From>(list, name, []<class>(Digest& digest, Content content) {
+    Picture<From> src(odd_width, 43, content, 12);
+    Picture<To> dst(odd_width, 43, Content::untouched);
+    ZR_DepthConvertWorld(square_tables().to_linear, &src, &dst);
+    dst.digest(digest);
+  });
 }
 
 template <class To>
@@ -122,8 +124,8 @@ void add_world_operations(Operations& list) {
     world->FillAlpha();
     world.digest(digest);
   });
-  add_all(list, "invert-alpha", []<class T>(Digest& digest) {
-    Picture<T> world(odd_width, 25, Content::mixed);
+  add_all_with_hostile(list, "invert-alpha", []<class T>(Digest& digest, Content content) {
+    Picture<T> world(odd_width, 25, content);
     world->InvertAlpha();
     world.digest(digest);
   });
@@ -156,11 +158,9 @@ void add_world_operations(Operations& list) {
   add_conversions_to<ZR_PixelFloat>(list, "convert-to-float", "depth-convert-to-float");
   add_conversion<ZR_Pixel16, ZR_Pixel8>(list, "convert-to-8-dithered", {.dither = true});
   add_conversion<ZR_PixelFloat, ZR_Pixel8>(list, "convert-to-8-dithered", {.dither = true, .shifts = {1}});
-  for (const bool dither : {false, true}) {
+  for (const bool dither : {false, true})
     add_conversion<ZR_PixelFloat, ZR_Pixel8>(list, dither ? "convert-to-8-dithered-aligned" : "convert-to-8-aligned",
-                                             {dither, {0}});
-    list.back().vector_rule = true;
-  }
+                                             {dither, {0}, true});
 }
 
 }  // namespace zr::tool

@@ -1,6 +1,8 @@
 // The fixed inputs of `zr verify`.
 #include "verify/pictures.h"
 
+#include <limits>
+
 namespace zr::tool {
 
 u32 Random::next() {
@@ -25,6 +27,20 @@ inline constexpr f32 edge_values<ZR_PixelFloat>[] = {0.0f,          1.0f,     0.
                                                      0x1p-24f,      0.75f,    0.001f, 1.25f,  -0.25f,         3.5f,
                                                      0x1.000002p0f, 1.0e-30f, 0.125f, 0.9375f};
 
+// What no picture should hold.
+template <class T>
+inline constexpr Channel<T> hostile_values[] = {0};
+template <>
+inline constexpr u16 hostile_values<ZR_Pixel16>[] = {32769, 32770, 33000, 40960, 49151, 49152, 65280, 65534, 65535};
+using Reals = std::numeric_limits<f32>;
+template <>
+inline constexpr f32 hostile_values<ZR_PixelFloat>[] = {Reals::quiet_NaN(), Reals::infinity(), -Reals::infinity(),
+                                                        Reals::max(),       -Reals::max(),     Reals::denorm_min(),
+                                                        -0x1p-140f,         Reals::min(),      -0.0f,
+                                                        2147483648.0f,      -1.0e20f,          65536.0f,
+                                                        -32769.0f,          -0x1p-24f,         2.0f,
+                                                        0x1.fffffcp+127f,   1.0e18f,           -1.0f};
+
 template <class T>
 Channel<T> any_channel(Random& random) {
   if constexpr (std::is_same_v<T, ZR_PixelFloat>)
@@ -35,6 +51,18 @@ Channel<T> any_channel(Random& random) {
 template <class T>
 Channel<T> edge_channel(Random& random) {
   return edge_values<T>[random.below(static_cast<u32>(std::size(edge_values<T>)))];
+}
+template <class T>
+Channel<T> hostile_channel(Random& random) {
+  return hostile_values<T>[random.below(static_cast<u32>(std::size(hostile_values<T>)))];
+}
+// Anything that fits 16 bits, or floats on both sides of what is legal.
+template <class T>
+Channel<T> wide_channel(Random& random) {
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+    return any_channel<T>(random) * 4 - 1.5f;
+  else
+    return static_cast<Channel<T>>(random.next());
 }
 template <class T>
 T coloured(Channel<T> alpha, Random& random) {
@@ -68,6 +96,35 @@ T pixel_of(Kind kind, Random& random) {
   }
 }
 
+// Legal pixels, those with one channel that is not, and those with nothing legal.
+template <class T>
+T hostile_pixel(Kind kind, Random& random) {
+  const auto all = [&](auto channel) {
+    const Channel<T> a = channel(), r = channel(), g = channel();
+    return T{a, r, g, channel()};
+  };
+  const auto wide = [&] { return wide_channel<T>(random); };
+  const auto hostile = [&] { return hostile_channel<T>(random); };
+  switch (kind) {
+    case kOpaque:
+    case kNoise:
+    case kEdges: return pixel_of<T>(kind, random);
+    case kClear: return all(wide);
+    case kHidden: {  // illegal colour under alpha 0
+      T pixel = all(wide);
+      pixel.alpha = 0;
+      return pixel;
+    }
+    case kGrey: return all(hostile);
+    default: {
+      T pixel = pixel_of<T>(kNoise, random);
+      Channel<T>* const channels[] = {&pixel.alpha, &pixel.red, &pixel.green, &pixel.blue};
+      *channels[random.below(4)] = hostile();
+      return pixel;
+    }
+  }
+}
+
 template <class T>
 T premultiplied(const T& p) {
   const auto times = [&](Channel<T> c) { return static_cast<Channel<T>>(Depth<T>::mul(c, p.alpha)); };
@@ -85,6 +142,7 @@ class Source {
       case Content::noise: return pixel_of<T>(kNoise, random_);
       case Content::premul: return premultiplied(pixel_of<T>(run_kind(), random_));
       case Content::mixed: return pixel_of<T>(run_kind(), random_);
+      case Content::hostile: return hostile_pixel<T>(run_kind(), random_);
       case Content::untouched: break;
     }
     return T{1, 2, 3, 4};

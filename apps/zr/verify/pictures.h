@@ -27,8 +27,11 @@ enum class Content {
   opaque,     // alpha white, any colour
   noise,      // any alpha, any colour
   premul,     // colour at most alpha
+  hostile,    // runs of legal pixels and of those with some or all channels illegal: above white, or NaN, infinite...
   untouched,  // what results are written onto: one pixel everywhere
 };
+// What an operation on premultiplied pixels reads in place of mixed ones.
+constexpr Content premul_of(Content content) { return content == Content::mixed ? Content::premul : content; }
 
 // A world over memory of our own, with guard pixels between and behind the rows. Rows begin at all
 // places that their pixels allow within 16 bytes, since alignment may choose the code.
