@@ -5,9 +5,11 @@
 #include <algorithm>
 #include <cstdlib>
 #include <limits>
+#include <optional>
 #include <type_traits>
 
 #include "filter/convolve_rows.h"
+#include "filter/float_bands.h"
 #include "world/guard.h"
 
 namespace zr {
@@ -159,6 +161,33 @@ class LaneTaps {
   LaneConvolution<T> work_ = {};
 };
 
+// Rows of a destination from the first on: one at a time where the host is asked after each, else as it is fastest.
+template <class T>
+class RowsInTurn {
+ public:
+  RowsInTurn(const Convolution<T>& c, const ZR_LayerDef& dst, bool one_by_one) : dst_(dst), one_by_one_(one_by_one) {
+    if constexpr (banded) bands_.emplace(c);
+    if (!banded || !*bands_) rows_.emplace(c);
+  }
+  void make(i32 y) {
+    char* const row = static_cast<char*>(dst_.data) + static_cast<i64>(y) * dst_.row_bytes;
+    if (rows_) return rows_->row(y, dst_.width, reinterpret_cast<T*>(row));
+    if constexpr (banded) {
+      if (y < made_) return;
+      made_ = one_by_one_ ? y + 1 : dst_.height;
+      bands_->make(y, made_, dst_.width, row, dst_.row_bytes);
+    }
+  }
+
+ private:
+  static constexpr bool banded = std::is_same_v<T, ZR_PixelFloat>;
+  const ZR_LayerDef& dst_;
+  bool one_by_one_;
+  std::optional<FloatBands> bands_;
+  std::optional<LaneTaps<T>> rows_;
+  i32 made_ = 0;
+};
+
 template <class T>
 i32 convolve(const ZR_ProgressInfo* progress, const ZR_LayerDef* src, u32 flags, i32 size, const i32* a, const i32* r,
              const i32* g, const i32* b, ZR_LayerDef* dst) {
@@ -180,13 +209,13 @@ i32 convolve(const ZR_ProgressInfo* progress, const ZR_LayerDef* src, u32 flags,
   if (!find_divisors(&c, (flags & ZR_ConvolveFlag_Normalised) != 0))
     return failed_verification(ZR_Site_Convolve, "sums of a kernel of ZR_Convolve do not fit 64 bits");
 
-  LaneTaps<T> rows(c);
+  const bool polled = progress != nullptr && progress->progress != nullptr;
+  RowsInTurn<T> rows(c, *dst, polled);
   i64 work = 0;
   for (i32 y = 0; y < dst->height; ++y) {
-    T* const row = reinterpret_cast<T*>(static_cast<char*>(dst->data) + static_cast<i64>(y) * dst->row_bytes);
-    rows.row(y, dst->width, row);
+    rows.make(y);
     work += static_cast<i64>(c.width) * c.height * dst->width;
-    if (progress == nullptr || progress->progress == nullptr || work < taps_before_poll) continue;
+    if (!polled || work < taps_before_poll) continue;
     if (const i32 stop = progress->progress(progress->refcon, y + 1, dst->height); stop != 0) return stop;
     work = 0;
   }
