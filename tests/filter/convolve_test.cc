@@ -61,6 +61,7 @@ Taps taps_of(i32 count, i32 low, i32 high, u32 seed) {
 
 template <class T>
 class Convolutions : public BornLibrary {};
+using Filters = BornLibrary;
 using Depths = testing::Types<ZR_Pixel8, ZR_Pixel16, ZR_PixelFloat>;
 TYPED_TEST_SUITE(Convolutions, Depths);
 
@@ -126,6 +127,56 @@ TYPED_TEST(Convolutions, TablesAndOuterProducts) {
   }
 }
 
+// Floats that are whole multiples of a quantum, as those from 16 bits are, have exact sums, found another way; single
+// pixels that are not, and other levels, change that from one part of a picture to the next.
+TEST_F(Filters, ConvolutionsOfWholeMultiples) {
+  constexpr f32 nan = std::numeric_limits<f32>::quiet_NaN();
+  struct Spot {
+    i32 x, y;
+    f32 value;
+  };
+  const std::vector<Spot> spots[] = {{},
+                                     {{140, 20, 0.1f}},
+                                     {{0, 0, nan}, {299, 69, 0.7f}},
+                                     {{5, 30, 1000.0f}, {200, 2, -0.0f}},
+                                     {{5, 5, 1.25f}, {6, 50, 0x1p-40f}, {150, 68, INFINITY}}};
+  struct Kernel {
+    i32 size, low, high;
+    u32 flags;
+    bool mirrored;
+  };
+  // Divisors are small, have more than 20 bits, and are negative.
+  const Kernel kernels[] = {{3, 0, 255, 2, true},         {5, -60, 90, 2, true},   {7, 0, 31, 0, false},
+                            {15, 0, 255, 2, true},        {9, -128, 127, 3, true}, {9, 0, 128, 35, false},
+                            {3, 131000, 131072, 2, true}, {5, -4, -1, 2, false}};
+  for (int level = 0; level < 4 && Instructions::has(level); ++level) {
+    const Instructions instructions(level);
+    for (const Kernel& kernel : kernels) {
+      const i32 side = kernel.size, rows = (kernel.flags & 1) != 0 ? 1 : side;
+      Taps taps[4];
+      for (u32 k = 0; k < 4; ++k) {
+        taps[k] = taps_of(side * rows, kernel.low, kernel.high, 3 + k);
+        for (i32 i = 0; kernel.mirrored && i < side * rows; ++i)
+          taps[k][static_cast<size_t>(i)] = taps[k][static_cast<size_t>(i / side * side + side - 1 - i % side)];
+      }
+      for (const auto& places : spots) {
+        TestWorld<ZR_PixelFloat> src(300, 70), made(302, 71), expected(302, 71);
+        std::mt19937 random(8);
+        const auto channel = [&] { return static_cast<f32>(random() % 65537) * 0x1p-16f; };
+        for (i32 y = 0; y < 70; ++y)
+          for (i32 x = 0; x < 300; ++x) src.at(x, y) = {channel(), channel(), channel(), y < 40 ? 0 : -channel()};
+        for (const Spot& spot : places) src.at(spot.x, spot.y).green = spot.value;
+        ASSERT_EQ(ZR_Convolve(nullptr, src, nullptr, kernel.flags, side, taps[0].data(), taps[1].data(), taps[2].data(),
+                              taps[3].data(), made),
+                  0);
+        model_convolve(src, kernel.flags, side, taps, expected);
+        ASSERT_TRUE(made == expected) << Instructions::names[level] << " size " << side << " taps from " << kernel.low
+                                      << ", " << places.size() << " spots";
+      }
+    }
+  }
+}
+
 TYPED_TEST(Convolutions, ProgressIsToldAfterEnoughTaps) {
   using T = TypeParam;
   struct Host {
@@ -164,8 +215,6 @@ TYPED_TEST(Convolutions, ProgressIsToldAfterEnoughTaps) {
     }
   }
 }
-
-using Filters = BornLibrary;
 
 TEST_F(Filters, ConvolveRefuses) {
   TestWorld<ZR_Pixel8> src(4, 4), dst(4, 4);

@@ -5,8 +5,12 @@
 #include <ZR/errors.h>
 
 #include <algorithm>
+#include <bit>
+#include <cmath>
+#include <cstdlib>
 #include <cstring>
 
+#include "filter/short_quotient.h"
 #include "world/guard.h"
 
 namespace zr {
@@ -45,14 +49,19 @@ class Plan {
     weights_ = cutter.take<f32>(4 * taps);
     places_ = cutter.take<i32>(taps);
     fewer_places_ = cutter.take<i32>(taps);
+    kinds_ = cutter.take<FloatBand::Group>(c.height);
+    order_ = cutter.take<i32>(c.height);
+    term_weights_ = cutter.take<f32>(4 * taps);
     padded_ = cutter.take<f32>(4 * (most_strip + c.width));
     const i64 most_made = std::max(c.width, most_shared);
-    blocks_ = cutter.take<char>(block_bytes(most_strip, most_made));
+    blocks_ = cutter.take<char>(std::max(block_bytes(most_strip, most_made), exact_bytes()));
     bytes_ = cutter.used();
   }
   i64 bytes() const { return bytes_; }
 
   void fill(FloatBand* band) {
+    find_kinds();
+    find_exact(&band->exact);
     if (!share_among_all()) share_among_rows();
     i32 most_made = 1;
     for (i32 g = 0; g < group_count_; ++g)
@@ -78,7 +87,7 @@ class Plan {
 
  private:
   // Blocks whose addresses have the same last 12 bits would wait for each other.
-  static i64 spread(i64 places) { return (places + 52) / 64 * 64 + 11; }
+  static constexpr i64 spread(i64 places) { return (places + 52) / 64 * 64 + 11; }
   i64 product_pixels(i32 strip) const { return strip / halves_ + c_.width - 1; }
   i64 near_bytes(i32 strip, i64 products) const {
     return pixel_bytes * halves_ * (products * product_pixels(strip) + i64{c_.height} * strip / halves_);
@@ -86,6 +95,10 @@ class Plan {
   i64 block_bytes(i32 strip, i64 products) const {
     return pixel_bytes * halves_ * (products * spread(product_pixels(strip)) + c_.height * spread(strip / halves_));
   }
+  i64 exact_samples() const { return (c_.width + 1) * exact_samples_place(); }
+  i64 exact_samples_place() const { return 16 * spread((most_strip + c_.width - 1) / 4 + 1); }
+  static i64 exact_sums_place() { return 16 * spread(8 * most_strip / 16); }
+  i64 exact_bytes() const { return (exact_samples() + c_.height * exact_sums_place()) * static_cast<i64>(sizeof(f32)); }
   // The number of a tap's product, which may be a new one, from those of its group on.
   i32 product_of(i32 v, i32 u, i32 group_begin) {
     f32 w[4];
@@ -115,23 +128,76 @@ class Plan {
         return false;
     return true;
   }
-  // A group for each kind of kernel row.
-  void share_among_rows() {
-    product_count_ = group_count_ = 0;
+  void find_kinds() {
     i32 placed = 0;
     for (i32 v = 0; v < c_.height; ++v) {
-      if (std::any_of(rows_, rows_ + placed, [&](const FloatBand::Row& row) { return row.v == v; })) continue;
-      FloatBand::Group& group = groups_[group_count_++];
+      if (std::find(order_, order_ + placed, v) != order_ + placed) continue;
+      FloatBand::Group& kind = kinds_[kind_count_++];
+      kind = {0, 0, placed, placed};
+      for (i32 other = v; other < c_.height; ++other)
+        if (same_rows(v, other)) order_[placed++] = other;
+      kind.end_row = placed;
+    }
+  }
+  void share_among_rows() {
+    product_count_ = 0;
+    group_count_ = kind_count_;
+    for (i32 k = 0; k < kind_count_; ++k) {
+      FloatBand::Group& group = groups_[k];
+      group = kinds_[k];
       group.first_product = product_count_;
-      group.first_row = placed;
-      for (i32 other = v; other < c_.height; ++other) {
-        if (!same_rows(v, other)) continue;
-        number_row(other, group.first_product);
-        rows_[placed++].v = other;
+      for (i32 i = group.first_row; i < group.end_row; ++i) {
+        rows_[i].v = order_[i];
+        number_row(order_[i], group.first_product);
       }
       group.end_product = product_count_;
-      group.end_row = placed;
     }
+  }
+  bool is_mirrored() const {
+    for (const i32* const kernel : c_.kernels)
+      for (i32 v = 0; v < c_.height; ++v)
+        for (i32 u = 0; u < c_.width / 2; ++u)
+          if (kernel[i64{v} * c_.width + u] != kernel[i64{v} * c_.width + c_.width - 1 - u]) return false;
+    return true;
+  }
+  void find_exact(FloatBand::Exact* exact) const {
+    u64 greatest = 1, sum = 1;
+    for (i32 k = 0; k < 4; ++k) {
+      sum = std::max(sum, c_.tap_sums[k]);
+      for (i64 i = 0; i < i64{c_.width} * c_.height; ++i)
+        greatest = std::max(greatest, static_cast<u64>(std::abs(i64{c_.kernels[k][i]})));
+    }
+    // Samples are up to 2^bits quanta, so that products fit the 24 bits of single precision. The lower halves, of up to
+    // 2^lower quanta, and the upper halves, of up to 2^(bits - lower - 1) times that, are summed in 24 bits too.
+    const i32 product_bits = static_cast<i32>(std::bit_width(greatest - 1));
+    const i32 sum_bits = static_cast<i32>(std::bit_width(sum - 1));
+    const i32 bits = std::min({24 - product_bits, 47 - 2 * sum_bits, 22}), lower = 24 - sum_bits;
+    exact->possible = bits >= 8;
+    exact->quantum = std::ldexp(1.0f, -bits);
+    exact->split = std::ldexp(1.0f, std::min(lower + 1 - bits, 0));
+    exact->short_quotients = true;
+    for (i32 k = 0; k < 4; ++k) {
+      const f32 divisor = static_cast<f32>(c_.divisors[k]);
+      const ShortQuotient by = ShortQuotient::of(divisor);
+      exact->short_quotients = exact->short_quotients && ShortQuotient::serves(divisor);
+      exact->reciprocals[0][k] = by.upper;
+      exact->reciprocals[1][k] = by.lower;
+    }
+    exact->mirrored = is_mirrored();
+    exact->terms = exact->mirrored ? c_.width / 2 + 1 : c_.width;
+    exact->weights = term_weights_;
+    exact->kinds = kinds_;
+    exact->kind_count = kind_count_;
+    exact->order = order_;
+    exact->samples = reinterpret_cast<f32*>(blocks_);
+    exact->samples_place = exact_samples_place();
+    exact->sums = exact->samples + exact_samples();
+    exact->sums_place = exact_sums_place();
+    for (i32 k = 0; k < kind_count_; ++k)
+      for (i32 t = 0; t < exact->terms; ++t)
+        for (i32 c = 0; c < 4; ++c)
+          term_weights_[4 * (k * exact->terms + t) + c] =
+              static_cast<f32>(c_.kernels[c][i64{order_[kinds_[k].first_row]} * c_.width + t]);
   }
   void find_places(const FloatBand::Group& group, FloatBand::Row* row, FloatBand* band) const {
     const i64 first_tap = i64{row->v} * c_.width;
@@ -153,11 +219,12 @@ class Plan {
   i32 halves_;
   FloatBand::Group* groups_;
   FloatBand::Row* rows_;
-  f32 *weights_, *padded_;
-  i32 *places_, *fewer_places_;
+  FloatBand::Group* kinds_;
+  f32 *weights_, *term_weights_, *padded_;
+  i32 *places_, *fewer_places_, *order_;
   char* blocks_;
   i64 bytes_;
-  i32 product_count_ = 0, group_count_ = 0;
+  i32 product_count_ = 0, group_count_ = 0, kind_count_ = 0;
 };
 
 }  // namespace

@@ -10,7 +10,7 @@
 namespace zr {
 
 inline constexpr i32 largest_banded_side = 63;  // of kernels; of larger ones few taps are alike
-inline constexpr i32 float_strip_step = 16;     // strips are whole multiples of so many pixels
+inline constexpr i32 float_strip_step = 32;     // strips are whole multiples of so many pixels
 
 struct FloatBand {
   // A kernel row: where the products of its taps are, in pixels from the first of its group's. Taps of weight 0 add
@@ -25,7 +25,28 @@ struct FloatBand {
     i32 first_product, end_product, first_row, end_row;
   };
 
+  // Where a strip's samples are whole multiples of a quantum, few bits above it, all products and sums are exact: they
+  // may be made in any order and form. Samples are then split into two numbers of single precision, the upper a
+  // multiple of `split`; sums of both halves are exact too. Kernel rows that are alike share their sums.
+  struct Exact {
+    bool possible;
+    bool mirrored;       // every kernel row: taps go in pairs
+    i32 terms;           // pairs, or taps
+    f32 quantum, split;  // of samples up to 1
+    bool short_quotients;
+    f32 reciprocals[2][4];  // upper and lower parts of the divisors'
+    const f32* weights;     // of each kind of kernel row, four for each term
+    const Group* kinds;     // their places in `order`
+    i32 kind_count;
+    const i32* order;               // of kernel rows
+    f32 *samples, *sums;            // upper and lower halves of a row and of its pairs; of a destination row
+    i64 samples_place, sums_place;  // numbers from one to the next
+  };
+
   Convolution<ZR_PixelFloat> kernel;
+  Exact exact;
+  f32 bound = 1;         // of the last strip's samples, a power of two
+  bool doubtful = true;  // whether the next strip's sums are exact
   const Group* groups;
   i32 group_count;
   const Row* rows;
@@ -45,7 +66,7 @@ struct FloatBand {
 };
 // How lanes hold a strip: its halves side by side in each vector, where vectors hold two pixels.
 struct FloatBandLanes {
-  void (*run)(const FloatBand& band);
+  void (*run)(FloatBand& band);
   i32 halves;
 };
 // The fastest that this processor has; without any, `run` is null.
@@ -64,7 +85,7 @@ class FloatBands {
 
  private:
   char* memory_ = nullptr;
-  void (*run_)(const FloatBand&);
+  void (*run_)(FloatBand&);
   FloatBand band_ = {};
 };
 
