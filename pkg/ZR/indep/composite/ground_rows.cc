@@ -25,7 +25,8 @@ i32 fade_row(i32 n, const T* src, T* dst) {
 }
 template <class T, ModeKind ground>
 i32 unfade_row(i32 n, const T* src, T* dst) {
-  return each_pixel(n, src, dst, [](Wide<T> c, Wide<T> a) { return unfaded<ModeMath<T>, ground>(c, a); });
+  using M = ModeMath<T>;
+  return each_pixel(n, src, dst, [](Wide<T> c, Wide<T> a) { return unfaded<M, ground>(c, divisor_of<M>(a)); });
 }
 
 template <class T>

@@ -25,9 +25,10 @@ i32 ground_row(i32 n, const T* src, T* dst) {
   // Floats go through a subtraction and back, which rounds.
   const auto idle = [](const Px<M>& p) HWY_ATTR { return std::is_same_v<Wide, Ints> && all(p.alpha == M::white); };
   return change_row<Pack, T, M>(n, src, dst, single, idle, [](const Px<M>& p) HWY_ATTR {
+    const auto over = divisor_of<M>(p.alpha);
     const auto one = [&](Wide c) HWY_ATTR {
       if constexpr (back)
-        return M::stored(unfaded<M, ground>(c, p.alpha));
+        return M::stored(unfaded<M, ground>(c, over));
       else
         return faded<M, ground>(c, p.alpha);
     };

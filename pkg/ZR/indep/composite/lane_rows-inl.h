@@ -73,7 +73,7 @@ HWY_INLINE bool blend_lanes(Source<typename Lanes<Mode, T>::Math> source, bool k
   using Pack = typename Lanes<Mode, T>::Pack;
   using Wide = typename M::Wide;
   if (!source.template load<Pack>(src, mask)) return false;
-  const auto covered = [&](Wide c) HWY_ATTR { return source.covered(c); };
+  const auto covered = [&](Wide c) ZR_FORMULA { return source.covered(c); };
   const Px<M> s = scales_source<Mode> ? scaled<M>(source.pixel, covered) : source.pixel;
   const Wide A = scales_source<Mode> ? s.alpha : covered(s.alpha);
   const auto clear = A == 0;
@@ -172,20 +172,21 @@ HWY_INLINE bool blend_whole(Source<typename Lanes<Mode, T>::Math> source, const 
   const Px<M>& s = source.pixel;
   const Wide A = source.covered(s.alpha), D = d.alpha;
   const auto clear = A == 0;
-  const auto main = [&](const Px<M>& onto) HWY_ATTR { return pick(clear, onto, blend_in_row<Mode>(s, A, onto)); };
+  const auto main = [&](const Px<M>& onto) ZR_FORMULA { return pick(clear, onto, blend_in_row<Mode>(s, A, onto)); };
   // Under a white alpha the other passes leave integers as they are; floats round in them.
   if (integers && all(D == M::white)) {
     if (!all(clear)) Pack::template store<M>(main(d), dst);
     return true;
   }
-  const auto each = [](const Px<M>& p, auto change) HWY_ATTR {
+  const auto each = [](const Px<M>& p, auto change) ZR_FORMULA {
     return Px<M>{p.alpha, change(p.red), change(p.green), change(p.blue)};
   };
-  const Px<M> blended = main(each(d, [&](Wide c) HWY_ATTR { return faded<M, Mode::kind>(c, D); }));
+  const Px<M> blended = main(each(d, [&](Wide c) ZR_FORMULA { return faded<M, Mode::kind>(c, D); }));
   // The union weighs the mask behind the opacity at every depth.
   const Wide weight = source.opaque ? s.alpha : M::mul(s.alpha, source.opacity);
   const Wide R = M::inv(M::mul(M::inv(D), M::inv(source.masked ? M::mul(source.cover, weight) : weight)));
-  const Px<M> out = each(blended, [&](Wide c) HWY_ATTR { return M::stored(unfaded<M, Mode::kind>(c, R)); });
+  const auto over = divisor_of<M>(R);
+  const Px<M> out = each(blended, [&](Wide c) ZR_FORMULA { return M::stored(unfaded<M, Mode::kind>(c, over)); });
   Pack::template store<M>(with_alpha<M>(out, R), dst);
   return true;
 }

@@ -34,14 +34,23 @@ struct IntegerModeMath : Primitive<T> {
   // a * b / c of the colour modes, toward zero; legal pixels come here with c > 0 only.
   static ZR_PURE auto divides(Wide c) { return c > 0; }
   static ZR_PURE Wide ratio(Wide a, Wide b, Wide c) { return product_ratio(a, b, pick(divides(c), c, 1)); }
+  static ZR_PURE Wide toward(Wide from, Wide to, Wide k) { return from + D::smul(k, to - from); }
   // The weight of a soft-light table value under a partial alpha.
   static ZR_PURE Wide soft_weight(Wide k, Wide v, Wide A) { return D::mul(A, D::mul(k, v)); }
   static ZR_PURE Wide quotient(Wide d, Wide s) { return pick(d == 0, d, pick(d >= s, D::white, D::div(d, s))); }
   static ZR_PURE Wide luma_alpha(Wide a) { return a; }
-  static ZR_PURE Wide weighted(Wide s, Wide d, Wide f, Wide A, Wide a, Wide R) {
+  // What is left to divide by the alpha of both.
+  static ZR_PURE Wide weighted(Wide s, Wide d, Wide f, Wide A, Wide a) {
     const Wide both = D::mul(A, a);
-    const Wide n = D::mul(A, s) + D::mul(a, d) - D::mul(d, both) - (D::mul(s, both) - D::mul(both, f));
-    return D::div(D::stored(n), R);
+    return D::mul(A, s) + D::mul(a, d) - D::mul(d, both) - (D::mul(s, both) - D::mul(both, f));
+  }
+  // n / r of n < r, else white. Illegal numbers, of which lanes have none, count as they are signed here.
+  static ZR_PURE Wide fraction(Wide n, Wide r) {
+#ifdef ZR_IN_LANES
+    return D::div(n, r);
+#else
+    return pick(n >= r, D::white, D::div(n, r));
+#endif
   }
 };
 
@@ -71,6 +80,8 @@ struct ModeMath<ZR_Pixel8> : ByteModeMath<ZR_Pixel8> {};
 #ifdef ZR_IN_LANES
 template <>
 struct ModeMath<NarrowPixel8> : ByteModeMath<NarrowPixel8> {
+  using Primitive<NarrowPixel8>::toward;
+  static HWY_INLINE Shorts drawn(Shorts t, Shorts d, Shorts k) { return mixed(t, d, k); }
   // What is low is its formula at every entry of the table.
   static HWY_INLINE Shorts soft(Bools<i16> low, Shorts d) {
     return pick(low, mul(d, inv(d)), entry_of(soft_light_8.data() + soft_light_reach_8, d));
@@ -105,6 +116,7 @@ struct ModeMath<ZR_PixelFloat> : Primitive<ZR_PixelFloat> {
   static ZR_PURE Wide magnitude(Wide v) { return magnitude_of(v); }
   static ZR_PURE auto divides(Wide c) { return c != 0.0f; }
   static ZR_PURE Wide ratio(Wide a, Wide b, Wide c) { return a * b / c; }
+  static ZR_PURE Wide toward(Wide from, Wide to, Wide k) { return from + k * (to - from); }
   static ZR_PURE Wide drawn(Wide t, Wide d, Wide k) { return t + (d - t) * k; }
   static ZR_PURE Wide stretched_low(Wide s) { return 2.0f * s; }
   static ZR_PURE Wide stretched_high(Wide s) { return (s - 0.5f) * 2.0f; }
@@ -131,9 +143,8 @@ struct ModeMath<ZR_PixelFloat> : Primitive<ZR_PixelFloat> {
   }
   // An alpha that was multiplied by a luma is the only one that is clamped.
   static ZR_PURE Wide luma_alpha(Wide a) { return pick(a > 1.0f, 1.0f, pick(a < 1e-16f, 0.0f, a)); }
-  static ZR_PURE Wide weighted(Wide s, Wide d, Wide f, Wide A, Wide a, Wide R) {
-    return div(((f - s - d) * a + s) * A + a * d, R);
-  }
+  static ZR_PURE Wide weighted(Wide s, Wide d, Wide f, Wide A, Wide a) { return ((f - s - d) * a + s) * A + a * d; }
+  static ZR_PURE Wide fraction(Wide n, Wide r) { return pick(n >= r, white, div(n, r)); }
   static ZR_PURE Wide covered(Wide c, Wide opacity, Wide mask) { return mask * (c * opacity); }
   static constexpr f32 marker_high = 0.75f, marker_low = 0.25f;
 };

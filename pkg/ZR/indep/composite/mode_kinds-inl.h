@@ -23,14 +23,15 @@ ZR_PURE auto faded(typename M::Wide d, typename M::Wide D) {
     return M::stored(pick(d < M::half, d + M::mul(M::inv(D), M::half - d), M::half + M::mul(d - M::half, D)));
 }
 
+// `over` divides by R.
 template <class M, ModeKind ground>
-ZR_PURE auto unfaded(typename M::Wide t, typename M::Wide R) {
+ZR_PURE auto unfaded(typename M::Wide t, auto over) {
   if constexpr (ground == ModeKind::black_ground)
-    return M::div(t, R);
+    return over(t);
   else if constexpr (ground == ModeKind::white_ground)
-    return M::inv(M::div(M::inv(t), R));
+    return M::inv(over(M::inv(t)));
   else {
-    const auto away = M::div(M::magnitude(t - M::half), R);  // the same on both sides of the ground
+    const auto away = over(M::magnitude(t - M::half));  // the same on both sides of the ground
     return pick(t < M::half, M::floored(M::half - away), M::capped(M::half + away));
   }
 }
@@ -50,7 +51,7 @@ ZR_PURE Px<M> blend_ground(const Px<M>& s, typename M::Wide A, const Px<M>& d) {
         const Wide R = combined_alpha<M>(A, D);
         const auto mixed = [&](Wide sc, Wide dc) ZR_FORMULA {
           const Wide t = M::stored(Mode::template partial<M>(sc, A, ground(dc)));
-          return pick(R == M::white, t, unfaded<M, Mode::kind>(t, R));
+          return pick(R == M::white, t, unfaded<M, Mode::kind>(t, divisor_of<M>(R)));
         };
         return with_alpha<M>(each_colour<M>(s, d, mixed), R);
       });
@@ -64,15 +65,14 @@ ZR_PURE Px<M> blend_weighted(const Px<M>& s, typename M::Wide A, const Px<M>& d)
   return choose(
       A == M::white,
       [&]() ZR_FORMULA {
-        const auto full = [&](Wide sc, Wide dc)
-                              ZR_FORMULA { return sc + M::smul(D, Mode::template full<M>(sc, dc) - sc); };
+        const auto full = [&](Wide sc, Wide dc) ZR_FORMULA { return M::toward(sc, Mode::template full<M>(sc, dc), D); };
         return with_alpha<M>(each_colour<M>(s, d, full), M::white);
       },
       [&]() ZR_FORMULA {
         const Wide R = combined_alpha<M>(A, D);
         const auto mixed = [&](Wide sc, Wide dc)
-                               ZR_FORMULA { return M::weighted(sc, dc, Mode::template full<M>(sc, dc), A, D, R); };
-        return with_alpha<M>(each_colour<M>(s, d, mixed), R);
+                               ZR_FORMULA { return M::weighted(sc, dc, Mode::template full<M>(sc, dc), A, D); };
+        return with_alpha<M>(divided<M>(each_colour<M>(s, d, mixed), R), R);
       });
 }
 
@@ -81,8 +81,7 @@ template <class Mode, class M>
 ZR_PURE Px<M> recolour(const Px<M>& s, typename M::Wide A, const Px<M>& d) {
   using Wide = typename M::Wide;
   const Px<M> c = Mode::template recoloured<M>(s, d);
-  const auto mixed = [A](Wide to, Wide from)
-                         ZR_FORMULA { return pick(A == M::white, to, from + M::smul(A, to - from)); };
+  const auto mixed = [A](Wide to, Wide from) ZR_FORMULA { return pick(A == M::white, to, M::toward(from, to, A)); };
   return each_colour<M>(c, d, mixed);
 }
 

@@ -66,11 +66,8 @@ struct Behind : Mode<XferBehind, ModeKind::over> {
         D == M::white, [&]() ZR_FORMULA { return d; },
         [&]() ZR_FORMULA {
           const Wide R = combined_alpha<M>(A, D);
-          return with_alpha<M>(each_colour<M>(s, d,
-                                              [&](Wide sc, Wide dc) ZR_FORMULA {
-                                                return M::div(M::stored(M::drawn(M::mul(sc, A), dc, D)), R);
-                                              }),
-                               R);
+          const auto mixed = [&](Wide sc, Wide dc) ZR_FORMULA { return M::drawn(M::mul(sc, A), dc, D); };
+          return with_alpha<M>(divided<M>(each_colour<M>(s, d, mixed), R), R);
         });
   }
 };
@@ -87,11 +84,8 @@ struct InFront : Mode<XferInFront, ModeKind::over, RowClass::self_contained> {
               D == 0, [&]() ZR_FORMULA { return with_alpha<M>(s, A); },  // without a rounding
               [&]() ZR_FORMULA {
                 const Wide R = combined_alpha<M>(A, D);
-                const auto mixed = [&](Wide sc, Wide dc) ZR_FORMULA {
-                  const Wide t = M::mul(dc, D);
-                  return M::div(M::stored(t + M::smul(A, sc - t)), R);
-                };
-                return with_alpha<M>(each_colour<M>(s, d, mixed), R);
+                const auto mixed = [&](Wide sc, Wide dc) ZR_FORMULA { return M::toward(M::mul(dc, D), sc, A); };
+                return with_alpha<M>(divided<M>(each_colour<M>(s, d, mixed), R), R);
               });
         });
   }
@@ -106,10 +100,8 @@ struct AddPremul : Mode<XferAddPremul, ModeKind::special, RowClass::self_contain
     using Wide = typename M::Wide;
     const Wide D = d.alpha, K = M::mul(M::inv(A), D);
     const Wide R = combined_alpha<M>(A, D);
-    return with_alpha<M>(
-        each_colour<M>(
-            s, d, [&](Wide sc, Wide dc) ZR_FORMULA { return M::div(M::stored(M::capped(sc + M::mul(dc, K))), R); }),
-        R);
+    const auto sum = [&](Wide sc, Wide dc) ZR_FORMULA { return M::capped(sc + M::mul(dc, K)); };
+    return with_alpha<M>(divided<M>(each_colour<M>(s, d, sum), R), R);
   }
 };
 
@@ -129,9 +121,8 @@ struct AlphaAdd : Mode<XferAlphaAdd, ModeKind::special, RowClass::self_contained
                 return with_alpha<M>(each_colour<M>(s, d, mixed), M::white);
               },
               [&]() ZR_FORMULA {
-                const auto mixed = [&](Wide sc, Wide dc)
-                                       ZR_FORMULA { return M::div(M::stored(M::mul(sc, A) + M::mul(dc, D)), sum); };
-                return with_alpha<M>(each_colour<M>(s, d, mixed), sum);
+                const auto mixed = [&](Wide sc, Wide dc) ZR_FORMULA { return M::mul(sc, A) + M::mul(dc, D); };
+                return with_alpha<M>(divided<M>(each_colour<M>(s, d, mixed), sum), sum);
               });
         });
   }
@@ -205,7 +196,7 @@ struct ColorDodge : Mode<XferColorDodge, ModeKind::black_ground> {
   template <class M>
   static ZR_PURE auto full(auto s, auto d) {
     const auto w = M::inv(s);
-    return pick(d >= w, M::white, M::div(d, w));
+    return M::fraction(d, w);
   }
   template <class M>
   static ZR_PURE auto partial(auto s, auto A, auto d) {
@@ -257,7 +248,7 @@ struct ColorBurn : Mode<XferColorBurn, ModeKind::white_ground> {
   template <class M>
   static ZR_PURE auto full(auto s, auto d) {
     const auto w = M::inv(d);
-    return pick(w >= s, 0, M::white - M::div(w, s));
+    return M::white - M::fraction(w, s);
   }
   template <class M>
   static ZR_PURE auto partial(auto s, auto A, auto d) {
@@ -274,7 +265,7 @@ struct Overlay : Mode<XferOverlay, ModeKind::grey_ground> {
   }
   template <class M>
   static ZR_PURE auto partial(auto s, auto A, auto d) {
-    return d + M::smul(A, full<M>(s, d) - d);
+    return M::toward(d, full<M>(s, d), A);
   }
 };
 

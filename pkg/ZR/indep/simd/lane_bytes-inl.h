@@ -41,16 +41,33 @@ struct Primitive<NarrowPixel8> {
     return hn::Sub(hn::Xor(magnitude.v, sign), sign);
   }
   static HWY_INLINE Shorts inv(Shorts a) { return white - a; }
-  // The estimate is the quotient or one less.
-  static HWY_INLINE Shorts div(Shorts n, Shorts r) {
-    if (all(r == white)) return hn::Min(n.v, r.v);
-    const Shorts held = hn::Min(n.v, r.v);  // what is as great as r has the quotient white
-    const Shorts numerator = shifted_left<8>(held) - held + shifted_right<1>(r);
-    const Shorts least = high(numerator, reciprocal(r));
-    const Shorts quotient = pick(numerator - least * r >= r, least + 1, least);
-    const Bools<i16> by_zero = r == 0;
-    return none(by_zero) ? quotient : pick(by_zero, white, quotient);
+  static HWY_INLINE Shorts div(Shorts n, Shorts r) { return Divisor(r)(n); }
+  // Takes n to a fraction of r in 1/65536, and that times white. The reciprocal F of r has 16 bits only, but what it
+  // lacks, 65536 - r * F, is 1 to r, and a factor as much greater than 255 * 256 makes up for it: no pair of bytes
+  // comes out another number. The sum ends at 65535 for n = r, which gives white; so it does for r = 0.
+  class Divisor {
+   public:
+    HWY_INLINE explicit Divisor(Shorts r)
+        : r_(r),
+          per_(reciprocal(r)),
+          factor_(highest(bits_16(255 * 256) - r * per_, bits_16(255 * 256 + 1))),
+          rounding_(pick(r == 0, -1, 129 - masked(r, 1))) {}
+    HWY_INLINE Shorts operator()(Shorts n) const {
+      const Shorts held = hn::Min(n.v, r_.v);
+      return shifted_down_8(high(saturated_sum(held * per_, rounding_), factor_));
+    }
+    static HWY_INLINE Shorts by_white(Shorts n) { return n; }  // which no byte is above
+
+   private:
+    Shorts r_, per_, factor_, rounding_;
+  };
+  // from + smul(k, to - from), of bytes: a product below 0 rounds as if it were 1 greater.
+  static HWY_INLINE Shorts toward(Shorts from, Shorts to, Shorts k) {
+    const Shorts sum = from * inv(k) + to * k;
+    return fold(pick(to < from, sum + 1, sum), 128);
   }
+  // The same, with roundings that are alike on both sides.
+  static HWY_INLINE Shorts mixed(Shorts from, Shorts to, Shorts k) { return fold(from * inv(k) + to * k, 128); }
 
  private:
   // The upper half of a product without signs.
@@ -60,7 +77,20 @@ struct Primitive<NarrowPixel8> {
   }
   // With u = t + rounding: (u + (u >> 8)) >> 8, which is u * 257 >> 16.
   static HWY_INLINE Shorts fold(Shorts t, Shorts rounding) { return high(t + rounding, 257); }
-  // 65536 / r less at most 1 and 1 / (8 r), never more, and below 65536; any number for r = 0.
+  // Numbers from 0 to 65535 as lanes that are read without a sign.
+  static HWY_INLINE Shorts bits_16(u16 number) { return hn::BitCast(Tag<i16>(), hn::Set(Tag<u16>(), number)); }
+  static HWY_INLINE Shorts highest(Shorts a, Shorts b) {
+    const Tag<u16> d;
+    return hn::BitCast(Tag<i16>(), hn::Max(hn::BitCast(d, a.v), hn::BitCast(d, b.v)));
+  }
+  static HWY_INLINE Shorts saturated_sum(Shorts a, Shorts b) {
+    const Tag<u16> d;
+    return hn::BitCast(Tag<i16>(), hn::SaturatedAdd(hn::BitCast(d, a.v), hn::BitCast(d, b.v)));
+  }
+  static HWY_INLINE Shorts shifted_down_8(Shorts a) {
+    return hn::BitCast(Tag<i16>(), hn::ShiftRight<8>(hn::BitCast(Tag<u16>(), a.v)));
+  }
+  // The integer part of 65535 / r; any number for r = 0.
   static HWY_INLINE Shorts reciprocal(Shorts r) {
     const Pairs pairs = pairs_of(r.v);
     const Pairs even = rounded_reciprocal(hn::And(pairs, hn::Set(PairTag(), 65535)));
@@ -95,33 +125,29 @@ HWY_INLINE Shorts entry_of(const i32* table, Shorts index) {
 struct Narrow {
   static constexpr i32 pixels = 2 * lane_count();
 
+  // Alpha and red, green and blue share a lane on the way.
   template <class M>
   static HWY_INLINE Px<M> load(const ZR_Pixel8* p) {
     const Pairs first = words(p), second = words(p + lane_count());
-    const auto low = [](Pairs v) HWY_ATTR { return hn::And(v, hn::Set(PairTag(), 0x00ff00ff)); };
-    const auto high = [](Pairs v) HWY_ATTR { return pairs_of(hn::ShiftRight<8>(hn::BitCast(Tag<u16>(), v))); };
-    const auto lower = [](Pairs a, Pairs b) HWY_ATTR { return joined(a, hn::ShiftLeft<16>(b)); };
-    const auto upper = [](Pairs a, Pairs b) HWY_ATTR { return joined(hn::ShiftRight<16>(a), b); };
-    return {lower(low(first), low(second)), lower(high(first), high(second)), upper(low(first), low(second)),
-            upper(high(first), high(second))};
+    const Shorts front = joined(first, hn::ShiftLeft<16>(second)), back = joined(hn::ShiftRight<16>(first), second);
+    const auto upper = [](Shorts v) HWY_ATTR {
+      return hn::BitCast(Tag<i16>(), hn::ShiftRight<8>(hn::BitCast(Tag<u16>(), v.v)));
+    };
+    return {masked(front, 255), upper(front), masked(back, 255), upper(back)};
   }
   template <class M>
   static HWY_INLINE void store(const Px<M>& v, ZR_Pixel8* p) {
-    const auto first = [](Shorts low, Shorts high) HWY_ATTR {
-      return pairs_of(joined(pairs_of(low.v), hn::ShiftLeft<16>(pairs_of(high.v))).v);
-    };
-    const auto second = [](Shorts low, Shorts high) HWY_ATTR {
-      return pairs_of(joined(hn::ShiftRight<16>(pairs_of(low.v)), pairs_of(high.v)).v);
-    };
-    const auto put = [](Pairs ag, Pairs rb, ZR_Pixel8* to) HWY_ATTR {
-      hn::StoreU(hn::Or(ag, hn::ShiftLeft<8>(rb)), PairTag(), reinterpret_cast<u32*>(to));
-    };
-    put(first(v.alpha, v.green), first(v.red, v.blue), p);
-    put(second(v.alpha, v.green), second(v.red, v.blue), p + lane_count());
+    const Pairs front = pairs_of(hn::Or(v.alpha.v, shifted_left<8>(v.red).v));
+    const Pairs back = pairs_of(hn::Or(v.green.v, shifted_left<8>(v.blue).v));
+    put(joined(front, hn::ShiftLeft<16>(back)), p);
+    put(joined(hn::ShiftRight<16>(front), back), p + lane_count());
   }
 
  private:
   static HWY_INLINE Pairs words(const ZR_Pixel8* p) { return hn::LoadU(PairTag(), reinterpret_cast<const u32*>(p)); }
+  static HWY_INLINE void put(Shorts v, ZR_Pixel8* p) {
+    hn::StoreU(pairs_of(v.v), PairTag(), reinterpret_cast<u32*>(p));
+  }
 };
 
 }  // namespace HWY_NAMESPACE

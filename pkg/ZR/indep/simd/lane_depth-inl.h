@@ -93,46 +93,59 @@ struct Primitive<ZR_Pixel16> {
   static HWY_INLINE Ints mul(Ints a, Ints b) { return shifted_right<15>(a * b + 16383); }
   static HWY_INLINE Ints smul(Ints k, Ints x) { return shifted_right<15>(k * x); }
   static HWY_INLINE Ints inv(Ints a) { return white - a; }
-  static HWY_INLINE Ints div(Ints n, Ints r) {
-    const Bools<i32> full = at_least(n, r);
-    if (all(r == white)) return pick(full, white, n);
-    return pick(full, white, quotient(n, r));
-  }
+  static HWY_INLINE Ints div(Ints n, Ints r) { return Divisor(r)(n); }
   static HWY_INLINE Ints luma(Ints r, Ints g, Ints b) {
     return shifted_right<15>(luma_red * r + luma_green * g + luma_blue * b + 16384);
   }
 
- private:
+  class Divisor {
+   public:
 #if HWY_NATIVE_FMA
-  // The quotient to the nearest integer, for n < r: an estimate that is never too great and too small by less than
-  // 1/16, rounded by a sum in which floats have no fraction left, is the quotient or one less. What is left of n
-  // then, in 1/32768, has few enough bits to come out exactly.
-  static HWY_INLINE Ints quotient(Ints n, Ints r) {
-    constexpr f32 no_fraction = 8388608.0f, scale = 32768.0f * (1.0f - 0x1p-20f);
-    const Tag<f32> d;
-    const Floats dividend = to_float(n), divisor = to_float(r), unit = divisor * 0x1p-15f;
-    const Floats snapped = hn::MulAdd(dividend.v, (reciprocal(divisor) * scale).v, hn::Set(d, no_fraction));
-    const Floats rest = hn::NegMulAdd((snapped - no_fraction).v, unit.v, dividend.v);
-    const Ints least = masked(hn::BitCast(Tag<i32>(), snapped.v), 65535);
-    return pick(of_ints(rest >= unit * 0.5f), least + 1, least);
-  }
-  // Off by less than 2^-22 of itself.
-  static HWY_INLINE Floats reciprocal(Floats r) {
+    HWY_INLINE explicit Divisor(Ints r)
+        : r_(r), unit_(to_float(r) * 0x1p-15f), half_(unit_ * 0.5f), per_(reciprocal(to_float(r)) * scale) {}
+#else
+    HWY_INLINE explicit Divisor(Ints r) : r_(r), per_(1.0f / to_float(r)) {}
+#endif
+    HWY_INLINE Ints operator()(Ints n) const { return pick(at_least(n, r_), white, quotient(n)); }
+    static HWY_INLINE Ints by_white(Ints n) { return pick(at_least(n, white), white, n); }
+
+   private:
+#if HWY_NATIVE_FMA
+    static constexpr f32 no_fraction = 8388608.0f, scale = 32768.0f * (1.0f - 0x1p-20f);
+    // The quotient to the nearest integer, for n < r: an estimate that is never too great and too small by less than
+    // 1/16, rounded by a sum in which floats have no fraction left, is the quotient or one less. What is left of n
+    // then, in 1/32768, has few enough bits to come out exactly.
+    HWY_INLINE Ints quotient(Ints n) const {
+      const Floats dividend = to_float(n);
+      const Floats snapped = hn::MulAdd(dividend.v, per_.v, hn::Set(Tag<f32>(), no_fraction));
+      const Floats rest = hn::NegMulAdd((snapped - no_fraction).v, unit_.v, dividend.v);
+      const Ints least = masked(hn::BitCast(Tag<i32>(), snapped.v), 65535);
+      return pick(of_ints(rest >= half_), least + 1, least);
+    }
+    // Off by less than 2^-22 of itself.
+    static HWY_INLINE Floats reciprocal(Floats r) {
 #if HWY_ARCH_X86
-    const Floats estimate = hn::ApproximateReciprocal(r.v);
-    return estimate * Floats(hn::NegMulAdd(r.v, estimate.v, hn::Set(Tag<f32>(), 2.0f)));
+      const Floats estimate = hn::ApproximateReciprocal(r.v);
+      return estimate * Floats(hn::NegMulAdd(r.v, estimate.v, hn::Set(Tag<f32>(), 2.0f)));
 #else
-    return 1.0f / r;
+      return 1.0f / r;
 #endif
-  }
+    }
+    Ints r_;
+    Floats unit_, half_, per_;
 #else
-  // The estimate is off by less than 1/64; made a little small, it is the quotient or one less.
-  static HWY_INLINE Ints quotient(Ints n, Ints r) {
-    const Ints numerator = shifted_left<15>(n) + shifted_right<1>(r);
-    const Ints least = fitting_int(to_float(numerator) * (1.0f / to_float(r)) - 0.03125f);
-    return pick(numerator - least * r >= r, least + 1, least);
-  }
+    // The estimate is off by less than 1/64; made a little small, it is the quotient or one less.
+    HWY_INLINE Ints quotient(Ints n) const {
+      const Ints numerator = shifted_left<15>(n) + shifted_right<1>(r_);
+      const Ints least = fitting_int(to_float(numerator) * per_ - 0.03125f);
+      return pick(numerator - least * r_ >= r_, least + 1, least);
+    }
+    Ints r_;
+    Floats per_;
 #endif
+  };
+
+ private:
   // Negative numbers count as the greatest.
   static HWY_INLINE Bools<i32> at_least(Ints n, Ints r) {
     const hn::Rebind<u32, Tag<i32>> unsigned_tag;
@@ -167,6 +180,25 @@ struct Px {
 template <class M, class N>
 HWY_INLINE Px<M> pick(Bools<N> c, const Px<M>& a, const Px<M>& b) {
   return {pick(c, a.alpha, b.alpha), pick(c, a.red, b.red), pick(c, a.green, b.green), pick(c, a.blue, b.blue)};
+}
+
+// Division by one r: what is known of it is worked out once.
+template <class M>
+HWY_INLINE auto divisor_of(typename M::Wide r) {
+  if constexpr (requires { typename M::Divisor; })
+    return typename M::Divisor(r);
+  else
+    return [r](typename M::Wide n) HWY_ATTR { return M::div(n, r); };
+}
+// The colours of p over r.
+template <class M>
+HWY_INLINE Px<M> divided(const Px<M>& p, typename M::Wide r) {
+  const auto each = [&p](auto quotient) HWY_ATTR {
+    return Px<M>{p.alpha, quotient(p.red), quotient(p.green), quotient(p.blue)};
+  };
+  if constexpr (requires { typename M::Divisor; })
+    if (all(r == M::white)) return each([](typename M::Wide n) HWY_ATTR { return M::Divisor::by_white(n); });
+  return each(divisor_of<M>(r));
 }
 
 // As many pixels as there are lanes, from and to memory without alignment.

@@ -124,12 +124,16 @@ HWY_INLINE Ints to_int(Floats a) {
   const Bools<f32> fits = a >= -2147483648.0f && a < 2147483648.0f;
   return pick(Bools<i32>{hn::RebindMask(Tag<i32>(), fits.mask)}, fitting_int(a), std::numeric_limits<i32>::min());
 }
-// Calls f where the condition holds in all lanes, g where it holds in none, else both.
+// Calls f where the condition holds in all lanes, g where it holds in none, else both. Each stands here once: what is
+// inlined doubles with every other place.
 template <class N, class F, class G>
 HWY_INLINE auto choose(Bools<N> condition, F f, G g) {
-  if (all(condition)) return f();
-  if (none(condition)) return g();
-  return pick(condition, f(), g());
+  const bool takes_f = !none(condition), takes_g = !all(condition);
+  decltype(f()) a, b;
+  if (takes_f) a = f();
+  if (!takes_g) return a;
+  b = g();
+  return takes_f ? pick(condition, a, b) : b;
 }
 
 }  // namespace HWY_NAMESPACE

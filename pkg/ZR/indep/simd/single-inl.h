@@ -65,6 +65,16 @@ template <class M>
 constexpr Px<M> pick(bool condition, const Px<M>& a, const Px<M>& b) {
   return condition ? a : b;
 }
+// Division by one number.
+template <class M>
+constexpr auto divisor_of(typename M::Wide r) {
+  return [r](typename M::Wide n) { return M::div(n, r); };
+}
+// The colours of p over r, as they come back from channels.
+template <class M>
+constexpr Px<M> divided(const Px<M>& p, typename M::Wide r) {
+  return {p.alpha, M::stored(M::div(p.red, r)), M::stored(M::div(p.green, r)), M::stored(M::div(p.blue, r))};
+}
 
 template <class M, class T>
 constexpr Px<M> unpacked(const T& p) {
