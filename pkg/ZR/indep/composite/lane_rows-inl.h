@@ -21,12 +21,13 @@ template <class Mode>
 inline constexpr bool has_lanes = Mode::kind != ModeKind::row_only&& Mode::kind != ModeKind::copy;
 
 // What a mode computes with, and how its pixels lie: modes that work on a whole colour want its channels apart, and
-// lumas want 32 bits.
+// lumas want 32 bits. Where formulas are long the alpha's place among the colours costs more than telling them apart.
 template <class Mode, class T>
 struct Lanes {
   static constexpr bool whole_colour = Mode::kind == ModeKind::colour || Mode::kind == ModeKind::alpha_only;
   static constexpr bool narrow = std::is_same_v<T, ZR_Pixel8> && !whole_colour;
-  static constexpr bool apart = whole_colour || std::is_same_v<Mode, KeyProtect> || std::is_same_v<Mode, BlueThreshold>;
+  static constexpr bool apart = whole_colour || std::is_same_v<Mode, KeyProtect> ||
+                                std::is_same_v<Mode, BlueThreshold> || std::is_same_v<Mode, SoftLight>;
   using Math = ModeMath<std::conditional_t<narrow, NarrowPixel8, T>>;
   using Pack = std::conditional_t<narrow, Narrow, std::conditional_t<apart, Apart, AlikePack<T>>>;
 };

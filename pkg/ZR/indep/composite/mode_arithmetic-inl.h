@@ -37,6 +37,11 @@ struct IntegerModeMath : Primitive<T> {
   static ZR_PURE Wide toward(Wide from, Wide to, Wide k) { return from + D::smul(k, to - from); }
   // The weight of a soft-light table value under a partial alpha.
   static ZR_PURE Wide soft_weight(Wide k, Wide v, Wide A) { return D::mul(A, D::mul(k, v)); }
+  // d moved by the weight of |twice - white|, down (less) or up.
+  static ZR_PURE Wide moved(auto less, Wide d, Wide twice, auto weight) {
+    const Wide by = weight(pick(less, D::inv(twice), twice - D::white));
+    return pick(less, d - by, d + by);
+  }
   static ZR_PURE Wide quotient(Wide d, Wide s) { return pick(d == 0, d, pick(d >= s, D::white, D::div(d, s))); }
   static ZR_PURE Wide luma_alpha(Wide a) { return a; }
   // What is left to divide by the alpha of both.
@@ -96,10 +101,25 @@ struct ModeMath<ZR_Pixel16> : IntegerModeMath<ZR_Pixel16> {
   static ZR_PURE Wide stretched_high(Wide s) { return 2 * s - white; }
   // The tables have an entry for every eighth value.
   static inline Wide soft(auto low, Wide d) {
+#ifdef ZR_IN_LANES
+    const Wide v = d;
+#else
     const Wide v = held(d, 0, white);  // an illegal channel stays inside the table
-    const Wide entry = shifted_right<3>(v) + pick(low, 0, soft_light_reach), between = masked(v, 7);
-    const auto ends = entries_of(soft_light_16, entry);
-    return ends.first + shifted_right<3>(between * (ends.next - ends.first) + 4);
+#endif
+    const Wide entry = entry_of(soft_light_16, shifted_right<3>(v) + pick(low, 0, soft_light_reach));
+    return shifted_right<3>(eighths(entry, masked(v, 7)) + 4);
+  }
+  // Eight times the upper half of an entry, and `count` times the lower, which is signed.
+  static ZR_PURE Wide eighths(Wide entry, Wide count) {
+#if defined(ZR_IN_LANES) && HWY_ARCH_X86
+    const Tag<i16> d;
+    auto none = hn::Zero(Tag<i32>());
+    const Wide factors = hn::Or(count.v, Wide(8 << 16).v);  // both products and their sum are one instruction there
+    return hn::ReorderWidenMulAccumulate(Tag<i32>(), hn::BitCast(d, entry.v), hn::BitCast(d, factors.v), none, none);
+#else
+    const Wide curve = shifted_right<16>(entry), step = shifted_right<16>(shifted_left<16>(entry));
+    return 8 * curve + count * step;
+#endif
   }
   static ZR_PURE Wide hard_mix(Wide s, Wide d) { return pick(d > shifted_right<15>(inv(s) * 32767 + 16384), white, 0); }
   static ZR_PURE Wide covered(Wide c, Wide opacity, Wide mask) { return mul(mask, mul(c, opacity)); }
@@ -126,9 +146,11 @@ struct ModeMath<ZR_PixelFloat> : Primitive<ZR_PixelFloat> {
     const auto i = held(to_int(t), 0, 4096);
     const Wide between = t - to_float(i);
     const auto ends = entries_of(soft_light_float, i + pick(of_ints(low), 0, soft_light_reach));
-    return pick(between != 0.0f, ends.first + (ends.next - ends.first) * between, ends.first);
+    return ends.first + (ends.next - ends.first) * between;
   }
   static ZR_PURE Wide soft_weight(Wide k, Wide v, Wide A) { return k * (v * A); }
+  // Alike down and up, as products of floats are.
+  static ZR_PURE Wide moved(auto, Wide d, Wide twice, auto weight) { return d + weight(twice - white); }
   // A ramp of the width of `step` instead of a threshold.
   static ZR_PURE Wide hard_mix(Wide s, Wide d) {
     constexpr f32 step = 1.001358e-5f;

@@ -127,15 +127,16 @@ ZR_PURE Px<M> blend_in_row(const Px<M>& s, typename M::Wide A, const Px<M>& d) {
   constexpr RowClass row_class = Mode::row_class;
   if constexpr (row_class == RowClass::black_ground || row_class == RowClass::white_ground ||
                 row_class == RowClass::grey_ground) {
-    return choose(
-        A == M::white,
-        [&]() ZR_FORMULA {
-          return each_colour<M>(s, d, [](Wide sc, Wide dc) ZR_FORMULA { return row_full<M, Mode>(sc, dc); });
-        },
-        [&]() ZR_FORMULA {
-          return each_colour<M>(s, d,
-                                [A](Wide sc, Wide dc) ZR_FORMULA { return Mode::template partial<M>(sc, A, dc); });
-        });
+    const auto full = [&]() ZR_FORMULA {
+      return each_colour<M>(s, d, [](Wide sc, Wide dc) ZR_FORMULA { return row_full<M, Mode>(sc, dc); });
+    };
+    const auto partial = [&]() ZR_FORMULA {
+      return each_colour<M>(s, d, [A](Wide sc, Wide dc) ZR_FORMULA { return Mode::template partial<M>(sc, A, dc); });
+    };
+    if constexpr (requires { Mode::partial_is_full; })
+      return where_all(A == M::white, full, partial);
+    else
+      return choose(A == M::white, full, partial);
   } else if constexpr (Mode::kind == ModeKind::colour) {
     return where_wanted<Mode>(s, d, recolour<Mode>(s, A, d), d);  // lumas are compared after the first pass
   } else {

@@ -13,8 +13,8 @@ namespace zr {
 
 // All tables have the curve of dark sources (low) in front of that of light ones (high), which begins `reach` later:
 // one look-up serves a row of both. Entry k of a curve at 16 bits and of floats stands for x = k / 4096; entry 4096
-// is 0. The float curves have one slot more, also 0, which what lies above 1 reads; so have the 16-bit ones, which is
-// read and not used.
+// is 0. The float curves have one slot more, also 0, which what lies above 1 reads. At 16 bits the upper half of an
+// entry is the curve, the lower half how far it goes to the next one.
 inline constexpr i32 soft_light_reach = 4098, soft_light_reach_8 = 256;
 extern i32 soft_light_16[2 * soft_light_reach];
 extern f32 soft_light_float[2 * soft_light_reach];

@@ -6,7 +6,8 @@
 //
 // Formulas are over M = ModeMath<T>: s source, d destination (of ground modes: faded to its ground), A the
 // effective alpha of the source. full(s, d) is the formula under a white A, partial(s, A, d) under a lesser
-// one. Row formulas that round another way than the pixel's have a row_full.
+// one, and where it comes to the same under a white A the entry says partial_is_full. Row formulas that round another
+// way than the pixel's have a row_full.
 #if defined(ZR_COMPOSITE_TRANSFER_MODES_INL_H) == defined(HWY_TARGET_TOGGLE)
 #ifdef ZR_COMPOSITE_TRANSFER_MODES_INL_H
 #undef ZR_COMPOSITE_TRANSFER_MODES_INL_H
@@ -149,6 +150,7 @@ struct KeyProtect : Mode<XferKeyProtect, ModeKind::special> {
 // ------------------------------------------------------------------------------ on a black ground
 
 struct Add : Mode<XferAdd, ModeKind::black_ground> {
+  static constexpr bool partial_is_full = true;
   template <class M>
   static ZR_PURE auto full(auto s, auto d) {
     return M::capped(s + d);
@@ -160,6 +162,7 @@ struct Add : Mode<XferAdd, ModeKind::black_ground> {
 };
 
 struct Screen : Mode<XferScreen, ModeKind::black_ground> {
+  static constexpr bool partial_is_full = true;
   template <class M>
   static ZR_PURE auto full(auto s, auto d) {
     return M::white - M::mul(M::inv(s), M::inv(d));
@@ -182,6 +185,7 @@ struct Lighten : Mode<XferLighten, ModeKind::black_ground> {
 };
 
 struct Difference : Mode<XferDifference, ModeKind::black_ground> {
+  static constexpr bool partial_is_full = true;
   template <class M>
   static ZR_PURE auto full(auto s, auto d) {
     return M::magnitude(s - d);
@@ -193,6 +197,7 @@ struct Difference : Mode<XferDifference, ModeKind::black_ground> {
 };
 
 struct ColorDodge : Mode<XferColorDodge, ModeKind::black_ground> {
+  static constexpr bool partial_is_full = true;
   template <class M>
   static ZR_PURE auto full(auto s, auto d) {
     const auto w = M::inv(s);
@@ -270,21 +275,23 @@ struct Overlay : Mode<XferOverlay, ModeKind::grey_ground> {
 };
 
 struct SoftLight : Mode<XferSoftLight, ModeKind::grey_ground> {
+  static constexpr bool partial_is_full = true;
   template <class M>
   static ZR_PURE auto full(auto s, auto d) {
     const auto dark = s < M::half;
     const auto reach = M::soft(dark, d);
-    return pick(dark, d - M::mul(M::inv(2 * s), reach), d + M::mul(2 * s - M::white, reach));
+    return M::moved(dark, d, 2 * s, [&](auto k) ZR_FORMULA { return M::mul(k, reach); });
   }
   template <class M>
   static ZR_PURE auto partial(auto s, auto A, auto d) {
     const auto dark = s < M::half;
     const auto reach = M::soft(dark, d);
-    return pick(dark, d - M::soft_weight(M::inv(2 * s), reach, A), d + M::soft_weight(2 * s - M::white, reach, A));
+    return M::moved(dark, d, 2 * s, [&](auto k) ZR_FORMULA { return M::soft_weight(k, reach, A); });
   }
 };
 
 struct HardLight : Mode<XferHardLight, ModeKind::grey_ground> {
+  static constexpr bool partial_is_full = true;
   // Twice the half is 256 at 8 bits: a white source counts as 254 there, not 255.
   template <class M>
   static ZR_PURE auto full(auto s, auto d) {

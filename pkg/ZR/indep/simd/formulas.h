@@ -5,7 +5,8 @@
 // and leave long ones out of line, where vectors go by way of memory.
 //
 // Choices are written pick(condition, a, b), which works out both, or choose(condition, f, g), which calls one
-// where the condition is the same in all lanes.
+// where the condition is the same in all lanes. Where g is right on either side, where_all(condition, f, g) never
+// calls both.
 #undef ZR_BEGIN_FORMULAS
 #undef ZR_END_FORMULAS
 #undef ZR_FORMULA

@@ -37,10 +37,8 @@ template <class N>
 HWY_INLINE Entries<N> entries_of(const N* table, Ints index) {
   const Tag<i64> wide;
   const Tag<N> d;
-  const auto both = [&](auto at) HWY_ATTR {
-    return hn::GatherOffset(wide, reinterpret_cast<const i64*>(table), hn::ShiftLeft<2>(at));
-  };
-  const auto pairs = hn::BitCast(wide, index.v);  // of indices, as they are positive
+  const auto both = [&](auto at) HWY_ATTR { return hn::GatherOffset(wide, reinterpret_cast<const i64*>(table), at); };
+  const auto pairs = hn::BitCast(wide, hn::ShiftLeft<2>(index.v));  // of offsets, as they are positive
   const auto even = both(hn::And(pairs, hn::Set(wide, 0xffffffff)));
   const auto odd = both(hn::BitCast(wide, hn::ShiftRight<32>(hn::BitCast(Tag<u64>(), pairs))));
   return {hn::OddEven(hn::BitCast(d, hn::ShiftLeft<32>(odd)), hn::BitCast(d, even)),

@@ -121,8 +121,17 @@ HWY_INLINE Lane<N> pick(Bools<N> condition, std::type_identity_t<Lane<N>> a, std
 }
 // Toward zero; what does not fit, and NaN, gives INT32_MIN.
 HWY_INLINE Ints to_int(Floats a) {
+#if HWY_ARCH_X86
+  return fitting_int(a);  // which says so by itself
+#else
   const Bools<f32> fits = a >= -2147483648.0f && a < 2147483648.0f;
   return pick(Bools<i32>{hn::RebindMask(Tag<i32>(), fits.mask)}, fitting_int(a), std::numeric_limits<i32>::min());
+#endif
+}
+// Calls f where the condition holds in all lanes, else g.
+template <class N, class F, class G>
+HWY_INLINE auto where_all(Bools<N> condition, F f, G g) {
+  return all(condition) ? f() : g();
 }
 // Calls f where the condition holds in all lanes, g where it holds in none, else both. Each stands here once: what is
 // inlined doubles with every other place.

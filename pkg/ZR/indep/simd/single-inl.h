@@ -29,9 +29,17 @@ template <class F, class G>
 [[gnu::always_inline]] constexpr auto choose(bool condition, F f, G g) {
   return condition ? f() : g();
 }
+template <class F, class G>
+[[gnu::always_inline]] constexpr auto where_all(bool condition, F f, G g) {
+  return condition ? f() : g();
+}
 template <int bits>
 constexpr i32 shifted_right(i32 a) {
   return a >> bits;
+}
+template <int bits>
+constexpr i32 shifted_left(i32 a) {
+  return static_cast<i32>(static_cast<u32>(a) << bits);
 }
 constexpr i32 masked(i32 a, i32 bits) { return a & bits; }
 constexpr i32 held(i32 v, i32 low, i32 high) { return v < low ? low : v > high ? high : v; }
