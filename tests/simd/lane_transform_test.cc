@@ -117,22 +117,30 @@ TYPED_TEST(LaneWorlds, ScaledCopies) {
           pixels[i].alpha = this->part_of_white(i % width < trial % 160 ? 1.0f : 0.0f);
       dst = this->world(this->dst_, width / 2, height / 2, trial % 2 != 0, false);
     }
+    if (trial % 3 == 1) {  // doubles, where halves are common
+      const i32 width = 1 + this->below(50), height = 1 + this->below(2);
+      src = this->world(this->src_, width, height, trial % 2 == 0, false);
+      dst = this->world(this->dst_, 2 * width, 2 * height, trial % 2 != 0, false);
+    }
     for (const auto copy : {&ZR_CopyBits_Draft, &ZR_CopyBits_HQ_Straight})
       this->compare("trial " + std::to_string(trial), dst, [&] { return copy(nullptr, &src, &dst, nullptr, nullptr); });
     if (this->HasFatalFailure()) return;
   }
 }
 
-// Rows of a large destination are kept beside it.
+// Rows of a large destination are kept beside it, and those between two rows of the source for many rows.
 TYPED_TEST(LaneWorlds, LargeScaledCopies) {
   using T = TypeParam;
   ZR_LayerDef src = this->world(this->src_, 90, 5, true, false);
+  auto* const top = static_cast<T*>(src.data);
+  for (i32 i = 0; i < 2 * src.width; ++i) top[i].alpha = this->part_of_white(i % src.width < 50 ? 1.0f : 0.0f);
   constexpr i32 width = 1201, height = 901;
   std::vector<T> pixels(static_cast<std::size_t>(width * height));
   ZR_LayerDef dst{};
   dst.flags = zr::Depth<T>::layer_flags;
   dst.width = width, dst.height = height, dst.row_bytes = width * static_cast<i32>(sizeof(T)), dst.data = pixels.data();
-  this->compare("large", dst, [&] { return ZR_CopyBits_Draft(nullptr, &src, &dst, nullptr, nullptr); });
+  for (const auto copy : {&ZR_CopyBits_Draft, &ZR_CopyBits_HQ_Straight})
+    this->compare("large", dst, [&] { return copy(nullptr, &src, &dst, nullptr, nullptr); });
 }
 
 TYPED_TEST(LaneWorlds, SummedAreas) {

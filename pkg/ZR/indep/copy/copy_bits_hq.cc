@@ -7,6 +7,8 @@
 
 #include "copy/copy_bits.h"
 #include "copy/copy_rects.h"
+#include "copy/copy_scaled.h"
+#include "sample/lane_copies.h"
 #include "sample/sample_functions.h"
 #include "world/guard.h"
 #include "world/slot_table.h"
@@ -41,7 +43,8 @@ struct SampledAxis {
 template <class T>
 struct InnerRow {
   LaneRowFunc<T>* row = nullptr;
-  bool boxes = false;  // it averages boxes; else it is bilinear
+  LaneCopyFunc<T>* copy = nullptr;  // takes many rows, of worlds that share no memory
+  bool boxes = false;               // it averages boxes; else it is bilinear
 
   // The pixels of a row for which it may: all that they read lies inside.
   PixelRange range(const SampleRun& run, const ZR_SampPB& params) const {
@@ -77,6 +80,7 @@ struct SampledCopy {
     params.area = truncate_i32(x.step / 65536.0 * y.step);
     params.src = src;
     const ZR_WorldX<T> out(dst, false);
+    i32 copied = 0;  // rows below here have their inner pixels
     i32 at_y = y.start;
     for (i32 row = 0; row < rows; ++row) {
       T* const pixels = out.At(x.first, y.first + row);
@@ -85,14 +89,27 @@ struct SampledCopy {
         for (i32 k = first; k < end; ++k, at_x = wrap_add(at_x, x.step))
           sample(nullptr, at_x, at_y, &params, pixels + k);
       };
-      const PixelRange range = inner.range({columns, x.start, at_y, x.step, 0}, params);
+      const auto inner_at = [&](i32 y_at) { return inner.range({columns, x.start, y_at, x.step, 0}, params); };
+      const PixelRange range = inner_at(at_y);
       i32 done = 0;
       if (range.first < range.end) {
         each(0, range.first);
         const i32 from = wrap_add(x.start, wrap_mul(range.first, x.step));
+        if (inner.copy != nullptr && row >= copied) {
+          // As far as the next poll and as the same columns go.
+          const i32 last = std::min((row + 63) & ~63, rows - 1);
+          CopyPart<T> part = {range.end - range.first, 1, from, at_y, x.step, y.step, pixels + range.first,
+                              dst->row_bytes};
+          for (i32 next = wrap_add(at_y, y.step); row + part.rows <= last; ++part.rows, next = wrap_add(next, y.step)) {
+            const PixelRange other = inner_at(next);
+            if (other.first != range.first || other.end != range.end) break;
+          }
+          if (inner.copy(part, params)) copied = row + part.rows;
+        }
         RowSum<T> alphas = 0;
-        done = range.first +
-               inner.row({range.end - range.first, from, at_y, x.step, 0}, params, &alphas, pixels + range.first);
+        done = row < copied ? range.end
+                            : range.first + inner.row({range.end - range.first, from, at_y, x.step, 0}, params, &alphas,
+                                                      pixels + range.first);
       }
       each(done, columns);
       if ((row & 63) == 0 && progress != nullptr && progress->abort != nullptr) {
@@ -133,7 +150,9 @@ i32 copy_straight(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef
     // What the slots hold now, and the library's own for float.
     const SampleFunctions<T> samplers = sample_functions<T>(1);
     const bool boxes = copy.shrinks();
-    const InnerRow<T> inner = {boxes ? box_row(samplers) : clipping_row(samplers), boxes};
+    InnerRow<T> inner = {boxes ? box_row(samplers) : clipping_row(samplers), nullptr, boxes};
+    if (inner.row != nullptr && !boxes && !CopyPlane(*src, sizeof(T)).may_overlap(CopyPlane(*dst, sizeof(T))))
+      inner.copy = lane_bilinear_copy<T>();
     return copy.run<T>(progress, src, dst, boxes ? samplers.area : samplers.clipping, inner, copy.x.count(),
                        copy.y.count());
   });

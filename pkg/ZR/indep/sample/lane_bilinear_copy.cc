@@ -1,0 +1,323 @@
+// Enlarged copies on lanes: each row of the source is interpolated along once for all the rows of the destination that
+// show it. That is another order of roundings than the sampler's, so a bound of what both may be off tells where the
+// rounded result is the same; the few other vectors are left to the sampler's own rows.
+#include "sample/lane_copies.h"
+
+#undef HWY_TARGET_INCLUDE
+#define HWY_TARGET_INCLUDE "sample/lane_bilinear_copy.cc"
+#include <hwy/foreach_target.h>
+
+#include "simd/lanes-inl.h"
+#if ZR_HAS_LANES
+#include <hwy/cache_control.h>
+
+#include "sample/lane_samples-inl.h"
+
+HWY_BEFORE_NAMESPACE();
+namespace zr {
+namespace HWY_NAMESPACE {
+
+template <class T>
+using RealOf = std::conditional_t<std::is_same_v<T, ZR_Pixel16>, Doubles, Floats>;
+
+// Fused where the processor can: bounds allow for either.
+HWY_INLINE Floats mul_add(Floats a, Floats b, Floats c) { return hn::MulAdd(a.v, b.v, c.v); }
+HWY_INLINE Doubles mul_add(Doubles a, Doubles b, Doubles c) {
+  return {hn::MulAdd(a.low, b.low, c.low), hn::MulAdd(a.high, b.high, c.high)};
+}
+
+// What the sampler's result and ours may be off together, in steps of a channel.
+//
+// 8 bits, with u = 2^-24: the sampler's four weights are off by 5.5u together and its products and sums by 3u; ours by
+// 5u. With the sums of halves that is less than 4000u. A quotient is off by 5.5u * 255^2 / S for the weights under an
+// alpha of S, and by 24u of itself for both; with the sums of halves less than 6500u and 0.022 / S.
+// 16 bits, in double precision: sums of opaque pixels are exact, and quotients off by less than 2^-30.
+template <class T>
+struct Doubt {
+  static constexpr f32 of_sums = 0x1p-12f, of_quotients = 0x1.cp-12f, over_alpha = 0.022f;
+};
+template <>
+struct Doubt<ZR_Pixel16> {
+  static constexpr f32 of_sums = 0x1p-24f, of_quotients = 0x1p-24f, over_alpha = 0.0f;
+};
+
+// Off by 3u at most.
+HWY_INLINE Floats inverse_of(Floats v) {
+#if HWY_ARCH_X86
+  const Floats estimate = hn::ApproximateReciprocal(v.v);
+  return estimate * Floats(hn::NegMulAdd(v.v, estimate.v, hn::Set(Tag<f32>(), 2.0f)));
+#else
+  return 1.0f / v;
+#endif
+}
+HWY_INLINE Doubles inverse_of(Doubles v) { return Doubles(1.0) / v; }
+
+// Numbers to the nearest integers, and the lanes where they lie too near to the middle between two.
+class FloatRounding {
+ public:
+  HWY_INLINE FloatRounding() : differences_(0) {}
+  // Of v * by.
+  HWY_INLINE Ints nearest(Floats v, Floats by, Floats doubt) {
+    const Ints least = fitting_int(mul_add(v, by, 0.5f - doubt));
+    differences_ = differences_ | (least ^ fitting_int(mul_add(v, by, 0.5f + doubt)));
+    return least;
+  }
+  HWY_INLINE Bools<i32> unsure() const { return differences_ != 0; }
+
+ private:
+  Ints differences_;
+};
+class DoubleRounding {
+ public:
+  HWY_INLINE DoubleRounding() : most_(0.0) {}
+  HWY_INLINE Ints nearest(Doubles v, Doubles by, Doubles) {
+    const Doubles product = v * by, above = product + no_fraction, off = product - (above - no_fraction);
+    most_ = {hn::Max(most_.low, hn::Abs(off.low)), hn::Max(most_.high, hn::Abs(off.high))};
+    return low_words(above);
+  }
+  HWY_INLINE Bools<i32> unsure() const {
+    const Tag<i32> d;
+    const auto limit = hn::Set(Tag<f64>(), 0.5 - 0x1p-24);
+    const auto words = [&](auto v) HWY_ATTR { return hn::BitCast(d, hn::VecFromMask(Tag<f64>(), hn::Gt(v, limit))); };
+    return Ints(hn::ConcatEven(d, words(most_.high), words(most_.low))) != 0;
+  }
+  // Of exact numbers of 32 bits of fraction, halves upward.
+  static HWY_INLINE Ints half_up(Doubles v) { return low_words((v + 0x1p-34) + no_fraction); }
+
+ private:
+  static constexpr f64 no_fraction = 0x1p52;
+  static HWY_INLINE Ints low_words(Doubles v) {
+    const Tag<i32> d;
+    return hn::ConcatEven(d, hn::BitCast(d, v.high), hn::BitCast(d, v.low));
+  }
+  Doubles most_;
+};
+template <class T>
+using Rounding = std::conditional_t<std::is_same_v<T, ZR_Pixel16>, DoubleRounding, FloatRounding>;
+
+enum class Alphas { any, white, clear };
+
+// Vectors of the destination that are worked on together: two rows of numbers stay in the first cache.
+inline constexpr i32 stretch = 16;
+
+// A row of the source as it is between its pixels, at the columns of a stretch.
+template <class T>
+struct BetweenPixels {
+  enum Holds { nothing, colours, weighted };  // plain colours; or alpha, and colours times alpha
+  i32 y = -1;
+  Alphas alphas;
+  Holds holds;
+  RealOf<T> channel[4][stretch];
+};
+
+// What the alphas of pixels are; there are as many as a vector has lanes or more.
+template <class T>
+HWY_INLINE Alphas alphas_of(const T* pixels, i32 count) {
+  constexpr i32 lanes = lane_count(), white = Depth<T>::white;
+  Ints every(-1), any(0);
+  for (i32 i = 0;; i = std::min(i + lanes, count - lanes)) {
+    for (i32 k = 0; k < Raw<T>::words; ++k) {
+      const Ints words = hn::LoadU(Tag<i32>(), reinterpret_cast<const i32*>(pixels + i) + k * lanes);
+      every = every & words, any = any | words;
+    }
+    if (i + lanes == count) break;
+  }
+  if constexpr (Raw<T>::words == 2) every = hn::DupEven(every.v), any = hn::DupEven(any.v);
+  constexpr i32 channel = std::numeric_limits<Channel<T>>::max();
+  every = masked(every, channel), any = masked(any, channel);
+  return all(any == 0) ? Alphas::clear : all(any == white && every == white) ? Alphas::white : Alphas::any;
+}
+
+template <class T, class Neighbours>
+class BetweenRows {
+  using Real = RealOf<T>;
+  using Row = BetweenPixels<T>;
+
+ public:
+  HWY_INLINE BetweenRows(const CopyPart<T>& part, const ZR_SampPB& params, LaneRowFunc<T>* sampler)
+      : part_(part), params_(params), sampler_(sampler) {
+    const i32 positions = part.x | part.step_x | part.y | part.step_y;
+    // With a few bits of fraction neither side rounds.
+    if (std::is_same_v<T, ZR_Pixel8> && (positions & 255) == 0) doubt_of_sums_ = 0.0f;
+  }
+
+  // All rows of the vectors from column `first` on.
+  HWY_INLINE void write(i32 first, i32 vectors) {
+    rows_[0].y = rows_[1].y = -1;
+    const Ints place = hn::Iota(Tag<i32>(), 0);
+    for (i32 i = 0; i < vectors; ++i) {
+      const Ints x = Ints(part_.x + (first + i * lane_count()) * part_.step_x) + place * part_.step_x;
+      right_[i] = to_real<Real>(masked(x, 65535)) * Real(0x1p-16f);
+    }
+    for (i32 j = 0; j < part_.rows; ++j) {
+      const i32 y = part_.y + j * part_.step_y, above = y >> 16;
+      Row &upper = rows_[above & 1], &lower = rows_[(above + 1) & 1];
+      look_at(first, vectors, above, &upper);
+      look_at(first, vectors, above + 1, &lower);
+      T* const dst = part_.row(j) + first;
+      if (upper.alphas == Alphas::clear && lower.alphas == Alphas::clear) {
+        write_clear(first, vectors, j, dst);
+        continue;
+      }
+      const Real below(static_cast<f32>(y & 65535) * 0x1p-16f), beside = Real(1.0f) - below;
+      if (upper.alphas == Alphas::white && lower.alphas == Alphas::white) {
+        fill<Row::colours>(first, vectors, &upper);
+        fill<Row::colours>(first, vectors, &lower);
+        for (i32 i = 0; i < vectors; ++i)
+          if (!write_opaque(i, upper, lower, beside, below, dst + i * lane_count()))
+            sample(first + i * lane_count(), j);
+      } else {
+        fill<Row::weighted>(first, vectors, &upper);
+        fill<Row::weighted>(first, vectors, &lower);
+        for (i32 i = 0; i < vectors; ++i)
+          if (!write_any(i, upper, lower, beside, below, dst + i * lane_count())) sample(first + i * lane_count(), j);
+      }
+    }
+  }
+
+ private:
+  HWY_INLINE SampleRun run_at(i32 first, i32 vectors, i32 y) const {
+    return {vectors * lane_count(), part_.x + first * part_.step_x, y << 16, part_.step_x, 0};
+  }
+  HWY_INLINE void look_at(i32 first, i32 vectors, i32 y, Row* row) const {
+    if (row->y == y) return;
+    const SampleRun run = run_at(first, vectors, y);
+    const i32 left = run.x >> 16, pixels = ((run.x + (run.count - 1) * run.step_x) >> 16) + 2 - left;
+    const ZR_LayerDef& src = *params_.src;
+    const T* const line =
+        reinterpret_cast<const T*>(static_cast<const char*>(src.data) + static_cast<std::ptrdiff_t>(y) * src.row_bytes);
+    row->y = y;
+    row->holds = Row::nothing;
+    row->alphas = pixels < lane_count() ? Alphas::any : alphas_of(line + left, pixels);
+    // Short parts of rows are no pattern that processors see.
+    const char* const ahead =
+        reinterpret_cast<const char*>(line + left) + 2 * static_cast<std::ptrdiff_t>(src.row_bytes);
+    constexpr i32 cache_line = 64;
+    if (y + 2 < src.height)
+      for (i32 i = 0; i < pixels * i32{sizeof(T)}; i += cache_line) hwy::Prefetch(ahead + i);
+  }
+  template <typename Row::Holds wanted>
+  HWY_INLINE void fill(i32 first, i32 vectors, Row* row) const {
+    if (row->holds == wanted) return;
+    row->holds = wanted;
+    Neighbours at(run_at(first, vectors, row->y), *params_.src);
+    for (i32 i = 0; i < vectors; ++i) {
+      if (i != 0) at.next();
+      Raw<T> p[2];
+      at.row(0, 0, p);
+      Real right = right_[i], left = Real(1.0f) - right;
+      if constexpr (wanted == Row::weighted) {
+        left = left * real_channel_of<Real, 0>(p[0]);
+        right = right * real_channel_of<Real, 0>(p[1]);
+        row->channel[0][i] = left + right;
+      }
+      const auto colour = [&](auto k) HWY_ATTR {
+        constexpr int c = decltype(k)::value;
+        row->channel[c][i] = mul_add(left, real_channel_of<Real, c>(p[0]), right * real_channel_of<Real, c>(p[1]));
+      };
+      colour(std::integral_constant<int, 1>());
+      colour(std::integral_constant<int, 2>());
+      colour(std::integral_constant<int, 3>());
+    }
+  }
+  // A vector by the sampler's own row.
+  HWY_INLINE void sample(i32 first, i32 j) const {
+    RowSum<T> alphas = 0;
+    sampler_(part_.run(first, lane_count(), j), params_, &alphas, part_.row(j) + first);
+  }
+
+  // Four equal neighbours are copied whatever they hold.
+  HWY_INLINE void write_clear(i32 first, i32 vectors, i32 j, T* dst) const {
+    Neighbours at(part_.run(first, vectors * lane_count(), j), *params_.src);
+    for (i32 i = 0; i < vectors; ++i) {
+      if (i != 0) at.next();
+      Raw<T> upper[2], lower[2];
+      at.row(0, 0, upper);
+      at.row(0, 1, lower);
+      Ints differences(0);
+      for (i32 k = 0; k < Raw<T>::words; ++k) {
+        const Ints w = upper[0].w[k];
+        differences = differences | ((w ^ upper[1].w[k]) | (w ^ lower[0].w[k]) | (w ^ lower[1].w[k]));
+      }
+      store(pick(differences == 0, upper[0], Raw<T>{}), dst + i * lane_count());
+    }
+  }
+  HWY_INLINE bool write_opaque(i32 i, const Row& upper, const Row& lower, Real beside, Real below, T* dst) const {
+    Rounding<T> rounding;
+    const auto colour = [&](i32 c) HWY_ATTR {
+      const Real v = mul_add(upper.channel[c][i], beside, lower.channel[c][i] * below);
+      if constexpr (std::is_same_v<T, ZR_Pixel16>)
+        return rounding.half_up(v);
+      else
+        return rounding.nearest(v, 1.0f, doubt_of_sums_);
+    };
+    store(packed<T>(i32{Depth<T>::white}, colour(1), colour(2), colour(3)), dst);
+    return none(rounding.unsure());
+  }
+  HWY_INLINE bool write_any(i32 i, const Row& upper, const Row& lower, Real beside, Real below, T* dst) const {
+    const auto between = [&](i32 c)
+                             HWY_ATTR { return mul_add(upper.channel[c][i], beside, lower.channel[c][i] * below); };
+    const Real alpha = between(0), inverse = inverse_of(alpha);
+    Rounding<T> rounding;
+    Real doubt(Doubt<T>::of_quotients);
+    if constexpr (Doubt<T>::over_alpha != 0) doubt = mul_add(inverse, Doubt<T>::over_alpha, doubt);
+    const auto colour = [&](i32 c) HWY_ATTR { return rounding.nearest(between(c), inverse, doubt); };
+    const Ints whole = rounding.nearest(alpha, 1.0f, Doubt<T>::of_sums);
+    store(packed<T>(whole, colour(1), colour(2), colour(3)), dst);
+    // Nothing is known of colours where there is next to no alpha.
+    return none(rounding.unsure() || whole == 0);
+  }
+
+  const CopyPart<T>& part_;
+  const ZR_SampPB& params_;
+  LaneRowFunc<T>* sampler_;
+  f32 doubt_of_sums_ = Doubt<T>::of_sums;
+  Real right_[stretch];  // the right neighbour's weight
+  Row rows_[2];
+};
+
+template <class T, class Neighbours>
+bool copy_between(const CopyPart<T>& part, const ZR_SampPB& params, LaneRowFunc<T>* sampler) {
+  constexpr i32 lanes = lane_count();
+  BetweenRows<T, Neighbours> rows(part, params, sampler);
+  const i32 vectors = part.columns / lanes;
+  for (i32 i = 0; i < vectors; i += stretch) rows.write(i * lanes, std::min(stretch, vectors - i));
+  if (vectors * lanes != part.columns) rows.write(part.columns - lanes, 1);  // overlaps the one before
+  return true;
+}
+
+template <class T>
+bool bilinear_copy(const CopyPart<T>& part, const ZR_SampPB& params) {
+  const LaneRows<T>* const rows = lane_bilinear_rows<T>();
+  const i32 last_row = std::max(part.y, part.y + (part.rows - 1) * part.step_y) >> 16;
+  if (part.columns < lane_count() || last_row >= 32767 || rows == nullptr || rows->no_clip == nullptr) return false;
+  if (Windowed<T, 2>::suits(part.run(0, part.columns, 0)))
+    return copy_between<T, Windowed<T, 2>>(part, params, rows->no_clip);
+  return copy_between<T, Scattered<T>>(part, params, rows->no_clip);
+}
+template bool bilinear_copy(const CopyPart<ZR_Pixel8>&, const ZR_SampPB&);
+template bool bilinear_copy(const CopyPart<ZR_Pixel16>&, const ZR_SampPB&);
+
+}  // namespace HWY_NAMESPACE
+}  // namespace zr
+HWY_AFTER_NAMESPACE();
+#endif
+
+#if HWY_ONCE
+#include "simd/variant.h"
+
+namespace zr {
+
+template <class T>
+LaneCopyFunc<T>* lane_bilinear_copy() {
+  if constexpr (!std::is_same_v<T, ZR_PixelFloat>) {
+    ZR_RETURN_BEST(bilinear_copy<T>);
+  }
+  return nullptr;
+}
+template LaneCopyFunc<ZR_Pixel8>* lane_bilinear_copy<ZR_Pixel8>();
+template LaneCopyFunc<ZR_Pixel16>* lane_bilinear_copy<ZR_Pixel16>();
+template LaneCopyFunc<ZR_PixelFloat>* lane_bilinear_copy<ZR_PixelFloat>();
+
+}  // namespace zr
+#endif
