@@ -104,6 +104,38 @@ TYPED_TEST(LaneWorlds, Transforms) {
   }
 }
 
+// Any phase, and those whose results lie close to halves; rows long enough for several parts, with clear, opaque and
+// other runs and with few different values.
+TYPED_TEST(LaneWorlds, Moves) {
+  using T = TypeParam;
+  constexpr f64 shifts[] = {0, 0.5, 0.25, 0.3, 0.1, 1.0 / 3, 0.0625, 1.0 / 65536, 65535.0 / 65536};
+  for (i32 trial = 0; trial < 300; ++trial) {
+    const auto shift = [&] { return this->below(3) == 0 ? this->below(65536) / 65536.0 : shifts[this->below(9)]; };
+    const i32 height = 2 + this->below(6);
+    const i32 width = 2 + this->below(8000 / static_cast<i32>(sizeof(T)) / height - 2);
+    ZR_LayerDef src = this->world(this->src_, width, height, this->below(2) != 0, this->below(2) != 0);
+    ZR_LayerDef dst = this->world(this->dst_, width, height, this->below(2) != 0, false);
+    const i32 kind = this->below(3);
+    std::vector<T> pixels = this->pixels_of(src);
+    for (T& p : pixels) {
+      const auto few = [&] { return this->part_of_white(static_cast<f32>(this->below(6)) * 0.2f); };
+      const auto any = [&] { return this->part_of_white(static_cast<f32>(this->below(256)) / 255.0f); };
+      if (kind == 1) p = {few(), few(), few(), few()};
+      if (kind == 2) p = {any(), any(), any(), any()};
+    }
+    this->put_back(src, pixels);
+    const GX_Matrix3 matrix = turned(1, 0, this->below(3) - 1 + shift(), this->below(3) - 1 + shift());
+    const GX_LRect all = {0, 0, width, height};
+    const ZR_CompositeModePlus mode(XferCopyFast, 1.0f, nullptr, false, 0);
+    // Onto another world, and onto itself.
+    for (ZR_LayerDef* onto : {&dst, &src})
+      this->compare("trial " + std::to_string(trial), *onto, [&] {
+        return ZR_TransformWorld(nullptr, 1, 0, 0, &src, &mode, nullptr, nullptr, &matrix, 1, true, &all, onto);
+      });
+    if (this->HasFatalFailure()) return;
+  }
+}
+
 TYPED_TEST(LaneWorlds, ScaledCopies) {
   for (i32 trial = 0; trial < 400; ++trial) {
     ZR_LayerDef src = this->any_world(this->src_);

@@ -313,7 +313,7 @@ class ComplexMotionRow final : public RowSampler<T> {
       const Placed& placed = placed_[k];
       if (!placed.regular) continue;  // a transparent sample adds nothing
       RowSum<T> alphas = 0;
-      note(sample_best_row<T>(samplers_, placed.params, placed.walk, count_, row, &alphas), &error);
+      note(sample_best_row<T>(samplers_, placed.params, placed.walk, count_, nullptr, row, &alphas), &error);
       if constexpr (!std::is_same_v<T, ZR_PixelFloat>)
         if (alphas == 0) continue;
       if (lanes_ != nullptr)

@@ -5,6 +5,7 @@
 #include <ZR/transfer_mode.h>
 
 #include <algorithm>
+#include <cstdint>
 #include <optional>
 
 #include "composite/scratch_state.h"
@@ -32,6 +33,18 @@ bool mask_lacks_pixels(const ZR_MaskWorld& mask, const GX_LRect& bounds) {
   const auto meets = [](i64 offset, i64 size, i32 low, i32 high) { return offset < high && offset + size > low; };
   return lacks_pixels(mask.world) && meets(mask.offset_x, mask.world.width, bounds.left, bounds.right) &&
          meets(mask.offset_y, mask.world.height, bounds.top, bounds.bottom);
+}
+
+// Whether rows of two worlds may be the same memory.
+template <class T>
+bool meet_in_memory(const ZR_LayerDef& a, const ZR_LayerDef& b) {
+  const auto first = [](const ZR_LayerDef& w) { return reinterpret_cast<std::intptr_t>(w.data); };
+  const auto last_row = [](const ZR_LayerDef& w) { return std::intptr_t{w.row_bytes} * (w.height - 1); };
+  const auto low = [&](const ZR_LayerDef& w) { return first(w) + std::min<std::intptr_t>(last_row(w), 0); };
+  const auto high = [&](const ZR_LayerDef& w) {
+    return first(w) + std::max<std::intptr_t>(last_row(w), 0) + std::intptr_t{w.width} * i32{sizeof(T)};
+  };
+  return low(a) < high(b) && low(b) < high(a);
 }
 
 // The last step of a layer that only moves by whole pixels: a plain rectangle. The library's own scratch takes
@@ -125,7 +138,7 @@ i32 draw_layer(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR
       if (is_draft)
         sampler = &draft.emplace(*src, params, walk, width);
       else
-        sampler = &best.emplace(sample_functions<T>(quality), params, walk, width);
+        sampler = &best.emplace(sample_functions<T>(quality), params, walk, width, !meet_in_memory<T>(*src, *dst));
     } else {
       const i32 samples = count > 2 ? count : is_draft ? 9 : 17;
       params.motion_steps = samples - 1;

@@ -8,8 +8,10 @@
 #include <cstdlib>
 #include <cstring>
 #include <limits>
+#include <optional>
 
 #include "copy/matrix_steps.h"
+#include "sample/moved_rows.h"
 #include "sample/sample_functions.h"
 
 namespace zr {
@@ -111,10 +113,10 @@ struct RowFunctions : SampleFunctions<T> {
       : SampleFunctions<T>(set), inner(no_clip_row(set)), inner_boxes(box_row(set)) {}
 };
 
-// One row by the samplers of a quality.
+// One row by the samplers of a quality. `moved` may be null.
 template <class T>
-i32 sample_best_row(const RowFunctions<T>& samplers, const ZR_SampPB& params, const SourceWalk& walk, i32 count, T* row,
-                    RowSum<T>* sum) {
+i32 sample_best_row(const RowFunctions<T>& samplers, const ZR_SampPB& params, const SourceWalk& walk, i32 count,
+                    MovedRows* moved, T* row, RowSum<T>* sum) {
   i32 error = ZR_Err_None;
   RowSum<T> total = 0;
   const auto x_at = [&](i32 i) { return wrap_add(walk.x, wrap_mul(i, walk.step_x)); };
@@ -149,6 +151,8 @@ i32 sample_best_row(const RowFunctions<T>& samplers, const ZR_SampPB& params, co
     while (first < end && !all_in(first++)) continue;
     while (end > first && !all_in(--end)) continue;
     if (first < end && walk.step_x == 0x10000 && walk.step_y == 0) {
+      if constexpr (std::is_same_v<T, ZR_Pixel8>)
+        if (moved != nullptr) first += moved->row(run(first, end), params, &total, row + first);
       AlphaSum<T> span_sum = 0;  // the run lies inside the range of positions: 2^16 pixels at most
       note(samplers.span(nullptr, end - first, x_at(first), walk.y, &params, &span_sum, row + first), &error);
       total += span_sum;
@@ -166,11 +170,19 @@ i32 sample_best_row(const RowFunctions<T>& samplers, const ZR_SampPB& params, co
 template <class T>
 class BestRow final : public RowSampler<T> {
  public:
-  BestRow(const SampleFunctions<T>& samplers, const ZR_SampPB& params, const SourceWalk& walk, i32 count)
-      : samplers_(samplers), params_(params), walk_(walk), count_(count) {}
+  // `still`: whether the source stays as it is from row to row.
+  BestRow(const SampleFunctions<T>& samplers, const ZR_SampPB& params, const SourceWalk& walk, i32 count, bool still)
+      : samplers_(samplers), params_(params), walk_(walk), count_(count) {
+    if constexpr (std::is_same_v<T, ZR_Pixel8>) {
+      const bool moves = walk.step_x == 0x10000 && walk.step_y == 0 && walk.row_x == 0 && walk.row_y == 0x10000;
+      const LaneMoved* const lanes = lane_moved();
+      LaneSpanFunc<T>* const exact = bilinear_span_row(samplers);
+      if (still && moves && lanes != nullptr && exact != nullptr) moved_.emplace(*lanes, exact);
+    }
+  }
 
   i32 sample(T* row, RowSum<T>* sum) override {
-    return sample_best_row<T>(samplers_, params_, walk_, count_, row, sum);
+    return sample_best_row<T>(samplers_, params_, walk_, count_, moved_ ? &*moved_ : nullptr, row, sum);
   }
   void next_row() override { walk_.next_row(); }
 
@@ -179,6 +191,7 @@ class BestRow final : public RowSampler<T> {
   ZR_SampPB params_;
   SourceWalk walk_;
   i32 count_;
+  std::optional<MovedRows> moved_;
 };
 
 }  // namespace zr

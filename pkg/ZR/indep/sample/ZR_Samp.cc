@@ -138,6 +138,11 @@ LaneRowFunc<T>* box_row(const SampleFunctions<T>& samplers) {
   const bool own = samplers.area == &ZR_AreaSample_CPlusPlus<T, 1> || samplers.area == &ZR_AreaSample_CPlusPlus<T, 2>;
   return own ? lane_box_row<T>() : nullptr;
 }
+LaneSpanFunc<ZR_Pixel8>* bilinear_span_row(const SampleFunctions<ZR_Pixel8>& samplers) {
+  if (samplers.span != &ZR_SubpixelSpanSampleTranslateNoClip_Straight) return nullptr;
+  const LaneRows<ZR_Pixel8>* const rows = lane_bilinear_rows<ZR_Pixel8>();
+  return rows != nullptr ? rows->span : nullptr;
+}
 template LaneRowFunc<ZR_Pixel8>* box_row(const SampleFunctions<ZR_Pixel8>&);
 template LaneRowFunc<ZR_Pixel16>* box_row(const SampleFunctions<ZR_Pixel16>&);
 template LaneRowFunc<ZR_PixelFloat>* box_row(const SampleFunctions<ZR_PixelFloat>&);

@@ -59,6 +59,7 @@ HWY_INLINE Raw<T> integer_mix(const Raw<T> (&p)[4], const LaneWeights<Real>& wei
   const Real half(0.5f);
   const Ints alpha = channel_of<0>(p[0]);
   if (all(equal)) {
+    if (all(alpha == 0)) return pick(same, p[0], Raw<T>{});
     const auto colour = [&](Real c) HWY_ATTR { return fitting_int(c + half); };
     const Raw<T> mixed = packed<T>(alpha, colour(in_pairs<1>(weights.w, p)), colour(in_pairs<2>(weights.w, p)),
                                    colour(in_pairs<3>(weights.w, p)));

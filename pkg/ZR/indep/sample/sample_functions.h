@@ -38,6 +38,8 @@ LaneRowFunc<T>* clipping_row(const SampleFunctions<T>& samplers);
 // The same for its area sampler and the pixels of boxes_inside().
 template <class T>
 LaneRowFunc<T>* box_row(const SampleFunctions<T>& samplers);
+// The same for its bilinear span sampler.
+LaneSpanFunc<ZR_Pixel8>* bilinear_span_row(const SampleFunctions<ZR_Pixel8>& samplers);
 
 // What takes whole vectors of pixels in motion: nothing where a sampler of the set is not the library's own.
 template <class T>
