@@ -212,12 +212,13 @@ TYPED_TEST(LaneRows, Depths) {
   const auto to = [&]<class Out>() {
     if constexpr (!std::is_same_v<T, Out>) {
       // Rows of floats to 8 bits have another rule where there are vectors, unless they begin between two pixels.
-      if constexpr (of_floats && std::is_same_v<Out, ZR_Pixel8>)
-        this->template compare<Out>("conversion", [](i32 n, T* s, T*, Out* d) {
-          zr::convert_row(n - 1, reinterpret_cast<const T*>(reinterpret_cast<const f32*>(s) + 1), d, false);
+      constexpr bool between = of_floats && std::is_same_v<Out, ZR_Pixel8>;
+      for (const bool dither : {false, true})
+        this->template compare<Out>(dither ? "dithered" : "conversion", [dither](i32 n, T* s, T*, Out* d) {
+          ZR_ResetDitherRandomIndex();
+          const T* const from = between ? reinterpret_cast<const T*>(reinterpret_cast<const f32*>(s) + 1) : s;
+          zr::convert_row(between ? n - 1 : n, from, d, dither);
         });
-      else
-        this->template compare<Out>("conversion", [](i32 n, T* s, T*, Out* d) { zr::convert_row(n, s, d, false); });
       if constexpr (of_floats)
         this->template compare<Out>("clamped", [](i32 n, T* s, T*, Out* d) { zr::narrow_row(n, s, d); });
       this->template compare<Out>("linear floats",

@@ -5,6 +5,7 @@
 #include <ZR/depth.h>
 #include <ZR/platform.h>
 
+#include <algorithm>
 #include <cstdint>
 #include <type_traits>
 
@@ -34,66 +35,62 @@ void each_channel(i32 n, const From* src, To* dst, Rule rule) {
   for (i32 k = 0; k < 4 * left; ++k) out[k] = rule(in[k], k);
 }
 
-// The same with something drawn for every channel: draw(count, drawn) fills a block, or less at the end.
-template <class Drawn, class To, class From, class Draw, class Rule>
-void each_channel_with_drawn(i32 n, const From* src, To* dst, Draw draw, Rule rule) {
+// The same over `count` channels with something drawn for each of them.
+template <class To, class From, class Drawn, class Rule>
+void each_drawn(i32 count, const From* src, const Drawn* drawn, To* dst, Rule rule) {
   const auto* __restrict in = reinterpret_cast<const Channel<From>*>(src);
   auto* __restrict out = reinterpret_cast<Channel<To>*>(dst);
-  Drawn drawn[block_channels];
-  i32 left = 4 * n;
-  for (; left >= block_channels; left -= block_channels, in += block_channels, out += block_channels) {
-    draw(block_channels, drawn);
+  if (count == block_channels)  // a count that the compiler knows
     for (i32 k = 0; k < block_channels; ++k) out[k] = rule(in[k], drawn[k]);
+  else
+    for (i32 k = 0; k < count; ++k) out[k] = rule(in[k], drawn[k]);
+}
+
+// Calls convert(count, words, first pixel) with the words of block after block; a whole block may be read of any.
+template <class Convert>
+HWY_INLINE void each_dithered_block(i32 n, Convert convert) {
+  DitherRow dither;
+  u32 words[block_channels] = {};
+  for (i32 first = 0; first < n; first += block_channels / 4) {
+    const i32 count = 4 * std::min(n - first, block_channels / 4);
+    const auto drawn = static_cast<std::size_t>(count);
+    if (count == block_channels)
+      convert(count, dither.next(drawn, words), first);
+    else
+      dither.draw(drawn, words), convert(count, words, first);
   }
-  draw(left, drawn);
-  for (i32 k = 0; k < left; ++k) out[k] = rule(in[k], drawn[k]);
 }
 
 inline void narrow_16_dithered(i32 n, const ZR_Pixel16* src, ZR_Pixel8* dst) {
-  DitherRow dither;
-  const auto draw = [&](i32 count, u32* words) { dither.draw(static_cast<std::size_t>(count), words); };
-  each_channel_with_drawn<u32>(n, src, dst, draw, [](u16 v, u32 word) { return narrow_16_to_8_dither(v, word); });
-}
-
-template <class Rule>
-void narrow_float_dithered(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst, Rule rule) {
-  DitherRow dither;
-  const auto draw = [&](i32 count, f32* offsets) {
-    u32 words[block_channels];
-    dither.draw(static_cast<std::size_t>(count), words);
-    for (i32 k = 0; k < count; k += 4) {  // drawn for alpha, red, blue, green
-      offsets[k] = dither_offset(words[k]);
-      offsets[k + 1] = dither_offset(words[k + 1]);
-      offsets[k + 2] = dither_offset(words[k + 3]);
-      offsets[k + 3] = dither_offset(words[k + 2]);
-    }
-  };
-  each_channel_with_drawn<f32>(n, src, dst, draw, [rule](f32 c, f32 offset) { return rule(c + offset); });
+  each_dithered_block(n, [&](i32 count, const u32* words, i32 first) HWY_ATTR {
+    each_drawn(count, src + first, words, dst + first, [](u16 v, u32 word) { return narrow_16_to_8_dither(v, word); });
+  });
 }
 
 // The plain loops serve single numbers; the compiled baseline is what these run as.
 #define ZR_NARROWS_BY_LANES (ZR_HAS_LANES && HWY_TARGET != HWY_STATIC_TARGET)
 #if ZR_NARROWS_BY_LANES
-// Channels by rule(vector of floats), which gives integers; what does not fit the channel saturates.
+// Channels by rule(vector of floats, index of the first), which gives integers; what does not fit the channel
+// saturates.
 template <class To, class Rule>
 HWY_INLINE void narrow_lanes(i32 n, const ZR_PixelFloat* src, To* dst, Rule rule) {
   using C = Channel<To>;
   constexpr i32 vectors = 4, lanes = lane_count(), block = vectors * lanes;
-  const auto one = [&](const f32* in, C* out) HWY_ATTR {
+  const auto one = [&](const f32* in, C* out, i32 first) HWY_ATTR {
     const hn::Rebind<C, Tag<i32>> narrow;
-    for (i32 k = 0; k < vectors; ++k)
-      hn::StoreU(hn::DemoteTo(narrow, rule(Floats(hn::LoadU(Tag<f32>(), in + k * lanes))).v), narrow, out + k * lanes);
+    for (i32 k = 0; k < vectors * lanes; k += lanes)
+      hn::StoreU(hn::DemoteTo(narrow, rule(Floats(hn::LoadU(Tag<f32>(), in + k)), first + k).v), narrow, out + k);
   };
   const f32* const in = reinterpret_cast<const f32*>(src);
   C* const out = reinterpret_cast<C*>(dst);
   i32 i = 0;
-  for (; i <= 4 * n - block; i += block) one(in + i, out + i);
+  for (; i <= 4 * n - block; i += block) one(in + i, out + i, i);
   if (i >= 4 * n) return;
   const auto rest = static_cast<std::size_t>(4 * n - i);
   f32 last[block] = {};
   C made[block];
   std::memcpy(last, in + i, rest * sizeof(f32));
-  one(last, made);
+  one(last, made, i);
   std::memcpy(out + i, made, rest * sizeof(C));
 }
 
@@ -120,19 +117,43 @@ template <class To>
 void narrow_scalar(i32 n, const ZR_PixelFloat* src, To* dst) {
   constexpr i32 bits = static_cast<i32>(std::numeric_limits<Channel<To>>::max());
   const Bools<f32> is_alpha = {hn::RebindMask(Tag<f32>(), (masked(Ints(hn::Iota(Tag<i32>(), 0)), 3) == 0).mask)};
-  narrow_lanes(n, src, dst, [=](Floats c) HWY_ATTR {
+  narrow_lanes(n, src, dst, [=](Floats c, i32) HWY_ATTR {
     const Floats scaled = c * static_cast<f32>(Depth<To>::white);
     return masked(to_int(pick(is_alpha, scaled, clamped<To>(scaled)) + 0.5f), bits);
   });
 }
 template <class To>
 void narrow_clamped(i32 n, const ZR_PixelFloat* src, To* dst) {
-  narrow_lanes(n, src, dst, [](Floats c) HWY_ATTR {
+  narrow_lanes(n, src, dst, [](Floats c, i32) HWY_ATTR {
     return fitting_int(clamped<To>(c * static_cast<f32>(Depth<To>::white)) + 0.5f);
   });
 }
 inline void narrow_nearest(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst) {
-  narrow_lanes(n, src, dst, [](Floats c) HWY_ATTR { return nearest_int(c * 255.0f); });
+  narrow_lanes(n, src, dst, [](Floats c, i32) HWY_ATTR { return nearest_int(c * 255.0f); });
+}
+
+// What is added to whole pixels: words are drawn for alpha, red, blue, green.
+HWY_INLINE Floats dither_offsets(const u32* drawn) {
+  const Tag<u32> d;
+  const Tag<u64> pairs;
+  const auto words = hn::LoadU(d, drawn);
+  const auto swapped = hn::BitCast(pairs, hn::Shuffle2301(words));
+  const Ints ordered = hn::BitCast(Tag<i32>(), hn::OddEven(swapped, hn::BitCast(pairs, words)));
+  // Both halves are exact, so that their sum is rounded once.
+  const Floats high = to_float(Ints(hn::BitCast(Tag<i32>(), hn::ShiftRight<16>(hn::BitCast(d, ordered.v)))));
+  const Floats word = high * 65536.0f + to_float(masked(ordered, 65535));
+  return word * 0x1p-40f - 0x1p-9f;
+}
+inline void narrow_float_dithered(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst, bool nearest) {
+  each_dithered_block(n, [&](i32 count, const u32* words, i32 first) HWY_ATTR {
+    const auto dithered = [=](Floats c, i32 at) HWY_ATTR { return (c + dither_offsets(words + at)) * 255.0f; };
+    if (nearest)
+      narrow_lanes(count / 4, src + first, dst + first,
+                   [=](Floats c, i32 at) HWY_ATTR { return nearest_int(dithered(c, at)); });
+    else
+      narrow_lanes(count / 4, src + first, dst + first,
+                   [=](Floats c, i32 at) HWY_ATTR { return fitting_int(clamped<ZR_Pixel8>(dithered(c, at)) + 0.5f); });
+  });
 }
 #else
 template <class To>
@@ -153,6 +174,24 @@ void narrow_clamped(i32 n, const ZR_PixelFloat* src, To* dst) {
 }
 inline void narrow_nearest(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst) {
   each_channel(n, src, dst, [](f32 c, i32) { return narrow_float_to_8_nearest(c); });
+}
+
+inline void narrow_float_dithered(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst, bool nearest) {
+  each_dithered_block(n, [&](i32 count, const u32* words, i32 first) {
+    f32 offsets[block_channels];
+    for (i32 k = 0; k < count; k += 4) {  // drawn for alpha, red, blue, green
+      offsets[k] = dither_offset(words[k]);
+      offsets[k + 1] = dither_offset(words[k + 1]);
+      offsets[k + 2] = dither_offset(words[k + 3]);
+      offsets[k + 3] = dither_offset(words[k + 2]);
+    }
+    if (nearest)
+      each_drawn(count, src + first, offsets, dst + first,
+                 [](f32 c, f32 offset) { return narrow_float_to_8_nearest(c + offset); });
+    else
+      each_drawn(count, src + first, offsets, dst + first,
+                 [](f32 c, f32 offset) { return narrow_float_colour<ZR_Pixel8>(c + offset); });
+  });
 }
 #endif
 
@@ -178,10 +217,7 @@ void convert(i32 n, const From* src, To* dst, bool dither) {
   } else if constexpr (to16) {
     narrow_scalar(n, src, dst);
   } else if (dither) {
-    if (takes_vector_rule(src))
-      narrow_float_dithered(n, src, dst, [](f32 c) { return narrow_float_to_8_nearest(c); });
-    else  // with dither the scalar rule clamps alpha too
-      narrow_float_dithered(n, src, dst, [](f32 c) { return narrow_float_colour<To>(c); });
+    narrow_float_dithered(n, src, dst, takes_vector_rule(src));  // by either rule alpha is clamped too
   } else if (takes_vector_rule(src)) {
     narrow_nearest(n, src, dst);
   } else {

@@ -44,6 +44,16 @@ void DitherRow::draw(std::size_t count, u32* words) {
   }
 }
 
+const u32* DitherRow::next(std::size_t count, u32* words) {
+  if (static_cast<std::size_t>(ZR_DitherTable.end - cursor_) > count) {
+    const u32* const first = cursor_ + 1;
+    cursor_ += count;
+    return first;
+  }
+  draw(count, words);
+  return words;
+}
+
 }  // namespace zr
 
 extern "C" void ZR_ResetDitherRandomIndex() {

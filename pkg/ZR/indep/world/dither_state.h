@@ -24,6 +24,8 @@ class DitherRow {
   // The next `count` words. The cursor steps before it reads, so that the first word after a reset is
   // entry 1, and entry 0 is reached by wrapping only.
   void draw(std::size_t count, u32* words);
+  // The same words where they lie, or else in `words`.
+  const u32* next(std::size_t count, u32* words);
 
  private:
   const u32* cursor_;
