@@ -152,7 +152,10 @@ i32 sample_best_row(const RowFunctions<T>& samplers, const ZR_SampPB& params, co
     while (end > first && !all_in(--end)) continue;
     if (first < end && walk.step_x == 0x10000 && walk.step_y == 0) {
       if constexpr (std::is_same_v<T, ZR_Pixel8>)
-        if (moved != nullptr) first += moved->row(run(first, end), params, &total, row + first);
+        if (moved != nullptr && moved->suits(end - first)) {
+          moved->row(run(first, end), params, &total, row + first);
+          first = end;
+        }
       AlphaSum<T> span_sum = 0;  // the run lies inside the range of positions: 2^16 pixels at most
       note(samplers.span(nullptr, end - first, x_at(first), walk.y, &params, &span_sum, row + first), &error);
       total += span_sum;

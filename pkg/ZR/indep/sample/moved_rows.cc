@@ -12,6 +12,7 @@
 namespace zr {
 namespace {
 
+constexpr i32 most_lanes = 16;
 constexpr i32 most_mixed = 64;  // vectors at once
 constexpr i32 no_row = std::numeric_limits<i32>::min();
 
@@ -52,8 +53,20 @@ void MovedRows::start(const SampleRun& run, const ZR_SampPB& params) {
   x_ = run.x, y_ = run.y, count_ = run.count;
 }
 
-i32 MovedRows::row(const SampleRun& run, const ZR_SampPB& params, RowSum<ZR_Pixel8>* sum, ZR_Pixel8* dst) {
-  if (run.count < lanes_.pixels) return 0;
+// What no vector has reached, as the end of one.
+void MovedRows::finish(const SampleRun& run, const ZR_SampPB& params, RowSum<ZR_Pixel8>* sum, ZR_Pixel8* dst) const {
+  ZR_Pixel8 last[most_lanes];
+  AlphaSum<ZR_Pixel8> all = 0;
+  const i32 from = run.count - lanes_.pixels, done = vectors_ * lanes_.pixels;
+  if (done == run.count) return;
+  exact_({lanes_.pixels, run.x + from * 0x10000, run.y, 0x10000, 0}, params, &all, last);
+  for (i32 i = done; i < run.count; ++i) {
+    dst[i] = last[i - from];
+    *sum += dst[i].alpha;
+  }
+}
+
+void MovedRows::row(const SampleRun& run, const ZR_SampPB& params, RowSum<ZR_Pixel8>* sum, ZR_Pixel8* dst) {
   start(run, params);
   lanes_.kinds(vectors_, pixel_at<ZR_Pixel8>(*params.src, run.x >> 16, (run.y >> 16) + 1), lower_.data());
   const auto equal = [&](std::size_t k) { return upper_[k] == lower_[k] && upper_[k] != MovedKind::any; };
@@ -68,7 +81,7 @@ i32 MovedRows::row(const SampleRun& run, const ZR_SampPB& params, RowSum<ZR_Pixe
     else
       mix(from, end, run, params, sum, dst);
   }
-  return vectors_ * lanes_.pixels;
+  finish(run, params, sum, dst);
 }
 
 // Vectors [first, end) by the sampler. Returns the sum of alphas.

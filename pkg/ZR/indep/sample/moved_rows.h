@@ -39,7 +39,7 @@ enum class MovedKind : u8 { any, clear, opaque };
 inline constexpr i32 moved_block = 4;  // vectors
 
 struct LaneMoved {
-  i32 pixels;  // of a vector
+  i32 pixels;  // of a vector: 16 at most
   // The kind of every block; the last one may be shorter.
   void (*kinds)(i32 vectors, const ZR_Pixel8* row, MovedKind* kinds);
   void (*keep)(const MovedPart& row, const MovedPhase& phase);
@@ -54,9 +54,9 @@ const LaneMoved* lane_moved();
 class MovedRows {
  public:
   MovedRows(const LaneMoved& lanes, LaneSpanFunc<ZR_Pixel8>* exact) : lanes_(lanes), exact_(exact) {}
-  // Fills dst as the span sampler does and adds the alphas to *sum, as far as whole vectors go; returns how many
-  // pixels that are. The source stays as it is from call to call.
-  i32 row(const SampleRun& run, const ZR_SampPB& params, RowSum<ZR_Pixel8>* sum, ZR_Pixel8* dst);
+  // Fills dst as the span sampler does and adds the alphas to *sum. The source stays as it is from call to call.
+  bool suits(i32 count) const { return count >= lanes_.pixels; }
+  void row(const SampleRun& run, const ZR_SampPB& params, RowSum<ZR_Pixel8>* sum, ZR_Pixel8* dst);
 
  private:
   struct Label {
@@ -67,6 +67,7 @@ class MovedRows {
 
   void start(const SampleRun& run, const ZR_SampPB& params);
   AlphaSum<ZR_Pixel8> sample(i32 first, i32 end, const SampleRun& run, const ZR_SampPB& params, ZR_Pixel8* dst) const;
+  void finish(const SampleRun& run, const ZR_SampPB& params, RowSum<ZR_Pixel8>* sum, ZR_Pixel8* dst) const;
   void mix(i32 first, i32 end, const SampleRun& run, const ZR_SampPB& params, RowSum<ZR_Pixel8>* sum, ZR_Pixel8* dst);
 
   const LaneMoved& lanes_;
