@@ -19,14 +19,6 @@ std::string shown(const std::optional<GX_LRect>& r) {
          std::to_string(r->bottom);
 }
 
-// The same pixels with the rows counted from the bottom.
-template <class T>
-void turn_over(TestWorld<T>& world) {
-  ZR_LayerDef& layer = *world.layer();
-  layer.data = static_cast<char*>(layer.data) + static_cast<ptrdiff_t>(layer.height - 1) * layer.row_bytes;
-  layer.row_bytes = -layer.row_bytes;
-}
-
 template <class Pair>
 class DraftCopy : public BornLibrary {};
 template <class From, class To>
@@ -52,8 +44,8 @@ TYPED_TEST(DraftCopy, RandomRectangles) {
       src.at(0, 0) = {-0.25f, 1.5f, inf, nan};
       src.at(src.width() - 1, 0) = {nan, -inf, 1e30f, 0.5f / 255};
     }
-    if (round % 3 == 1) turn_over(src);
-    if (round % 5 == 1) turn_over(dst);
+    if (round % 3 == 1) src.turn_over();
+    if (round % 5 == 1) dst.turn_over();
     const TestWorld<To> before = dst;
     TestWorld<To> expected = dst;
     const auto from = rects.next({src.width(), src.height()});

@@ -72,12 +72,6 @@ class Dice {
 };
 
 template <class T>
-void turn_upside_down(TestWorld<T>& world) {
-  world.layer()->data = &world.at(0, world.height() - 1);
-  world.layer()->row_bytes = -world.layer()->row_bytes;
-}
-
-template <class T>
 class Transform : public BornLibrary {};
 using Depths = testing::Types<ZR_Pixel8, ZR_Pixel16, ZR_PixelFloat>;
 TYPED_TEST_SUITE(Transform, Depths);
@@ -97,7 +91,7 @@ TYPED_TEST(Transform, AsTheModelForRandomCalls) {
     const bool solid = dice.whole(0, 2) == 0;
     for (i32 i = 0; solid && i < src.width() * src.height(); ++i)
       src.at(i % src.width(), i / src.width()).alpha = static_cast<zr::Channel<T>>(zr::Depth<T>::white);
-    if (dice.whole(0, 3) == 0) turn_upside_down(src), turn_upside_down(dst);
+    if (dice.whole(0, 3) == 0) src.turn_over(), dst.turn_over();
     const ZR_MaskWorld mask = {*matte.layer(), dice.whole(-6, 9), dice.whole(-6, 9),
                                static_cast<u32>(dice.whole(0, 3))};
     TransformCall call;

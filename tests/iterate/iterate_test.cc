@@ -127,10 +127,11 @@ TYPED_TEST_SUITE(Iterators, Depths);
 
 TYPED_TEST(Iterators, EveryAreaAndPlacedSourceIsWalkedLikeTheModel) {
   using T = TypeParam;
-  TestWorld<T> dst(7, 5), small(4, 3), large(9, 8);
+  TestWorld<T> dst(7, 5), small(4, 3), large(9, 8), upward(6, 7);
+  upward.turn_over();
   size_t calls = 0;
   for (const Kind kind : {Kind::iterate, Kind::origin, Kind::no_clip})
-    for (TestWorld<T>* const src : {&small, &large, &dst, static_cast<TestWorld<T>*>(nullptr)}) {
+    for (TestWorld<T>* const src : {&small, &large, &upward, &dst, static_cast<TestWorld<T>*>(nullptr)}) {
       if (src == nullptr && kind != Kind::iterate) continue;
       for (size_t a = 0; a <= std::size(areas); ++a)
         for (const GX_LPoint& origin : origins) {
@@ -139,7 +140,8 @@ TYPED_TEST(Iterators, EveryAreaAndPlacedSourceIsWalkedLikeTheModel) {
           Recorder recorder;
           recorder.known = [&](const void* p) {
             const TestWorld<T>& world = src != nullptr ? *src : dst;
-            return p >= &world.at(0, 0) && p <= &world.at(world.width() - 1, world.height() - 1);
+            const auto ends = std::minmax<const void*>({&world.at(0, 0), &world.at(0, world.height() - 1)});
+            return p >= ends.first && p < static_cast<const T*>(ends.second) + world.width();
           };
           EXPECT_EQ(run(kind, recorder, 10, 100, src != nullptr ? src->layer() : nullptr, area, origin, dst), 0);
           ASSERT_TRUE(recorder.calls == expected.calls)

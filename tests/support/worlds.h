@@ -32,6 +32,11 @@ class TestWorld {
     return reinterpret_cast<T*>(static_cast<u8*>(layer_.data) + static_cast<ptrdiff_t>(y) * layer_.row_bytes)[x];
   }
   const T& at(i32 x, i32 y) const { return const_cast<TestWorld*>(this)->at(x, y); }
+  // Rows run from the bottom up from now on.
+  void turn_over() {
+    layer_.data = &at(0, height_ - 1);
+    layer_.row_bytes = -layer_.row_bytes;
+  }
   void fill(const T& pixel) {
     each([&](i32 x, i32 y) { at(x, y) = pixel; });
   }
