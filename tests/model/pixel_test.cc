@@ -105,14 +105,6 @@ TEST(ModelPixels, FloatThatIsNoNumber) {
           }
 }
 
-TEST(ModelPixels, FunctionTablesEndInNulls) {
-  for (i32 mode = 41; mode <= 43; ++mode) {
-    EXPECT_EQ(ZR_Get_Xfer1_table8(mode), nullptr);
-    EXPECT_EQ(ZR_Get_Xfer1_Opacity_table16(mode), nullptr);
-    EXPECT_EQ(ZR_Get_Xfer1_Opacity2_tableF(mode), nullptr);
-  }
-}
-
 TEST(ModelPixels, RandAndTransferFlags) {
   for (const u32 seed : {0u, 1u, 44487u, 44488u, 0x7fffffffu, 0x80000000u, 0xffffffffu, 123456789u}) {
     u32 ours = seed, theirs = seed;

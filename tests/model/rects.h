@@ -16,6 +16,11 @@ inline GX_LRect bounds(const ZR_LayerDef& w) { return {0, 0, w.width, w.height};
 inline GX_LRect moved(const GX_LRect& r, i32 dx, i32 dy) {
   return {r.left + dx, r.top + dy, r.right + dx, r.bottom + dy};
 }
+// By any distance, whatever is then beyond the numbers held to them.
+inline GX_LRect moved_far(const GX_LRect& r, i64 dx, i64 dy) {
+  const auto held = [](i64 v) { return static_cast<i32>(v < INT32_MIN ? INT32_MIN : v > INT32_MAX ? INT32_MAX : v); };
+  return {held(r.left + dx), held(r.top + dy), held(r.right + dx), held(r.bottom + dy)};
+}
 inline GX_LRect common(const GX_LRect& a, const GX_LRect& b) {
   return {most(a.left, b.left), most(a.top, b.top), least(a.right, b.right), least(a.bottom, b.bottom)};
 }
@@ -51,10 +56,10 @@ template <class D>
 i32 transfer_rect(const Progress& progress, i32 field, const GX_LRect& rect, const ZR_LayerDef& src,
                   const ZR_CompositeModePlus& mode, const ZR_LinearBlendingTables* tables, const ZR_MaskWorld* mask,
                   i32 dest_x, i32 dest_y, const ZR_LayerDef& dst) {
-  const i32 dx = dest_x - rect.left, dy = dest_y - rect.top;
+  const i64 dx = i64{dest_x} - rect.left, dy = i64{dest_y} - rect.top;
   GX_LRect r = common(rect, bounds(src));
   if (empty(r)) return 0;
-  r = common(moved(r, dx, dy), bounds(dst));
+  r = common(moved_far(r, dx, dy), bounds(dst));
   if (empty(r)) return 0;
   if (mask != nullptr && (mask->kind & 1) == 0)
     r = common(r, moved(bounds(mask->world), mask->offset_x, mask->offset_y));
@@ -68,7 +73,7 @@ i32 transfer_rect(const Progress& progress, i32 field, const GX_LRect& rect, con
       Row<D> s, d;
       std::vector<typename D::V> m;
       for (i32 x = r.left; x < r.right; ++x) {
-        s.push_back(load<D>(at<D>(src, x - dx, y - dy)));
+        s.push_back(load<D>(at<D>(src, static_cast<i32>(x - dx), static_cast<i32>(y - dy))));
         d.push_back(load<D>(at<D>(dst, x, y)));
         if (mask == nullptr) continue;
         const i32 mx = x - mask->offset_x, my = y - mask->offset_y;

@@ -38,7 +38,7 @@ void mix_by_matte(const Px<D>& s, typename D::V k, Px<D>& d) {
   if constexpr (is_float<D>) {
     const f32 p = s.a * k, q = (1 - k) * d.a, t = p + q;
     if (t == 0) return;
-    for (int i = 0; i < 3; ++i) d.c[i] = (s.c[i] * p + d.c[i] * q) / t;
+    for (int i = 0; i < 3; ++i) d.c[i] = D::div(s.c[i] * p + d.c[i] * q, t);
     d.a = t;
   } else {
     const i64 p = i64{s.a} * k, q = i64{D::white - k} * d.a, t = p + q;
@@ -158,17 +158,6 @@ typename D::V mask_value(const Px<D>& m, u32 kind) {
   auto v = (kind & 2) != 0 ? D::mul(m.a, luma(m)) : m.a;
   if ((kind & 1) != 0) v = D::inv(v);
   return static_cast<typename D::Channel>(v);
-}
-
-// Track matte row: fills channel 0 of `count` cells of out.
-template <class D>
-void track_matte(u32 count, const typename D::Pixel* src, i32 offset, i32 length, u32 kind, typename D::Pixel* out) {
-  const auto outside = static_cast<typename D::Channel>((kind & 1) != 0 ? D::white : 0);
-  for (i64 i = 0; i < i64{count}; ++i) {
-    const i64 from = i - offset;  // position in the source row
-    const bool inside = from >= 0 && from < length;
-    out[i].alpha = inside ? static_cast<typename D::Channel>(mask_value<D>(load<D>(src[from]), kind)) : outside;
-  }
 }
 
 }  // namespace model
