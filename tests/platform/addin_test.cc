@@ -6,7 +6,7 @@
 
 #include <dlfcn.h>
 
-#include "platform/temporary_folder.h"
+#include "support/temporary_folder.h"
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -55,8 +55,8 @@ class Modules : public testing::Test {
     DSK_ClearExtensionMap();
   }
   std::string copy(const char* module, const std::string& name) {
-    fs::copy_file(fs::path(ZR_TEST_MODULES) / module, folder.path(name));
-    return folder.path(name);
+    fs::copy_file(fs::path(ZR_TEST_MODULES) / module, folder / name);
+    return folder / name;
   }
   static bool loaded(const std::string& path) {
     void* const library = dlopen(path.c_str(), RTLD_NOW | RTLD_NOLOAD);
@@ -70,7 +70,7 @@ class Modules : public testing::Test {
   TemporaryFolder folder;
 
  private:
-  EnvironmentVariable log_{"ZR_LOG_FILE", folder.path("log.txt")};
+  EnvironmentVariable log_{"ZR_LOG_FILE", folder / "log.txt"};
   HB_MemoryStats before_{};
 };
 
@@ -80,8 +80,8 @@ TEST_F(Modules, WhatIsNoModuleIsRefusedWithItsReason) {
   folder.write("b_empty.znx", "");
   copy("later.ZNX", "c_later.ZNX");
   folder.write("e_other.txt", "not looked at");
-  fs::create_directory(folder.path("f_folder.ZNX"));
-  fs::create_symlink(folder.path("nowhere"), folder.path("g_dangling.ZNX"));
+  fs::create_directory(folder / "f_folder.ZNX");
+  fs::create_symlink(folder / "nowhere", folder / "g_dangling.ZNX");
   EXPECT_EQ(run(), 0);
   const auto& report = ADDIN_GetScanReport();
   const struct {
@@ -93,16 +93,14 @@ TEST_F(Modules, WhatIsNoModuleIsRefusedWithItsReason) {
                   {"g_dangling.ZNX", "No such file"}};
   ASSERT_EQ(report.size(), std::size(expected));
   for (std::size_t i = 0; i < report.size(); ++i) {
-    EXPECT_EQ(report[i].path, folder.path(expected[i].name));
+    EXPECT_EQ(report[i].path, folder / expected[i].name);
     EXPECT_FALSE(report[i].accepted);
     EXPECT_THAT(report[i].reason, HasSubstr(expected[i].reason));
     EXPECT_FALSE(loaded(report[i].path));
   }
   EXPECT_EQ(course.scanned, 0);
   EXPECT_EQ(course.done, 1);
-  std::ifstream log(folder.path("log.txt"));
-  const std::string text((std::istreambuf_iterator<char>(log)), {});
-  EXPECT_THAT(text, HasSubstr("b_empty.znx"));
+  EXPECT_THAT(slurp(folder / "log.txt"), HasSubstr("b_empty.znx"));
 }
 
 TEST_F(Modules, AFileStaysLoadedWhileARoutineIsRegistered) {
@@ -212,7 +210,7 @@ TEST_F(Modules, FoldersComeFromTheHostElseFromThePreference) {
   folder.write("b.ZNX", "x");
   folder.write("a.ZNX", "x");
   second.write("0.ZNX", "x");
-  const std::string list = folder.path() + "::" + folder.path("missing") + ":" + second.path() + ":" + folder.path();
+  const std::string list = folder.path() + "::" + (folder / "missing") + ":" + second.path() + ":" + folder.path();
   const EnvironmentVariable preference("ZR_MODULES_FOLDERS", list);
   const auto names = [] {
     std::string all;

@@ -71,25 +71,6 @@ TEST(RandomWords, AreAPrimeNumberTheSameForAllThreads) {
   EXPECT_EQ(again, start);
 }
 
-TEST(RandomWords, AreSpreadEvenly) {
-  const u32* words = nullptr;
-  i32 count = 0;
-  DIE_GetPrimeSizedTable(&words, &count);
-  std::vector<i32> ones(32), high(16), low(16);
-  for (i32 i = 0; i < count; ++i) {
-    for (u32 bit = 0; bit < 32; ++bit) ones[bit] += words[i] >> bit & 1;
-    ++high[words[i] >> 28];
-    ++low[words[i] & 15];
-  }
-  // Six standard deviations of a fair draw.
-  for (const i32 set : ones) EXPECT_NEAR(set, count / 2, 770);
-  for (u32 i = 0; i < 16; ++i) {
-    EXPECT_NEAR(high[i], count / 16, 375);
-    EXPECT_NEAR(low[i], count / 16, 375);
-  }
-  EXPECT_GT(std::set<u32>(words, words + count).size(), static_cast<std::size_t>(count - 10));
-}
-
 TEST(Extensions, TheFirstMappingOfANameWins) {
   DSK_ClearExtensionMap();
   ASSERT_EQ(DSK_AddExtensionMap(".ZNX", 1, -1), 0);

@@ -9,7 +9,7 @@
 #include <vector>
 
 #include "support/messages.h"
-#include "platform/temporary_folder.h"
+#include "support/temporary_folder.h"
 #include <gtest/gtest.h>
 
 namespace {

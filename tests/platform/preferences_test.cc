@@ -7,24 +7,18 @@
 #include <thread>
 #include <vector>
 
-#include "platform/temporary_folder.h"
+#include "support/temporary_folder.h"
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 namespace {
-
-std::string read(const std::string& path) {
-  std::ostringstream text;
-  text << std::ifstream(path).rdbuf();
-  return text.str();
-}
 
 class Preferences : public testing::Test {
  protected:
   void TearDown() override { OPT_Reload(); }
   TemporaryFolder folder;
   EnvironmentVariable config{"XDG_CONFIG_HOME", folder.path()};
-  EnvironmentVariable log{"ZR_LOG_FILE", folder.path("log.txt")};
+  EnvironmentVariable log{"ZR_LOG_FILE", folder / "log.txt"};
 };
 
 TEST_F(Preferences, TheEnvironmentStandsBeforeTheFile) {
@@ -55,7 +49,7 @@ word = "12x"
 }
 
 TEST_F(Preferences, AreReadOnceUntilReloadFromTheConfigurationFolder) {
-  std::filesystem::create_directory(folder.path("zr"));
+  std::filesystem::create_directory(folder / "zr");
   folder.write("zr/preferences.toml", "a = 1");
   OPT_Reload();
   EXPECT_EQ(OPT_GetInt("a", 0), 1);
@@ -70,13 +64,13 @@ TEST_F(Preferences, ADamagedFileIsToldOnceAndCountsAsEmpty) {
   OPT_Reload();
   EXPECT_EQ(OPT_GetInt("good", 5), 5);
   EXPECT_EQ(OPT_GetInt("good", 6), 6);
-  const std::string told = read(folder.path("log.txt"));
+  const std::string told = slurp(folder / "log.txt");
   EXPECT_THAT(told, testing::HasSubstr("line 2"));
   EXPECT_EQ(std::count(told.begin(), told.end(), '\n'), 1) << told;
-  const EnvironmentVariable missing("ZR_PREFERENCES", folder.path("not_there.toml"));
+  const EnvironmentVariable missing("ZR_PREFERENCES", folder / "not_there.toml");
   OPT_Reload();
   EXPECT_EQ(OPT_GetInt("good", 5), 5);
-  EXPECT_THAT(read(folder.path("log.txt")), testing::HasSubstr("not_there.toml"));
+  EXPECT_THAT(slurp(folder / "log.txt"), testing::HasSubstr("not_there.toml"));
 }
 
 TEST_F(Preferences, TheLogKeepsWholeLinesFromItsLevelUp) {
@@ -91,16 +85,16 @@ TEST_F(Preferences, TheLogKeepsWholeLinesFromItsLevelUp) {
   HBp_ReportErrString(0x250012, 8, "a message without a sink");
   HB_ReportFailedVerification(0x250013, 77, 0, "a check without a sink");
   JRN_Log(40, nullptr, nullptr, nullptr);
-  std::istringstream lines(read(folder.path("log.txt")));
+  std::istringstream lines(slurp(folder / "log.txt"));
   i32 whole = 0, others = 0;
   for (std::string line; std::getline(lines, line);) line.ends_with("ZR Key: text with {} and %s") ? ++whole : ++others;
   EXPECT_EQ(whole, 100);
   EXPECT_EQ(others, 3);
   EXPECT_THAT(lines.str(), testing::HasSubstr("0x250012: a message without a sink"));
   EXPECT_THAT(lines.str(), testing::HasSubstr("0x250013:77: a check without a sink"));
-  const EnvironmentVariable level("ZR_LOG_LEVEL", "10"), file("ZR_LOG_FILE", folder.path("other.txt"));
+  const EnvironmentVariable level("ZR_LOG_LEVEL", "10"), file("ZR_LOG_FILE", folder / "other.txt");
   JRN_Log(10, "ZR", "Birth", "ZR Birth");
-  EXPECT_THAT(read(folder.path("other.txt")), testing::HasSubstr("ZR Birth: ZR Birth"));
+  EXPECT_THAT(slurp(folder / "other.txt"), testing::HasSubstr("ZR Birth: ZR Birth"));
 }
 
 TEST_F(Preferences, ALogFileThatCannotBeOpenedIsNoFailure) {

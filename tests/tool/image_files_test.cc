@@ -8,7 +8,7 @@
 
 #include "file_values.h"
 #include "image_files.h"
-#include "temporary_folder.h"
+#include "support/temporary_folder.h"
 #include "tool_error.h"
 
 namespace zr::tool {

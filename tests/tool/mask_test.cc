@@ -1,10 +1,4 @@
 // Masks of the tool from outside: values of shapes and modes on small pictures, and mistakes in one line.
-#include <ZR/hostkit.h>
-#include <gmock/gmock.h>
-
-#include <algorithm>
-
-#include "image_files.h"
 #include "tool_run.h"
 
 namespace zr::tool {
@@ -15,54 +9,35 @@ using testing::HasSubstr;
 
 class Masks : public ToolRun {
  protected:
-  std::vector<int> read(char channel) {
-    const Hostkit host;
-    const OwnedWorld world = load_image(folder / "out.png", 8, "test");
-    std::vector<int> values;
-    for (i32 y = 0; y < world.height(); ++y)
-      for (i32 x = 0; x < world.width(); ++x) {
-        const ZR_Pixel8 p = world.row<ZR_Pixel8>(y)[x];
-        values.push_back(channel == 'a' ? p.alpha : p.red);
-      }
-    return values;
-  }
   std::vector<int> mask(const std::string& arguments) {
     EXPECT_EQ(run("mask -o out.png --force " + arguments), 0) << arguments << ": " << err;
-    return read('r');
+    return channel_of("out.png", 'r');
   }
 };
 
 TEST_F(Masks, BadCallsAreOneLineAndLeaveNothing) {
-  const struct {
-    std::string arguments;
-    int code;
-    const char* message;
-  } calls[] = {
-      {"--size 9x9", 2, "there is no shape"},
-      {"--rectangle '1 1 2 2'", 2, "one of a picture, --size and --like"},
-      {"in.png --size 9x9 --rectangle '1 1 2 2'", 2, "one of a picture, --size and --like"},
-      {"--size 9 --rectangle '1 1 2 2'", 2, "--size is \"9\"; it must be WIDTHxHEIGHT"},
-      {"--size 9x9 --rectangle '1 1 2'", 2, "--rectangle \"1 1 2\" begins with 3 numbers"},
-      {"--size 9x9 --rectangle '1 1 0 2'", 2, "has no area"},
-      {"--size 9x9 --rectangle '1 1 nan 2'", 2, "begins with 2 numbers"},
-      {"--size 9x9 --ellipse '1 1 1e7 2'", 2, "\"1e7\"; it must be a number -1000000 to 1000000"},
-      {"--size 9x9 --polygon '1,1 2,2 3'", 2, "x,y of 3 to 1000 points"},
-      {"--size 9x9 --ellipse '1 1 2 2 fether 3'", 2, "unknown word \"fether\"; the nearest is \"feather\""},
-      {"--size 9x9 --ellipse '1 1 2 2 feather'", 2, "lacks the number after \"feather\""},
-      {"--size 9x9 --ellipse '1 1 2 2 feather 1001'", 2, "a number 0 to 1000"},
-      {"--size 9x9 --ellipse '1 1 2 2 opacity 1.5'", 2, "opacity \"1.5\"; it must be a number 0 to 1"},
-      {"--size 9x9 --ellipse '1 1 2 2 mode substract'", 2, "the nearest is \"subtract\""},
-      {"--size 9x9 --ellipse '1 1 2 2' --fade 2", 2, "--fade is \"2\""},
-      {"--size 9x9 --ellipse '1 1 2 2' --depth float", 2, "a mask without a picture has 8 or 16"},
-      {"--like none.png --ellipse '1 1 2 2'", 3, "none.png does not exist"},
-      {"none.png --ellipse '1 1 2 2'", 3, "none.png does not exist"},
-  };
-  for (const auto& call : calls) {
-    EXPECT_EQ(run("mask -o out/a.png " + call.arguments), call.code) << call.arguments;
-    EXPECT_THAT(err, HasSubstr(call.message)) << call.arguments;
-    EXPECT_EQ(std::count(err.begin(), err.end(), '\n'), 1) << err;
-    EXPECT_THAT(folder.files(), testing::IsEmpty()) << call.arguments;
-  }
+  expect_refused(
+      "mask -o out/a.png ",
+      {
+          {"--size 9x9", 2, "there is no shape"},
+          {"--rectangle '1 1 2 2'", 2, "one of a picture, --size and --like"},
+          {"in.png --size 9x9 --rectangle '1 1 2 2'", 2, "one of a picture, --size and --like"},
+          {"--size 9 --rectangle '1 1 2 2'", 2, "--size is \"9\"; it must be WIDTHxHEIGHT"},
+          {"--size 9x9 --rectangle '1 1 2'", 2, "--rectangle \"1 1 2\" begins with 3 numbers"},
+          {"--size 9x9 --rectangle '1 1 0 2'", 2, "has no area"},
+          {"--size 9x9 --rectangle '1 1 nan 2'", 2, "begins with 2 numbers"},
+          {"--size 9x9 --ellipse '1 1 1e7 2'", 2, "\"1e7\"; it must be a number -1000000 to 1000000"},
+          {"--size 9x9 --polygon '1,1 2,2 3'", 2, "x,y of 3 to 1000 points"},
+          {"--size 9x9 --ellipse '1 1 2 2 fether 3'", 2, "unknown word \"fether\"; the nearest is \"feather\""},
+          {"--size 9x9 --ellipse '1 1 2 2 feather'", 2, "lacks the number after \"feather\""},
+          {"--size 9x9 --ellipse '1 1 2 2 feather 1001'", 2, "a number 0 to 1000"},
+          {"--size 9x9 --ellipse '1 1 2 2 opacity 1.5'", 2, "opacity \"1.5\"; it must be a number 0 to 1"},
+          {"--size 9x9 --ellipse '1 1 2 2 mode substract'", 2, "the nearest is \"subtract\""},
+          {"--size 9x9 --ellipse '1 1 2 2' --fade 2", 2, "--fade is \"2\""},
+          {"--size 9x9 --ellipse '1 1 2 2' --depth float", 2, "a mask without a picture has 8 or 16"},
+          {"--like none.png --ellipse '1 1 2 2'", 3, "none.png does not exist"},
+          {"none.png --ellipse '1 1 2 2'", 3, "none.png does not exist"},
+      });
 }
 
 // One row of six pixels each.
@@ -102,7 +77,7 @@ TEST_F(Masks, FeathersAreTheBlursOfPictures) {
     mask("--size 40x30 --rectangle '12 9 14 8'" + at);
     ASSERT_EQ(run("mask out.png -o alpha.png --force --rectangle '12 9 14 8'"), 0) << err;
     ASSERT_EQ(run("blur alpha.png -o out.png --force --radius 5.5 --channels a"), 0) << err;
-    const std::vector<int> blurred = read('a');
+    const std::vector<int> blurred = channel_of("out.png", 'a');
     const std::vector<int> feathered = mask("--size 40x30 --rectangle '12 9 14 8 feather 5.5'" + at);
     for (size_t i = 0; i < blurred.size(); ++i) EXPECT_NEAR(feathered[i], blurred[i], 2) << depth << ' ' << i;
   }
@@ -114,11 +89,11 @@ TEST_F(Masks, CutPicturesAndLayers) {
   mask("--size 6x1 --rectangle '0 0 3 1 opacity 0.4' --rectangle '3 0 3 1'");
   ASSERT_EQ(run("convert out.png -o in.png --to srgb"), 0) << err;
   ASSERT_EQ(run("mask in.png -o out.png --force --rectangle '2 0 2.6 1'"), 0) << err;
-  EXPECT_THAT(read('a'), ElementsAre(0, 0, 255, 255, 153, 0));
+  EXPECT_THAT(channel_of("out.png", 'a'), ElementsAre(0, 0, 255, 255, 153, 0));
   std::ofstream(folder / "s.json") << R"({"size":[6,2],"layers":[
     {"image":"in.png","mask":[{"shape":"rectangle","box":[2,0,2.6,1]}]}, {"image":"in.png","position":[0,1]}]})";
   ASSERT_EQ(run("render s.json -o out.png --force"), 0) << err;
-  EXPECT_THAT(read('a'), ElementsAre(0, 0, 255, 255, 153, 0, 255, 255, 255, 255, 255, 255))
+  EXPECT_THAT(channel_of("out.png", 'a'), ElementsAre(0, 0, 255, 255, 153, 0, 255, 255, 255, 255, 255, 255))
       << "the other layer's picture stays whole";
 }
 

@@ -3,11 +3,19 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <iterator>
 #include <optional>
 #include <string>
+#include <vector>
+
+inline std::string slurp(const std::string& file) {
+  std::ifstream stream(file, std::ios::binary);
+  return {std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
+}
 
 class TemporaryFolder {
  public:
@@ -23,10 +31,19 @@ class TemporaryFolder {
   TemporaryFolder(const TemporaryFolder&) = delete;
   TemporaryFolder& operator=(const TemporaryFolder&) = delete;
 
-  std::string path(const std::string& name = "") const { return (path_ / name).string(); }
+  std::string operator/(const std::string& name) const { return (path_ / name).string(); }
+  std::string path() const { return path_.string(); }
   std::string write(const std::string& name, const std::string& text) const {
     std::ofstream(path_ / name, std::ios::binary) << text;
-    return path(name);
+    return *this / name;
+  }
+  // Names of all files, folders left out, sorted.
+  std::vector<std::string> files() const {
+    std::vector<std::string> names;
+    for (const auto& entry : std::filesystem::recursive_directory_iterator(path_))
+      if (!entry.is_directory()) names.push_back(std::filesystem::relative(entry.path(), path_).string());
+    std::sort(names.begin(), names.end());
+    return names;
   }
 
  private:
