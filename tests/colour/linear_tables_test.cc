@@ -2,6 +2,7 @@
 #include <cmath>
 
 #include "colour/colour_support.h"
+#include "support/odd_world.h"
 
 namespace {
 
@@ -59,12 +60,6 @@ TEST_F(LinearTables, ConstructionBitForBit) {
     EXPECT_EQ(tables->to_linear[255], 32768);
     EXPECT_EQ(tables->from_linear[4096], 32768);
   }
-}
-
-TEST_F(LinearTables, StraightProfileIsTheIdentity) {
-  const auto tables = ZR_MakeLinearizationTables(shared_profile("scRGB-v2"));
-  for (u32 i = 0; i < 256; ++i) EXPECT_EQ(tables->to_linear[i], zr::widen_8_to_16(static_cast<u8>(i)));
-  for (i32 k = 0; k <= 4096; ++k) EXPECT_NEAR(tables->from_linear[k], 8 * k, 1);
 }
 
 TEST_F(LinearTables, EmptyIsSrgbAndWrongProfilesAreRefused) {
@@ -133,28 +128,6 @@ TEST_F(LinearTables, DepthConvertAllPairs) {
   });
 }
 
-class UnknownDepth : public ZR_World {
- public:
-  UnknownDepth() { width = height = 2; }
-  i16 GetBitDepth() const override { return 24; }
-  bool IsReference() const override { return true; }
-  void Clear(const GX_LRect*) override {}
-  void ClearExceptRect(const GX_LRect&) override {}
-  void Fill(const ZR_PixelFloat&, const GX_LRect*) override {}
-  void Fill(const ZR_Pixel16&, const GX_LRect*) override {}
-  void FillAlpha() override {}
-  void InvertAlpha() override {}
-  void Premultiply() override {}
-  void Unmultiply() override {}
-  void PremulColor(const ZR_Pixel16&) override {}
-  void UnmulColor(const ZR_Pixel16&) override {}
-  void CopyRect(const ZR_World*, const GX_LRect&, i32, i32) override {}
-  void CopyRectPossiblyDifferentBitdepth(const ZR_World*, const GX_LRect&, bool, i32, i32, ZR_ProgressInfo*) override {}
-  void CopyRectPossiblyDifferentBitdepthWithField(const ZR_World*, const GX_LRect&, i32) override {}
-  bool SubWorldSafetyGutterHasBeenOverWritten() const override { return false; }
-  void ReleaseOwnership() override {}
-};
-
 TEST_F(LinearTables, DepthConvertRefusals) {
   const auto tables = ZR_MakeLinearizationTables({});
   ZR_WorldX<ZR_Pixel8> src(4, 4, 0);
@@ -162,7 +135,7 @@ TEST_F(LinearTables, DepthConvertRefusals) {
   randomise(src, 1);
   ZR_DepthConvertWorld(tables->to_linear, &src, &wide);
   EXPECT_EQ(wide.At(0, 0)->alpha | wide.At(3, 3)->red, 0) << "unequal sizes: nothing is done";
-  UnknownDepth odd;
+  OddWorld odd(2);
   EXPECT_EQ(thrown_by([&] { ZR_DepthConvertWorld(tables->to_linear, &odd, &small); }), ZR_Err_Internal);
   EXPECT_EQ(caught.take_verification(), "Unknown bit depth attempting to depth convert.");
   EXPECT_EQ(thrown_by([&] { ZR_DepthConvertWorld(tables->to_linear, &small, &odd); }), ZR_Err_Internal);

@@ -1,4 +1,4 @@
-// Rows between depths and against black: every length and place against the rule of one channel, the choice
+// Rows between depths: every length and place against the rule of one channel, the choice
 // between the two float rules, and the order of dither words.
 #include <DIE/die.h>
 #include <ZR/depth.h>
@@ -9,22 +9,10 @@
 #include <vector>
 
 #include "support/born_library.h"
+#include "support/edge_rows.h"
 #include "world/depth_rows.h"
-#include "world/premul_rows.h"
 
 namespace {
-
-// No SSE2 in the processor record, for the life of the object.
-class PlainProcessor {
- public:
-  PlainProcessor() : before_(HB_G_CPU_DataP) { HB_G_CPU_DataP = nothing; }
-  ~PlainProcessor() { HB_G_CPU_DataP = before_; }
-
- private:
-  static constexpr i32 nothing[HB_CPU_WordCount] = {};
-  const i32* before_;
-};
-constexpr i32 PlainProcessor::nothing[HB_CPU_WordCount];
 
 template <class T>
 T random_pixel(std::mt19937& random) {
@@ -41,32 +29,19 @@ T random_pixel(std::mt19937& random) {
   return {channel(), channel(), channel(), channel()};
 }
 
-// Pixels with as many before and behind them as guards; `shift` bytes off alignment to 64.
+// Pixels that begin `shift` bytes off alignment to 64.
 template <class T>
 class Row {
  public:
-  Row(i32 n, std::size_t shift, u32 seed) : n_(n), bytes_((static_cast<std::size_t>(n) + 16) * sizeof(T) + 128, 0x5a) {
-    const std::size_t misfit = reinterpret_cast<std::uintptr_t>(bytes_.data()) % 64;
-    start_ = 64 - misfit + 8 * sizeof(T) / 64 * 64 + shift;
+  Row(i32 n, std::size_t shift, u32 seed) : bytes_(static_cast<std::size_t>(n) * sizeof(T) + 192) {
+    start_ = 64 - reinterpret_cast<std::uintptr_t>(bytes_.data()) % 64 + shift;
     std::mt19937 random(seed);
-    for (i32 i = 0; i < n; ++i) set(i, random_pixel<T>(random));
+    for (i32 i = 0; i < n; ++i) data()[i] = random_pixel<T>(random);
   }
   T* data() { return reinterpret_cast<T*>(bytes_.data() + start_); }
-  void set(i32 i, const T& pixel) { std::memcpy(data() + i, &pixel, sizeof pixel); }
-  T get(i32 i) const {
-    T pixel;
-    std::memcpy(&pixel, bytes_.data() + start_ + static_cast<std::size_t>(i) * sizeof(T), sizeof pixel);
-    return pixel;
-  }
-  bool guards_intact() const {
-    const auto is_guard = [](u8 byte) { return byte == 0x5a; };
-    const auto at = [&](std::size_t offset) { return bytes_.begin() + static_cast<std::ptrdiff_t>(offset); };
-    return std::all_of(bytes_.begin(), at(start_), is_guard) &&
-           std::all_of(at(start_ + static_cast<std::size_t>(n_) * sizeof(T)), bytes_.end(), is_guard);
-  }
+  const T& get(i32 i) { return data()[i]; }
 
  private:
-  i32 n_;
   std::size_t start_;
   std::vector<u8> bytes_;
 };
@@ -112,7 +87,6 @@ class DepthRows : public BornLibrary {
                                plain_rule<To, From>(p.blue, false, vector)};
           ASSERT_TRUE(same_bits(dst.get(i), expected)) << "pixel " << i << " of " << n << ", shift " << shift;
         }
-        ASSERT_TRUE(dst.guards_intact());
       }
   }
   void compare_all(bool sse2) {
@@ -128,7 +102,7 @@ class DepthRows : public BornLibrary {
 TEST_F(DepthRows, EveryLengthAndPlaceIsTheRuleOfOneChannel) { compare_all(HB_G_CPU_DataP[2] != 0); }
 
 TEST_F(DepthRows, WithoutSse2FloatsNarrowByTheScalarRuleEverywhere) {
-  const PlainProcessor plain;
+  const Instructions plain(0);
   compare_all(false);
 }
 
@@ -189,36 +163,6 @@ TEST_F(DepthRows, DitherDrawsBlueBeforeGreenForFloatsAndClampsAlphaOnBothPaths) 
       }
     }
   }
-}
-
-template <class T>
-class BlackRows : public BornLibrary {};
-using Depths = testing::Types<ZR_Pixel8, ZR_Pixel16, ZR_PixelFloat>;
-TYPED_TEST_SUITE(BlackRows, Depths);
-
-TYPED_TEST(BlackRows, EveryLengthIsTheRuleOfOneChannelInPlaceAndNot) {
-  using T = TypeParam;
-  for (i32 n = 0; n <= 140; ++n)
-    for (const bool forward : {true, false})
-      for (const int place : {0, 1, 2}) {  // elsewhere, no source, source and destination one
-        Row<T> src(n, alignof(T), static_cast<u32>(n)), dst = src;
-        const T* const from = place == 0 ? src.data() : place == 1 ? nullptr : dst.data();
-        EXPECT_EQ((forward ? zr::premul_row<T> : zr::unmul_row<T>)(n, from, dst.data()), 0);
-        const auto rule = forward ? zr::premultiply<T> : zr::unmultiply<T>;
-        for (i32 i = 0; i < n; ++i) {
-          const T p = src.get(i);
-          const T expected = {p.alpha, rule(p.red, p.alpha), rule(p.green, p.alpha), rule(p.blue, p.alpha)};
-          const T made = dst.get(i);
-          if constexpr (std::is_same_v<T, ZR_PixelFloat>) {  // the sign of a NaN product is nobody's
-            const f32 *const e = &expected.alpha, *const m = &made.alpha;
-            for (int k = 0; k < 4; ++k)
-              ASSERT_TRUE(e[k] == m[k] || (e[k] != e[k] && m[k] != m[k])) << "pixel " << i << " of " << n;
-          } else {
-            ASSERT_TRUE(same_bits(made, expected)) << "pixel " << i << " of " << n;
-          }
-        }
-        ASSERT_TRUE(dst.guards_intact());
-      }
 }
 
 }  // namespace

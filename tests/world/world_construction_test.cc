@@ -7,6 +7,7 @@
 #include <new>
 
 #include "support/born_library.h"
+#include "support/odd_world.h"
 #include "support/worlds.h"
 
 namespace {
@@ -27,29 +28,6 @@ i32 thrown(Body&& body) {
 bool same(const GX_LRect& a, const GX_LRect& b) {
   return a.left == b.left && a.top == b.top && a.right == b.right && a.bottom == b.bottom;
 }
-
-// A world of a depth that does not exist, to be met only through an owner.
-struct OddWorld final : ZR_World {
-  i16 depth = 24;
-  OddWorld() { owner = this; }
-  i16 GetBitDepth() const override { return depth; }
-  bool IsReference() const override { return true; }
-  void Clear(const GX_LRect*) override {}
-  void ClearExceptRect(const GX_LRect&) override {}
-  void Fill(const ZR_PixelFloat&, const GX_LRect*) override {}
-  void Fill(const ZR_Pixel16&, const GX_LRect*) override {}
-  void FillAlpha() override {}
-  void InvertAlpha() override {}
-  void Premultiply() override {}
-  void Unmultiply() override {}
-  void PremulColor(const ZR_Pixel16&) override {}
-  void UnmulColor(const ZR_Pixel16&) override {}
-  void CopyRect(const ZR_World*, const GX_LRect&, i32, i32) override {}
-  void CopyRectPossiblyDifferentBitdepth(const ZR_World*, const GX_LRect&, bool, i32, i32, ZR_ProgressInfo*) override {}
-  void CopyRectPossiblyDifferentBitdepthWithField(const ZR_World*, const GX_LRect&, i32) override {}
-  bool SubWorldSafetyGutterHasBeenOverWritten() const override { return false; }
-  void ReleaseOwnership() override {}
-};
 
 class WorldFailures : public BornLibrary {};
 

@@ -128,34 +128,6 @@ TYPED_TEST(Fills, PremultiplyingGoesThroughTheExportsAndIsRefusedOnFloats) {
   }
 }
 
-TYPED_TEST(Fills, ExportsPutTheirRectangleInOrderAndClampIt) {
-  using T = TypeParam;
-  const ZR_Pixel8 c8 = {200, 1, 254, 128};
-  const ZR_Pixel16 c16 = {16384, 32768, 1, 129};
-  const ZR_PixelFloat cf = {1.5f, 2.0f, -1.0f, 0.25f};
-  const T from8 = zr::convert_colour<T>(c8), from16 = zr::convert_colour<T>(c16), fromf = zr::convert_colour<T>(cf);
-  for (const GX_LRect& rect : rects) {
-    const GX_LRect ordered = {std::min(rect.left, rect.right), std::min(rect.top, rect.bottom),
-                              std::max(rect.left, rect.right), std::max(rect.top, rect.bottom)};
-    const auto in_rect = [&](const T& pixel) {
-      return [&, pixel](i32 x, i32 y, T before) { return inside(ordered, x, y) ? pixel : before; };
-    };
-    this->check([&](TestWorld<T>& w, ZR_World*) { EXPECT_EQ(ZR_Fill(nullptr, &c8, &rect, w), 0); }, in_rect(from8),
-                rect);
-    this->check([&](TestWorld<T>& w, ZR_World*) { EXPECT_EQ(ZR_Fill16(nullptr, &c16, &rect, w), 0); }, in_rect(from16),
-                rect);
-    this->check([&](TestWorld<T>& w, ZR_World*) { EXPECT_EQ(ZR_FillFloat(nullptr, &cf, &rect, w), 0); }, in_rect(fromf),
-                rect);
-    this->check([&](TestWorld<T>& w, ZR_World*) { EXPECT_EQ(ZR_FillFloat(nullptr, nullptr, &rect, w), 0); },
-                in_rect(T{}), rect);
-  }
-  const auto all = [](const T& pixel) { return [pixel](i32, i32, T) { return pixel; }; };
-  this->check([&](TestWorld<T>& w, ZR_World*) { EXPECT_EQ(ZR_Fill16(nullptr, &c16, nullptr, w), 0); }, all(from16), {});
-  const ZR_PixelFloat minus_zero = {-0.0f, 0.0f, 0.0f, -0.0f};
-  this->check([&](TestWorld<T>& w, ZR_World*) { EXPECT_EQ(ZR_FillFloat(nullptr, &minus_zero, nullptr, w), 0); },
-              all(zr::convert_colour<T>(minus_zero)), {});
-}
-
 TYPED_TEST(Fills, LongRowsOfEveryLengthAreFilledToTheirEnd) {
   using T = TypeParam;
   const ZR_Pixel16 colour = {1, 2, 3, 4};
