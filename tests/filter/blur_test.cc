@@ -223,22 +223,4 @@ TYPED_TEST(Blurs, RefuseWhatDoesNotFit) {
   EXPECT_EQ(blur(nullptr, c, BlurCase{1, 0, 15, false, true, false, true, false}, b), 3);
 }
 
-// A flat line keeps its level under renormalising whatever the radius, and fades without.
-TYPED_TEST(Blurs, LinesShorterThanTheRadius) {
-  using T = TypeParam;
-  const auto level = static_cast<zr::Channel<T>>(zr::Depth<T>::white);
-  for (const u32 iterations : {0u, 1u, 2u})
-    for (const bool renormalise : {false, true}) {
-      TestWorld<T> src(6, 3), dst(6, 3);
-      src.fill(T{level, level, level, level});
-      ZR_WorldX<T> a(src.layer(), false), b(dst.layer(), false);
-      const BlurCase c = {50, iterations, renormalise ? 31u : 15u, false, true, false, true, false};
-      ASSERT_EQ(blur(nullptr, a, c, b), 0);
-      if (renormalise)
-        EXPECT_TRUE(dst == src) << iterations;
-      else
-        EXPECT_LT(dst.at(0, 0).red, level / 2);
-    }
-}
-
 }  // namespace

@@ -298,27 +298,4 @@ TEST_F(Filters, GaussianTables) {
   EXPECT_EQ(diameter, 6u);
 }
 
-TEST_F(Filters, SelectorsLeadToThem) {
-  void* block[69];
-  ASSERT_EQ(ZR_GetCallbackBlock(1, 1, block), 0);
-  EXPECT_EQ(block[7], reinterpret_cast<void*>(&ZR_Convolve));
-  EXPECT_EQ(block[10], reinterpret_cast<void*>(&ZR_GaussianKernel));
-  struct Case {
-    i32 selector, flags;
-    void* routine;
-  };
-  const Case cases[] = {{-5, 0, reinterpret_cast<void*>(&ZRp_GaussianValue)},
-                        {-2, 1, reinterpret_cast<void*>(&ZR_FastBlur_Straight)},
-                        {-2, 0, reinterpret_cast<void*>(&ZR_FastBlur_Premul)},
-                        {8, 0, reinterpret_cast<void*>(&ZR_Convolve)},
-                        {11, 0, reinterpret_cast<void*>(&ZR_GaussianKernel)}};
-  for (const Case& c : cases) {
-    void* found = nullptr;
-    EXPECT_EQ(ZR_GetCallbackAddr(nullptr, 1, c.flags, c.selector, &found), 0);
-    EXPECT_EQ(found, c.routine) << c.selector;
-  }
-  EXPECT_EQ(ZR_FastBlur_Straight(nullptr, nullptr, 1, nullptr), 5);
-  EXPECT_EQ(ZR_FastBlur_Premul(nullptr, nullptr, 1, nullptr), 5);
-}
-
 }  // namespace

@@ -98,26 +98,6 @@ TEST_F(PixelMeasures, RoundTripsAndSumsOfRoundedTerms) {
   EXPECT_EQ(above.alpha, 0.25f);
 }
 
-TEST_F(PixelMeasures, PremultipliedFormsUseThePixelsOwnAlpha) {
-  for (const u8 alpha : {u8{0}, u8{1}, u8{77}, u8{128}, u8{254}, u8{255}}) {
-    const ZR_Pixel8 p = {alpha, static_cast<u8>(alpha / 2), static_cast<u8>(alpha / 3), alpha};
-    const auto over = [&](u8 c) { return ZRp_G_fcd_table[alpha * 256 + c]; };
-    const ZR_Pixel8 straight = {alpha, over(p.red), over(p.green), over(p.blue)};
-    i32 expected[3], words[3];
-    ZR_RGBtoHLS_Straight(nullptr, &straight, expected);
-    ZR_RGBtoHLS_Premul(nullptr, &p, words);
-    EXPECT_TRUE(std::equal(words, words + 3, expected));
-    ZR_Pixel8 out = {alpha, 1, 2, 3};
-    ZR_HLStoRGB_Premul(nullptr, words, &out);
-    EXPECT_EQ(out.alpha, alpha);
-    EXPECT_EQ(out.blue, ZRp_G_fcm_table[alpha * 256 + straight.blue]);
-    i32 luminance, plain;
-    ZR_Luminance_Premul(nullptr, &p, &luminance);
-    ZR_Luminance_Straight(nullptr, &straight, &plain);
-    EXPECT_EQ(luminance, plain);
-  }
-}
-
 TEST_F(PixelMeasures, OfAnythingAreDefined) {
   i32 words[3] = {INT32_MIN, INT32_MAX, INT32_MIN}, number;
   f32 real;

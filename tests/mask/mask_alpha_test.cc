@@ -95,29 +95,4 @@ TEST_F(MaskAlpha, ThrowsWhatStopsIt) {
   EXPECT_EQ(world, before);
 }
 
-// Every alpha and mask of 8 bits; the product rounds the same way up and down.
-TEST(BlendSingleChannel, PullsAlphaTowardTheTarget) {
-  for (const i32 target : {0, 100, 255})
-    for (const i32 opacity : {255, 128, 0})
-      for (i32 a = 0; a < 256; ++a)
-        for (i32 m = 0; m < 256; ++m) {
-          ZR_Pixel8 pixel = {static_cast<u8>(a), 1, 2, 3};
-          const u8 mask = static_cast<u8>(m);
-          ZR_BlendSingleChannel<ZR_Pixel8, u8>(1, static_cast<u8>(opacity), static_cast<u8>(target), &mask, &pixel);
-          const i64 t = Plain<u8>::mul(m, opacity), way = std::abs(target - a);
-          const i64 result = target < a ? a - Plain<u8>::mul(way, t) : a + Plain<u8>::mul(way, t);
-          ASSERT_EQ(pixel.alpha, result) << a << " to " << target << " by " << m << " and " << opacity;
-          ASSERT_EQ(pixel.red * 100 + pixel.green * 10 + pixel.blue, 123);
-        }
-  ZR_Pixel16 deep[] = {{20000, 1, 2, 3}, {100, 4, 5, 6}};
-  const u16 masks[] = {16384, 32768};
-  ZR_BlendSingleChannel<ZR_Pixel16, u16>(2, 32768, 10001, masks, deep);
-  EXPECT_EQ(deep[0].alpha, 20000 + ((-9999 * 16384 - 1 + 16383) >> 15));
-  EXPECT_EQ(deep[1].alpha, 10001);
-  ZR_PixelFloat real = {0.25f, 1, 2, 3};
-  const f32 half = 0.5f;
-  ZR_BlendSingleChannel<ZR_PixelFloat, f32>(1, 0.5f, 1.0f, &half, &real);
-  EXPECT_EQ(real.alpha, 0.25f + 0.75f * 0.25f);
-}
-
 }  // namespace

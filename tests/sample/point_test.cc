@@ -203,4 +203,14 @@ TEST_F(PointSamplers, TheSetFollowsTheSlotsAndTheQuality) {
   EXPECT_EQ(ZR_AreaSample_Straight(nullptr, 0, 0, &picture.params, &out), 3);
 }
 
+// Rows of a replaced sampler are that sampler's.
+TEST_F(PointSamplers, AReplacedSamplerHasNoRows) {
+  const auto mine = [](const ZR_ProgressInfo*, i32, i32, const ZR_SampPB*, ZR_Pixel16*) -> i32 { return 0; };
+  i32 (*const routine)(const ZR_ProgressInfo*, i32, i32, const ZR_SampPB*, ZR_Pixel16*) = mine;
+  const SlotOverride replaced(ZR_Slot_bilinear_no_clip16, reinterpret_cast<void*>(routine));
+  EXPECT_EQ(zr::no_clip_row(zr::sample_functions<ZR_Pixel16>(1)), nullptr);
+  EXPECT_EQ(zr::no_clip_row(zr::sample_functions<ZR_Pixel16>(2)) == nullptr,
+            zr::no_clip_row(zr::sample_functions<ZR_Pixel8>(1)) == nullptr);
+}
+
 }  // namespace
