@@ -3,6 +3,7 @@
 #include <set>
 
 #include "host/callback_surface.h"
+#include "world/effect_world.h"
 
 namespace {
 
@@ -36,8 +37,10 @@ TEST_F(CallbackBlock, HoldsTheFixedRoutines) {
   } fixed[] = {
       {6, address_of(&ZR_Blend_Straight), address_of(&ZR_Blend_Premul)},
       {9, address_of(&ZR_Fill), address_of(&ZR_Fill)},
+      {10, address_of(&ZR_GaussianKernel), address_of(&ZR_GaussianKernel)},
       {12, address_of(&ZR_Premul), address_of(&ZR_Premul)},
       {13, address_of(&ZR_PremulColor), address_of(&ZR_PremulColor)},
+      {14, address_of(&zr::new_world_from_flags), address_of(&zr::new_world_from_flags)},
       {15, address_of(&ZR_DisposeEffectWorld), address_of(&ZR_DisposeEffectWorld)},
       {18, address_of(&transfer_rect_adapter), address_of(&transfer_rect_adapter)},
       {19, address_of(&transform_world_adapter), address_of(&transform_world_adapter)},
@@ -63,7 +66,7 @@ TEST_F(CallbackBlock, HoldsTheFixedRoutines) {
     void* block[69];
     ASSERT_EQ(ZR_GetCallbackBlock(mode.quality, mode.flags, block), 0);
     for (const auto& one : fixed) EXPECT_EQ(block[one.entry], mode.flags != 0 ? one.straight : one.premul) << one.entry;
-    for (const int entry : {3, 14, 20, 21, 22, 23, 54, 55, 58}) EXPECT_NE(block[entry], nullptr) << entry;
+    for (const int entry : {3, 20, 21, 22, 23, 54, 55, 58}) EXPECT_NE(block[entry], nullptr) << entry;
   }
 }
 
@@ -134,19 +137,6 @@ TEST_F(CallbackBlock, HoldsTheCLibraryInItsOrder) {
   EXPECT_STREQ(reinterpret_cast<char* (*)(char*, const char*)>(block[42])(copy, text), "7-x");
   EXPECT_EQ(unary(43, 0.5), std::asin(0.5));
   EXPECT_EQ(unary(44, 0.5), std::acos(0.5));
-}
-
-TEST_F(CallbackBlock, NewWorldTakesFlagsAndNeverFloat) {
-  void* block[69];
-  ASSERT_EQ(ZR_GetCallbackBlock(0, 0, block), 0);
-  const auto make = reinterpret_cast<i32 (*)(void*, i32, i32, i32, ZR_LayerDef*)>(block[ZR_Entry_new_world]);
-  for (const auto& [flags, depth] : {std::pair{0, 8}, {1, 8}, {2, 16}, {3, 16}, {7, 16}}) {
-    ZR_LayerDef world{};
-    ASSERT_EQ(make(nullptr, 4, 3, flags, &world), 0);
-    EXPECT_EQ(ZRp_WorldDepth(&world), depth);
-    EXPECT_EQ(world.raster, nullptr);
-    EXPECT_EQ(ZR_DisposeEffectWorld(nullptr, &world), 0);
-  }
 }
 
 }  // namespace

@@ -109,19 +109,6 @@ TEST_F(Modules, ThoseBesideARefusedOneAreKept) {
   EXPECT_EQ(zr::loaded_module_count(), 5);
 }
 
-TEST_F(Modules, OfAnotherVersionAreLeftAloneWithoutAMessage) {
-  ASSERT_EQ(birth_with({"other_version"}), 0);
-  EXPECT_EQ(events(), "");
-  EXPECT_TRUE(slots_are_default());
-  EXPECT_EQ(zr::loaded_module_count(), 0);
-}
-
-TEST_F(Modules, ADamagedFileIsReportedOnceAndChangesNothing) {
-  ASSERT_EQ(birth_with({"damaged"}), 0);
-  EXPECT_EQ(events(), std::string("080 ") + problem);
-  EXPECT_TRUE(slots_are_default());
-}
-
 TEST_F(Modules, TheFirstErrorAtDeathStopsTheCallsAndIsTheResult) {
   ASSERT_EQ(birth_with({"unload_fails", "good"}), 0);
   events();
@@ -157,15 +144,6 @@ TEST_F(Modules, MemoryRunningShortAnywhereLeavesNothingBehind) {
     EXPECT_EQ(now.live_blocks, before.live_blocks) << "allocation " << n;
   }
   EXPECT_GT(refused, 3) << "manifest, routine, own record and list have to have failed once";
-}
-
-TEST_F(Modules, FoldersComeFromThePreferenceUnlessTheHostNamesThem) {
-  setenv("ZR_MODULES_FOLDERS", ZR_TEST_MODULES "/good:" ZR_TEST_MODULES "/damaged", 1);
-  ASSERT_EQ(birth_with({}), 0);
-  EXPECT_EQ(zr::loaded_module_count(), 4);
-  ASSERT_EQ(birth_with({"failing"}), 0);
-  EXPECT_EQ(zr::loaded_module_count(), 1);
-  unsetenv("ZR_MODULES_FOLDERS");
 }
 
 TEST_F(Modules, TheExampleEqualsTheRowThatItReplaces) {

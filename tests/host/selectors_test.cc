@@ -47,8 +47,10 @@ TEST_F(Selectors, GiveTheSameFixedRoutinesAsTheBlock) {
 TEST_F(Selectors, LeadToRoutinesThatNoBlockHolds) {
   void* block[69];
   ASSERT_EQ(ZR_GetCallbackBlock(1, 1, block), 0);
-  const std::pair<i32, void*> routines[] = {
-      {-4, address_of(&ZR_InsertPlanes)}, {-3, address_of(&ZR_ExtractPlanes)}, {-1, address_of(&ZR_PaintSpot)}};
+  const std::pair<i32, void*> routines[] = {{-5, address_of(&ZRp_GaussianValue)},
+                                            {-4, address_of(&ZR_InsertPlanes)},
+                                            {-3, address_of(&ZR_ExtractPlanes)},
+                                            {-1, address_of(&ZR_PaintSpot)}};
   for (const auto& [selector, routine] : routines) {
     void* found = nullptr;
     EXPECT_EQ(ZR_GetCallbackAddr(nullptr, 0, 0, selector, &found), 0);

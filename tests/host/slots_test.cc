@@ -64,6 +64,9 @@ TEST_F(Slots, HoldTheRoutineOfTheirName) {
       {23, address(&ZR_CopyBits_Draft_Static)},
       {24, address(&ZR_CopyBits_HQ_Straight_Static)},
       {25, address(&ZR_CopyBits_HQ_Premul_Static)},
+      {26, address(&ZR_FastBlur_Straight)},
+      {27, address(&ZR_FastBlur_Premul)},
+      {28, address(&ZR_Convolve)},
       {31, address(&ZR_TransferRect_S)},
       {32, address(&ZR_TransformWorld_S)},
       {52, address(&ZR_PremulRect_S)},
@@ -151,33 +154,6 @@ TEST_F(Slots, ExportsJumpThroughThem) {
 TEST_F(Slots, AnEmptiedSlotFailsItsExport) {
   const SlotOverride none(ZR_Slot_iterate_generic, nullptr);
   EXPECT_EQ(ZR_IterateGeneric(1, nullptr, [](void*, i32, i32, i32) { return i32{0}; }), 3);
-}
-
-i32 G_generic_calls;
-i32 counting_generic(i32 iterations, void* refcon, ZR_GenericFunc fn) {
-  ++G_generic_calls;
-  return ZR_IterateGeneric_Static(iterations, refcon, fn);
-}
-i32 G_row_calls;
-i32 counting_premul_row(i32 n, const ZR_Pixel8* src, ZR_Pixel8* dst) {
-  ++G_row_calls;
-  return zr::premul_row<ZR_Pixel8>(n, src, dst);
-}
-
-TEST_F(Slots, AReplacedIterationOrRowIsUsedByTheNextOperation) {
-  TestWorld<ZR_Pixel8> world(5, 4);
-  G_generic_calls = G_row_calls = 0;
-  {
-    const SlotOverride generic(ZR_Slot_iterate_generic, reinterpret_cast<void*>(&counting_generic));
-    const SlotOverride row(ZR_Slot_premul_row8, reinterpret_cast<void*>(&counting_premul_row));
-    EXPECT_EQ(ZR_Premul(nullptr, 1, world), 0);
-    EXPECT_GT(G_generic_calls, 0);
-    EXPECT_EQ(G_row_calls, 4);
-  }
-  const i32 calls = G_generic_calls;
-  EXPECT_EQ(ZR_Premul(nullptr, 1, world), 0);
-  EXPECT_EQ(G_generic_calls, calls) << "the override has ended";
-  EXPECT_EQ(G_row_calls, 4);
 }
 
 TEST_F(Slots, DestinationBodiesClearTheirRecord) {

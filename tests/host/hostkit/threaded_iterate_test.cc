@@ -87,13 +87,6 @@ TEST_P(ThreadedIterate, MinusOneCallsOncePerThread) {
   EXPECT_EQ(ledger.clashes, 0);
 }
 
-TEST_P(ThreadedIterate, IsSizedByTheThreadCount) {
-  i32 count = 0;
-  EXPECT_EQ(HB_GetNumThreads(&count, 77), 0);
-  EXPECT_EQ(count, threads());
-  EXPECT_EQ(host->threads(), threads());
-}
-
 TEST_P(ThreadedIterate, DoesNothingForNoIterationsAndRefusesNoFunction) {
   for (const i32 iterations : {0, -2, -100, INT32_MIN})
     EXPECT_EQ(iterate(iterations, [](i32, i32, i32) { return 99; }), 0);
