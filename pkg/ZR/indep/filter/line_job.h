@@ -72,6 +72,7 @@ struct LineJob {
   Lines<T> src, dst;
   i64 dst_low, dst_high;  // positions of the destination
   i64 line_shift;         // source line of a destination line
+  TurnPixelsFunc<T>* turn = pixel_turner<T>();
 
   LineJob(const BlurCall& blur, const ZR_World& from, bool src_vertical, const ZR_World& to, bool dst_vertical)
       : call(blur), src(from, src_vertical), dst(to, dst_vertical) {
@@ -81,7 +82,7 @@ struct LineJob {
   }
   // Lines of a strip. Strips of columns are wide, to make use of memory pages; rows have to pass a corner turn.
   i32 strip_lines() const {
-    if (src.vertical && dst.vertical) return most_strip_lines;
+    if (src.vertical && dst.vertical) return sizeof(T) == 16 ? most_strip_lines / 2 : most_strip_lines;
     return std::max(64 / static_cast<i32>(sizeof(T)), strip_group);
   }
   // Whether strips of so many lines are read where they lie.
@@ -116,8 +117,7 @@ Strip<T> copied_strip(const LineJob<T>& job, i64 src_line, i32 lines, i32 width,
         std::memcpy(out, row, static_cast<std::size_t>(lines) * sizeof(T));
     }
   } else {
-    turn_pixels(job.src.at(low, src_line), job.src.across, lines, high - low, memory,
-                width * static_cast<i64>(sizeof(T)));
+    job.turn(job.src.at(low, src_line), job.src.across, lines, high - low, memory, width * static_cast<i64>(sizeof(T)));
     if (job.call.premultiply) {
       constexpr i64 at_once = 1 << 16;
       const i64 pixels = (high - low) * width;
@@ -153,8 +153,8 @@ void emit_strip(const LineJob<T>& job, i64 dst_line, i32 lines, i32 width, i64 l
     for (i64 p = 0; p < high - low; ++p)
       std::memcpy(job.dst.at(first + p, dst_line), strip + p * width, static_cast<std::size_t>(lines) * sizeof(T));
   } else {
-    turn_pixels<T>(strip, width * static_cast<i64>(sizeof(T)), high - low, lines, job.dst.at(first, dst_line),
-                   job.dst.across);
+    job.turn(strip, width * static_cast<i64>(sizeof(T)), high - low, lines, job.dst.at(first, dst_line),
+             job.dst.across);
   }
 }
 
@@ -169,6 +169,14 @@ void write_strip(const LineJob<T>& job, i64 dst_line, i32 lines, i32 width, T* c
   }
   for (i64 low = job.dst_low; low < job.dst_high; low += chunk_positions) {
     const i64 high = std::min(low + chunk_positions, job.dst_high);
+    if (!job.dst.vertical) {
+      // Lines of the destination, on their way while the chunk is made.
+      const i64 bytes = (high - low) * static_cast<i64>(sizeof(T));
+      for (i32 l = 0; l < lines; ++l) {
+        const char* const line = reinterpret_cast<const char*>(job.dst.at(low - job.dst_low, dst_line + l));
+        for (i64 b = 0; b < bytes; b += 64) __builtin_prefetch(line + b, 1);
+      }
+    }
     body(low, high, chunk, i64{width});
     emit_strip(job, dst_line, lines, width, low, high, chunk);
   }
