@@ -1,5 +1,6 @@
 // The box blur's inner loop on lanes: whole pixels as they lie in memory, each channel a lane.
 #include "filter/box_rows.h"
+#include "filter/short_quotient.h"
 
 #undef HWY_TARGET_INCLUDE
 #define HWY_TARGET_INCLUDE "filter/lane_box_rows.cc"
@@ -21,9 +22,13 @@ using BoxLane = Lane<BoxSum<T>>;
 // What a run divides by, spread over lanes.
 template <class T>
 struct BoxDivision {
-  Floats divisor, half;
+  Floats divisor, half, reciprocal, rest_of_reciprocal;
 
-  HWY_INLINE explicit BoxDivision(const BoxWeights<T>& w) : divisor(w.divisor), half(w.divisor / 2) {}
+  HWY_INLINE explicit BoxDivision(const BoxWeights<T>& w) : divisor(w.divisor), half(w.divisor / 2) {
+    const ShortQuotient by = ShortQuotient::of(w.divisor);
+    reciprocal = by.upper;
+    rest_of_reciprocal = by.lower;
+  }
   HWY_INLINE Floats weighed(Floats sum, Floats edge, Floats shortfall) const { return sum - edge * shortfall; }
   HWY_INLINE Floats unweighed(Floats sum) const { return sum; }
   HWY_INLINE Floats premultiplied(Floats n) const {
@@ -31,6 +36,11 @@ struct BoxDivision {
       return (n + half) / divisor;
     else
       return n / divisor;
+  }
+  // Of sums of 16-bit channels, which are whole numbers.
+  HWY_INLINE Floats short_quotient(Floats n) const {
+    const Floats sum = n + half;
+    return hn::MulAdd(sum.v, reciprocal.v, (sum * rest_of_reciprocal).v);
   }
   HWY_INLINE Floats alpha_weight(Floats n) const {
     if constexpr (std::is_same_v<T, ZR_Pixel16>)
@@ -65,64 +75,121 @@ struct BoxDivision<ZR_Pixel8> {
   HWY_INLINE Ints straight(Ints n, Ints q) const { return byte_quotient(n + shifted_right<1>(q), q); }
 };
 
+// Some vectors at once, so that rows far apart are come back to less often.
+template <class T, i32 vectors>
+HWY_INLINE i32 add_blocks(i32 c, i32 channels, i64 count, const T* from, i64 step, BoxSum<T>* all) {
+  using Number = BoxSum<T>;
+  const i32 block = vectors * lane_count();
+  for (; c + block <= channels; c += block) {
+    Lane<Number> sums[vectors];
+    for (i32 i = 0; i < vectors; ++i) sums[i] = hn::LoadU(Tag<Number>(), all + c + i * lane_count());
+    const T* p = from;
+    for (i64 k = 0; k < count; ++k, p += step)
+      for (i32 i = 0; i < vectors; ++i) sums[i] = sums[i] + channels_at<Number>(p, c + i * lane_count());
+    for (i32 i = 0; i < vectors; ++i) hn::StoreU(sums[i].v, Tag<Number>(), all + c + i * lane_count());
+  }
+  return c;
+}
 template <class T>
 void add(i32 pixels, i64 count, const T* from, i64 step, void* sums) {
-  using Number = BoxSum<T>;
-  auto* const all = static_cast<Number*>(sums);
-  for (i32 c = 0; c < 4 * pixels; c += lane_count()) {
-    Lane<Number> sum = hn::LoadU(Tag<Number>(), all + c);
-    const T* p = from;
-    for (i64 k = 0; k < count; ++k, p += step) sum = sum + channels_at<Number>(p, c);
-    hn::StoreU(sum.v, Tag<Number>(), all + c);
-  }
+  auto* const all = static_cast<BoxSum<T>*>(sums);
+  const i32 done = add_blocks<T, 8>(0, 4 * pixels, count, from, step, all);
+  add_blocks<T, 1>(add_blocks<T, 2>(done, 4 * pixels, count, from, step, all), 4 * pixels, count, from, step, all);
 }
 
-constexpr i64 rows_ahead = 4;
+HWY_INLINE void store_low_bits(Ints v, ZR_Pixel16* pixels, i32 c) {
+  const hn::Rebind<u16, Tag<i32>> d;
+  hn::StoreU(hn::TruncateTo(d, hn::BitCast(hn::Rebind<u32, Tag<i32>>(), v.v)), d, reinterpret_cast<u16*>(pixels) + c);
+}
 
-template <class T, bool straight, bool edged>
-HWY_INLINE void run_form(const BoxRun<T>& run) {
+constexpr i64 rows_ahead = 4, floats_ahead = 2;
+
+// Columns jump from memory page to page, where no processor looks ahead by itself; strips that lie together need none.
+// Of floats, what is written is more than waits for its place in passing.
+template <class T>
+struct LookAhead {
+  i64 block_bytes, in_until, out_until, in, out;
+
+  HWY_INLINE LookAhead(const BoxRun<T>& run, i32 block_channels)
+      : block_bytes(block_channels * static_cast<i64>(sizeof(T) / 4)),
+        in_until(run.entering_step != run.pixels ? run.count - rows_ahead : 0),
+        out_until(sizeof(T) == 16 && run.out_step != run.pixels ? run.count - floats_ahead : 0),
+        in(run.entering_step * rows_ahead),
+        out(run.out_step * floats_ahead) {}
+  HWY_INLINE void operator()(i64 k, const void* entering, void* made) const {
+    if (k < in_until)
+      for (i64 b = 0; b < block_bytes; b += 64)
+        hwy::Prefetch(static_cast<const char*>(entering) + in * static_cast<i64>(sizeof(T)) + b);
+    if (k < out_until)
+      for (i64 b = 0; b < block_bytes; b += 64)
+        __builtin_prefetch(static_cast<char*>(made) + out * static_cast<i64>(sizeof(T)) + b, 1);
+  }
+};
+
+// How the means of a run are found.
+enum class Means { plain, edged, short_quotients };
+
+// Some vectors of channels, from channel c on: their sums stay in registers.
+template <class T, bool straight, Means means, i32 vectors>
+HWY_INLINE void run_block(const BoxRun<T>& run, i32 c) {
   using Number = BoxSum<T>;
   using L = BoxLane<T>;
   const BoxDivision<T> division(run.weights);
   const L shortfall(run.weights.shortfall), zero(Number{0});
   const auto alphas = alpha_lanes<Number>();
-  auto* const all = static_cast<Number*>(run.sums);
-  const T *leaving = run.leaving, *first = run.first, *entering = run.entering;
-  T* out = run.out;
-  const i32 channels = 4 * run.pixels;
-  // Columns jump from memory page to page, where no processor looks ahead by itself.
-  const i64 row_bytes = run.pixels * static_cast<i64>(sizeof(T)), ahead = run.entering_step * rows_ahead;
+  auto* const all = static_cast<Number*>(run.sums) + c;
+  const LookAhead<T> look_ahead(run, vectors * lane_count());
+  const i32 pixel = c / 4;
+  const T *leaving = run.leaving + pixel, *first = run.first + pixel, *entering = run.entering + pixel;
+  T* out = run.out + pixel;
+  L sums[vectors];
+  for (i32 v = 0; v < vectors; ++v) sums[v] = hn::LoadU(Tag<Number>(), all + v * lane_count());
   for (i64 k = 0; k < run.count; ++k) {
-    if (k + rows_ahead < run.count)
-      for (i64 b = 0; b < row_bytes; b += 64) hwy::Prefetch(reinterpret_cast<const char*>(entering + ahead) + b);
-    for (i32 c = 0; c < channels; c += lane_count()) {
-      const L next = channels_at<Number>(entering, c);
-      L sum = hn::LoadU(Tag<Number>(), all + c);
-      sum = sum - channels_at<Number>(leaving, c) + next;
-      hn::StoreU(sum.v, Tag<Number>(), all + c);
-      const L n =
-          edged ? division.weighed(sum, channels_at<Number>(first, c) + next, shortfall) : division.unweighed(sum);
+    look_ahead(k, entering, out);
+    for (i32 v = 0; v < vectors; ++v) {
+      const i32 i = v * lane_count();
+      const L next = channels_at<Number>(entering, i);
+      const L sum = sums[v] = sums[v] - channels_at<Number>(leaving, i) + next;
+      if constexpr (means == Means::short_quotients) {
+        store_low_bits(fitting_int(division.short_quotient(sum)), out, i);
+        continue;
+      }
+      const L n = means == Means::edged ? division.weighed(sum, channels_at<Number>(first, i) + next, shortfall)
+                                        : division.unweighed(sum);
       L made = division.premultiplied(n);
       if constexpr (straight) {
         const L q = division.alpha_weight(hn::Broadcast<0>(n.v));
         made = pick(q == zero, zero, pick(alphas, made, division.straight(n, q)));
       }
-      store_channels(made, out, c);
+      store_channels(made, out, i);
     }
     leaving += run.leaving_step;
     first += run.first_step;
     entering += run.entering_step;
     out += run.out_step;
   }
+  for (i32 v = 0; v < vectors; ++v) hn::StoreU(sums[v].v, Tag<Number>(), all + v * lane_count());
+}
+
+template <class T, bool straight, Means means, i32 vectors>
+HWY_INLINE i32 run_blocks(const BoxRun<T>& run, i32 c) {
+  for (; c + vectors * lane_count() <= 4 * run.pixels; c += vectors * lane_count())
+    run_block<T, straight, means, vectors>(run, c);
+  return c;
+}
+template <class T, bool straight, Means means>
+void run_form(const BoxRun<T>& run) {
+  const i32 wide = run_blocks<T, straight, means, 8>(run, 0);
+  run_blocks<T, straight, means, 2>(run, run_blocks<T, straight, means, 4>(run, wide));
 }
 
 template <class T, bool straight>
 void run_box(const BoxRun<T>& run) {
   if (run.weights.divisor == 0) return single_box_rows<T>().premultiplied(run);
-  if (run.weights.shortfall != 0)
-    run_form<T, straight, true>(run);
-  else
-    run_form<T, straight, false>(run);
+  if (run.weights.shortfall != 0) return run_form<T, straight, Means::edged>(run);
+  if constexpr (HWY_NATIVE_FMA && std::is_same_v<T, ZR_Pixel16> && !straight)
+    if (ShortQuotient::serves(run.weights.divisor)) return run_form<T, straight, Means::short_quotients>(run);
+  run_form<T, straight, Means::plain>(run);
 }
 
 template <class T>
