@@ -80,6 +80,7 @@ struct SampledCopy {
     params.area = truncate_i32(x.step / 65536.0 * y.step);
     params.src = src;
     const ZR_WorldX<T> out(dst, false);
+    bool copies = inner.copy != nullptr;
     i32 copied = 0;  // rows below here have their inner pixels
     i32 at_y = y.start;
     for (i32 row = 0; row < rows; ++row) {
@@ -95,7 +96,7 @@ struct SampledCopy {
       if (range.first < range.end) {
         each(0, range.first);
         const i32 from = wrap_add(x.start, wrap_mul(range.first, x.step));
-        if (inner.copy != nullptr && row >= copied) {
+        if (copies && row >= copied) {
           // As far as the next poll and as the same columns go.
           const i32 last = std::min((row + 63) & ~63, rows - 1);
           CopyPart<T> part = {range.end - range.first, 1, from, at_y, x.step, y.step, pixels + range.first,
@@ -104,7 +105,8 @@ struct SampledCopy {
             const PixelRange other = inner_at(next);
             if (other.first != range.first || other.end != range.end) break;
           }
-          if (inner.copy(part, params)) copied = row + part.rows;
+          copies = inner.copy(part, params);
+          if (copies) copied = row + part.rows;
         }
         RowSum<T> alphas = 0;
         done = row < copied ? range.end
@@ -151,8 +153,8 @@ i32 copy_straight(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef
     const SampleFunctions<T> samplers = sample_functions<T>(1);
     const bool boxes = copy.shrinks();
     InnerRow<T> inner = {boxes ? box_row(samplers) : clipping_row(samplers), nullptr, boxes};
-    if (inner.row != nullptr && !boxes && !CopyPlane(*src, sizeof(T)).may_overlap(CopyPlane(*dst, sizeof(T))))
-      inner.copy = lane_bilinear_copy<T>();
+    if (inner.row != nullptr && !CopyPlane(*src, sizeof(T)).may_overlap(CopyPlane(*dst, sizeof(T))))
+      inner.copy = boxes ? lane_box_copy<T>() : lane_bilinear_copy<T>();
     return copy.run<T>(progress, src, dst, boxes ? samplers.area : samplers.clipping, inner, copy.x.count(),
                        copy.y.count());
   });

@@ -9,22 +9,11 @@
 
 #include "simd/lanes-inl.h"
 #if ZR_HAS_LANES
-#include <hwy/cache_control.h>
-
-#include "sample/lane_samples-inl.h"
+#include "sample/lane_copies-inl.h"
 
 HWY_BEFORE_NAMESPACE();
 namespace zr {
 namespace HWY_NAMESPACE {
-
-template <class T>
-using RealOf = std::conditional_t<std::is_same_v<T, ZR_Pixel16>, Doubles, Floats>;
-
-// Fused where the processor can: bounds allow for either.
-HWY_INLINE Floats mul_add(Floats a, Floats b, Floats c) { return hn::MulAdd(a.v, b.v, c.v); }
-HWY_INLINE Doubles mul_add(Doubles a, Doubles b, Doubles c) {
-  return {hn::MulAdd(a.low, b.low, c.low), hn::MulAdd(a.high, b.high, c.high)};
-}
 
 // What the sampler's result and ours may be off together, in steps of a channel.
 //
@@ -41,62 +30,6 @@ struct Doubt<ZR_Pixel16> {
   static constexpr f32 of_sums = 0x1p-24f, of_quotients = 0x1p-24f, over_alpha = 0.0f;
 };
 
-// Off by 3u at most.
-HWY_INLINE Floats inverse_of(Floats v) {
-#if HWY_ARCH_X86
-  const Floats estimate = hn::ApproximateReciprocal(v.v);
-  return estimate * Floats(hn::NegMulAdd(v.v, estimate.v, hn::Set(Tag<f32>(), 2.0f)));
-#else
-  return 1.0f / v;
-#endif
-}
-HWY_INLINE Doubles inverse_of(Doubles v) { return Doubles(1.0) / v; }
-
-// Numbers to the nearest integers, and the lanes where they lie too near to the middle between two.
-class FloatRounding {
- public:
-  HWY_INLINE FloatRounding() : differences_(0) {}
-  // Of v * by.
-  HWY_INLINE Ints nearest(Floats v, Floats by, Floats doubt) {
-    const Ints least = fitting_int(mul_add(v, by, 0.5f - doubt));
-    differences_ = differences_ | (least ^ fitting_int(mul_add(v, by, 0.5f + doubt)));
-    return least;
-  }
-  HWY_INLINE Bools<i32> unsure() const { return differences_ != 0; }
-
- private:
-  Ints differences_;
-};
-class DoubleRounding {
- public:
-  HWY_INLINE DoubleRounding() : most_(0.0) {}
-  HWY_INLINE Ints nearest(Doubles v, Doubles by, Doubles) {
-    const Doubles product = v * by, above = product + no_fraction, off = product - (above - no_fraction);
-    most_ = {hn::Max(most_.low, hn::Abs(off.low)), hn::Max(most_.high, hn::Abs(off.high))};
-    return low_words(above);
-  }
-  HWY_INLINE Bools<i32> unsure() const {
-    const Tag<i32> d;
-    const auto limit = hn::Set(Tag<f64>(), 0.5 - 0x1p-24);
-    const auto words = [&](auto v) HWY_ATTR { return hn::BitCast(d, hn::VecFromMask(Tag<f64>(), hn::Gt(v, limit))); };
-    return Ints(hn::ConcatEven(d, words(most_.high), words(most_.low))) != 0;
-  }
-  // Of exact numbers of 32 bits of fraction, halves upward.
-  static HWY_INLINE Ints half_up(Doubles v) { return low_words((v + 0x1p-34) + no_fraction); }
-
- private:
-  static constexpr f64 no_fraction = 0x1p52;
-  static HWY_INLINE Ints low_words(Doubles v) {
-    const Tag<i32> d;
-    return hn::ConcatEven(d, hn::BitCast(d, v.high), hn::BitCast(d, v.low));
-  }
-  Doubles most_;
-};
-template <class T>
-using Rounding = std::conditional_t<std::is_same_v<T, ZR_Pixel16>, DoubleRounding, FloatRounding>;
-
-enum class Alphas { any, white, clear };
-
 // Vectors of the destination that are worked on together: two rows of numbers stay in the first cache.
 inline constexpr i32 stretch = 16;
 
@@ -109,24 +42,6 @@ struct BetweenPixels {
   Holds holds;
   RealOf<T> channel[4][stretch];
 };
-
-// What the alphas of pixels are; there are as many as a vector has lanes or more.
-template <class T>
-HWY_INLINE Alphas alphas_of(const T* pixels, i32 count) {
-  constexpr i32 lanes = lane_count(), white = Depth<T>::white;
-  Ints every(-1), any(0);
-  for (i32 i = 0;; i = std::min(i + lanes, count - lanes)) {
-    for (i32 k = 0; k < Raw<T>::words; ++k) {
-      const Ints words = hn::LoadU(Tag<i32>(), reinterpret_cast<const i32*>(pixels + i) + k * lanes);
-      every = every & words, any = any | words;
-    }
-    if (i + lanes == count) break;
-  }
-  if constexpr (Raw<T>::words == 2) every = hn::DupEven(every.v), any = hn::DupEven(any.v);
-  constexpr i32 channel = std::numeric_limits<Channel<T>>::max();
-  every = masked(every, channel), any = masked(any, channel);
-  return all(any == 0) ? Alphas::clear : all(any == white && every == white) ? Alphas::white : Alphas::any;
-}
 
 template <class T, class Neighbours>
 class BetweenRows {
@@ -189,12 +104,8 @@ class BetweenRows {
     row->y = y;
     row->holds = Row::nothing;
     row->alphas = pixels < lane_count() ? Alphas::any : alphas_of(line + left, pixels);
-    // Short parts of rows are no pattern that processors see.
-    const char* const ahead =
-        reinterpret_cast<const char*>(line + left) + 2 * static_cast<std::ptrdiff_t>(src.row_bytes);
-    constexpr i32 cache_line = 64;
-    if (y + 2 < src.height)
-      for (i32 i = 0; i < pixels * i32{sizeof(T)}; i += cache_line) hwy::Prefetch(ahead + i);
+    const std::ptrdiff_t two_rows = 2 * static_cast<std::ptrdiff_t>(src.row_bytes);
+    if (y + 2 < src.height) fetch_ahead(reinterpret_cast<const char*>(line + left) + two_rows, pixels * i32{sizeof(T)});
   }
   template <typename Row::Holds wanted>
   HWY_INLINE void fill(i32 first, i32 vectors, Row* row) const {

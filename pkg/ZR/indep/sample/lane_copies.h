@@ -27,5 +27,8 @@ using LaneCopyFunc = bool(const CopyPart<T>& part, const ZR_SampPB& params);
 // columns and rows.
 template <class T>
 LaneCopyFunc<T>* lane_bilinear_copy();
+// Means of boxes that boxes_inside() has let pass.
+template <class T>
+LaneCopyFunc<T>* lane_box_copy();
 
 }  // namespace zr
