@@ -11,6 +11,7 @@
 #include "simd/lanes-inl.h"
 #if ZR_HAS_LANES
 #include "sample/lane_box_columns-inl.h"
+#include "sample/lane_copies-inl.h"
 
 HWY_BEFORE_NAMESPACE();
 namespace zr {
@@ -181,6 +182,50 @@ HWY_INLINE bool opaque_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* dst)
   return true;
 }
 
+// The sums of products of both halves of each lane, of which none needs more than 16 bits.
+using Words = hn::Repartition<i16, Tag<i32>>;
+HWY_INLINE Ints pair_products(hn::Vec<Words> a, hn::Vec<Words> b) {
+  const Tag<i32> d;
+#if HWY_ARCH_X86
+  auto others = hn::Zero(d);
+  return hn::ReorderWidenMulAccumulate(d, a, b, hn::Zero(d), others);
+#else
+  const Ints products = hn::BitCast(d, hn::Mul(a, b));
+  return masked(products, 65535) + shifted_right_unsigned<16>(products);
+#endif
+}
+
+// Means of four 8-bit pixels whose alphas differ. Sums of channels lie side by side as single numbers, exact ones; the
+// quotients are off by less than 6u of 255 from what doubles give. False, with dst written in part, where that may
+// tell.
+HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel8>& at, ZR_Pixel8* dst) {
+  constexpr i32 pixels = lane_count() / 4;
+  const Words words;
+  const hn::Repartition<u8, Words> bytes;
+  // Channels of a pair of pixels together, and their alphas to each; 1 to alpha itself.
+  alignas(16) static constexpr u8 pair[16] = {0, 1, 8, 9, 2, 3, 10, 11, 4, 5, 12, 13, 6, 7, 14, 15};
+  alignas(16) static constexpr u8 alphas[16] = {128, 128, 128, 128, 0, 1, 8, 9, 0, 1, 8, 9, 0, 1, 8, 9};
+  alignas(16) static constexpr i16 one[8] = {1, 1, 0, 0, 0, 0, 0, 0};
+  alignas(16) static constexpr f32 quarter[4] = {0.25f, 0, 0, 0}, doubt[4] = {0, 0x1p-13f, 0x1p-13f, 0x1p-13f};
+  const Tag<f32> numbers;
+  const auto is_alpha = hn::Gt(hn::LoadDup128(numbers, quarter), hn::Zero(numbers));
+  const auto sums_of = [&](i32 row, i32 i) HWY_ATTR {
+    const u8* const from = reinterpret_cast<const u8*>(at.row(row)) + 8 * i;
+    const auto v = hn::BitCast(bytes, hn::PromoteTo(words, hn::LoadU(hn::Rebind<u8, Words>(), from)));
+    const auto factors = hn::TableLookupBytesOr0(v, hn::LoadDup128(bytes, alphas));
+    const auto channels = hn::TableLookupBytes(v, hn::LoadDup128(bytes, pair));
+    return pair_products(hn::BitCast(words, channels), hn::Or(hn::BitCast(words, factors), hn::LoadDup128(words, one)));
+  };
+  FloatRounding rounding;
+  for (i32 i = 0; i < lane_count(); i += pixels) {
+    const Floats sums = to_float(sums_of(0, i) + sums_of(1, i));
+    const Floats inverse = inverse_of(at_least(hn::Broadcast<0>(sums.v), 0.5f));
+    const Floats by = hn::IfThenElse(is_alpha, hn::LoadDup128(numbers, quarter), inverse.v);
+    store_channels(rounding.nearest(sums, by, hn::LoadDup128(numbers, doubt)), dst + i);
+  }
+  return none(rounding.unsure());
+}
+
 template <class T>
 HWY_INLINE Ints alpha_bits(const Raw<T>& p) {
   if constexpr (std::is_same_v<T, ZR_PixelFloat>)
@@ -206,6 +251,8 @@ i32 square_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum
       const Bools<i32> opaque = any == i32{Depth<T>::white} && every == i32{Depth<T>::white};
       if (all(opaque || clear)) return put(pick(opaque, opaque_means(square), Raw<T>{}), out);
     }
+    if constexpr (std::is_same_v<T, ZR_Pixel8>)
+      if (weighted_means(at, out)) return channel_of<0>(load_pixels<T>(out));
     BoxSums<T> sums;
     for (const Raw<T>& p : square) sums.add(p, [](Doubles v) HWY_ATTR { return v; });
     return put(sums.mean(1.0), out);

@@ -28,11 +28,6 @@ HWY_INLINE void store_numbers(Doubles v, f64* to) {
   hn::StoreU(v.low, d, to);
   hn::StoreU(v.high, d, to + lane_count() / 2);
 }
-HWY_INLINE Floats at_least(Floats v, f32 least) { return hn::Max(v.v, hn::Set(Tag<f32>(), least)); }
-HWY_INLINE Doubles at_least(Doubles v, f64 least) {
-  const auto limit = hn::Set(Tag<f64>(), least);
-  return {hn::Max(v.low, limit), hn::Max(v.high, limit)};
-}
 // The first of four numbers in the place of all four.
 HWY_INLINE Floats first_of_four(Floats v) { return hn::Broadcast<0>(v.v); }
 HWY_INLINE Doubles first_of_four(Doubles v) {
@@ -52,12 +47,6 @@ template <class T>
 HWY_INLINE Ints load_channels(const T* from) {
   const hn::Rebind<Channel<T>, Tag<i32>> d;
   return hn::PromoteTo(Tag<i32>(), hn::LoadU(d, reinterpret_cast<const Channel<T>*>(from)));
-}
-template <class T>
-HWY_INLINE void store_channels(Ints v, T* to) {
-  const hn::Rebind<Channel<T>, Tag<i32>> d;
-  const hn::Rebind<u32, Tag<i32>> words;
-  hn::StoreU(hn::TruncateTo(d, hn::BitCast(words, v.v)), d, reinterpret_cast<Channel<T>*>(to));
 }
 // The same as the sums take them: alpha, and colours times alpha.
 template <class T, bool weighted>

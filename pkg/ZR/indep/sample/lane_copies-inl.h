@@ -43,6 +43,12 @@ HWY_INLINE Doubles inverse_of(Doubles v) {
 #endif
 }
 
+HWY_INLINE Floats at_least(Floats v, f32 least) { return hn::Max(v.v, hn::Set(Tag<f32>(), least)); }
+HWY_INLINE Doubles at_least(Doubles v, f64 least) {
+  const auto limit = hn::Set(Tag<f64>(), least);
+  return {hn::Max(v.low, limit), hn::Max(v.high, limit)};
+}
+
 // Numbers to the nearest integers, and the lanes where they lie too near to the middle between two.
 class FloatRounding {
  public:
@@ -85,6 +91,14 @@ class DoubleRounding {
 };
 template <class T>
 using Rounding = std::conditional_t<std::is_same_v<T, ZR_Pixel16>, DoubleRounding, FloatRounding>;
+
+// As many channels as there are lanes, side by side as pixels hold them.
+template <class T>
+HWY_INLINE void store_channels(Ints v, T* to) {
+  const hn::Rebind<Channel<T>, Tag<i32>> d;
+  const hn::Rebind<u32, Tag<i32>> words;
+  hn::StoreU(hn::TruncateTo(d, hn::BitCast(words, v.v)), d, reinterpret_cast<Channel<T>*>(to));
+}
 
 enum class Alphas { any, white, clear, illegal };
 
