@@ -3,6 +3,7 @@
 #include <numeric>
 
 #include "mask/convert_rows.h"
+#include "mask/mask_noise.h"
 #include "mask/mask_rows.h"
 #include "mask/masks.h"
 #include "support/edge_rows.h"
@@ -95,6 +96,27 @@ TYPED_TEST(MaskLanes, EqualSingleValues) {
       for (i32 i = 0; i < n; ++i) p[i].red = static_cast<C>(real[i] * static_cast<f32>(zr::MaskDepth<C>::white));
     });
   }
+}
+
+class MaskNoises : public BornLibrary {};
+
+TEST_F(MaskNoises, AreTheNumbersOfOneStepAfterTheOther) {
+  constexpr u64 modulus = 0x7fffffff;
+  EdgeRow memory;
+  for (int level = 1; level < 4 && Instructions::has(level); ++level)
+    for (const u64 start : {u64{1}, u64{48271}, modulus - 1, u64{0x40000001}})
+      for (i32 n = 1; n <= 150; ++n) {
+        const Instructions instructions(level);
+        u16* const noise = memory.at<u16>(n, true);
+        const u16 bits = n % 2 != 0 ? 255 : 32767;
+        const u32 end = zr::lane_noise()(static_cast<u32>(start), n, bits, noise);
+        u64 number = start;
+        for (i32 i = 0; i < n; ++i) {
+          number = number * 48271 % modulus;
+          ASSERT_EQ(noise[i], number & bits) << i << " of " << n << " by " << Instructions::names[level];
+        }
+        ASSERT_EQ(end, number) << n << " by " << Instructions::names[level];
+      }
 }
 
 }  // namespace
