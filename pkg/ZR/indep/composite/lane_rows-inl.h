@@ -27,9 +27,9 @@ struct Lanes {
   static constexpr bool whole_colour = Mode::kind == ModeKind::colour || Mode::kind == ModeKind::alpha_only;
   static constexpr bool narrow = std::is_same_v<T, ZR_Pixel8> && !whole_colour;
   static constexpr bool apart = whole_colour || std::is_same_v<Mode, KeyProtect> ||
-                                std::is_same_v<Mode, BlueThreshold> || std::is_same_v<Mode, SoftLight>;
+                                std::is_same_v<Mode, BlueThreshold> || Mode::kind == ModeKind::grey_ground;
   using Math = ModeMath<std::conditional_t<narrow, NarrowPixel8, T>>;
-  using Pack = std::conditional_t<narrow, Narrow, std::conditional_t<apart, Apart, AlikePack<T>>>;
+  using Pack = std::conditional_t<narrow, Narrow, std::conditional_t<apart, ApartPack<T>, AlikePack<T>>>;
 };
 
 // The source of one vector of pixels, and what covers it.
@@ -159,6 +159,36 @@ i32 single_whole_row(i32 n, const ZR_BlendingMode<T>* mode, const T* src, const 
   return (is_black ? black.unmul : is_white ? rows.white_unfade : rows.grey_unfade)(n, nullptr, dst);
 }
 
+// What the passes around the main function come to under a white alpha: nothing of integers and on a black ground.
+// Other floats round on the way to the ground and back, those of a grey ground only below it, on the way back.
+template <ModeKind ground, class N>
+HWY_INLINE Lane<N> faded_by_white(Lane<N> c) {
+  if constexpr (std::is_same_v<N, f32> && ground == ModeKind::white_ground)
+    return 1.0f - (1.0f - c);
+  else
+    return c;
+}
+template <ModeKind ground, class N>
+HWY_INLINE Lane<N> unfaded_by_white(Lane<N> c) {
+  if constexpr (std::is_same_v<N, f32> && ground == ModeKind::grey_ground)
+    return (c - 0.5f) + 0.5f;
+  else
+    return faded_by_white<ground>(c);
+}
+// Whether they come to no more than that.
+template <ModeKind ground, class M>
+HWY_INLINE bool passes_are_short(const Px<M>& d, typename M::Wide R) {
+  if (!all(d.alpha == M::white)) return false;
+  if constexpr (std::is_same_v<typename M::Wide, Floats>) {
+    if (!all(R == M::white)) return false;
+    if constexpr (ground == ModeKind::grey_ground) {
+      const Floats sum = magnitude_of(d.red) + magnitude_of(d.green) + magnitude_of(d.blue);
+      return all(sum < 0x1p23f);  // above, less a half rounds; no number is left out beside a NaN
+    }
+  }
+  return true;
+}
+
 // All passes over the pixels of one vector; false when a channel is illegal, and then nothing is written. What a
 // pass leaves is legal.
 template <class Mode, class T>
@@ -166,7 +196,8 @@ HWY_INLINE bool blend_whole(Source<typename Lanes<Mode, T>::Math> source, const 
   using M = typename Lanes<Mode, T>::Math;
   using Pack = typename Lanes<Mode, T>::Pack;
   using Wide = typename M::Wide;
-  constexpr bool integers = !std::is_same_v<T, ZR_PixelFloat>;
+  constexpr ModeKind ground = Mode::kind;
+  constexpr bool passes_change_nothing = !std::is_same_v<T, ZR_PixelFloat> || ground == ModeKind::black_ground;
   if (!source.template load<Pack>(src, mask)) return false;
   const Px<M> d = Pack::template load<M>(dst);
   if (!legal(d)) return false;
@@ -174,20 +205,21 @@ HWY_INLINE bool blend_whole(Source<typename Lanes<Mode, T>::Math> source, const 
   const Wide A = source.covered(s.alpha), D = d.alpha;
   const auto clear = A == 0;
   const auto main = [&](const Px<M>& onto) ZR_FORMULA { return pick(clear, onto, blend_in_row<Mode>(s, A, onto)); };
-  // Under a white alpha the other passes leave integers as they are; floats round in them.
-  if (integers && all(D == M::white)) {
-    if (!all(clear)) Pack::template store<M>(main(d), dst);
-    return true;
-  }
   const auto each = [](const Px<M>& p, auto change) ZR_FORMULA {
     return Px<M>{p.alpha, change(p.red), change(p.green), change(p.blue)};
   };
-  const Px<M> blended = main(each(d, [&](Wide c) ZR_FORMULA { return faded<M, Mode::kind>(c, D); }));
   // The union weighs the mask behind the opacity at every depth.
   const Wide weight = source.opaque ? s.alpha : M::mul(s.alpha, source.opacity);
   const Wide R = M::inv(M::mul(M::inv(D), M::inv(source.masked ? M::mul(source.cover, weight) : weight)));
+  if (passes_are_short<ground>(d, R)) {
+    if (passes_change_nothing && all(clear)) return true;
+    const Px<M> out = main(each(d, [](Wide c) ZR_FORMULA { return faded_by_white<ground>(c); }));
+    Pack::template store<M>(each(out, [](Wide c) ZR_FORMULA { return unfaded_by_white<ground>(c); }), dst);
+    return true;
+  }
+  const Px<M> blended = main(each(d, [&](Wide c) ZR_FORMULA { return faded<M, ground>(c, D); }));
   const auto over = divisor_of<M>(R);
-  const Px<M> out = each(blended, [&](Wide c) ZR_FORMULA { return M::stored(unfaded<M, Mode::kind>(c, over)); });
+  const Px<M> out = each(blended, [&](Wide c) ZR_FORMULA { return M::stored(unfaded<M, ground>(c, over)); });
   Pack::template store<M>(with_alpha<M>(out, R), dst);
   return true;
 }

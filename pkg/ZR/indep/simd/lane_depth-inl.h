@@ -252,6 +252,41 @@ struct Apart {
     HWY_NAMESPACE::store<M>(v, p);
   }
 };
+// As Apart, of floats, in the order that takes fewest shuffles: for formulas to which a pixel's place is nothing.
+struct ApartInAnyOrder {
+  static constexpr i32 pixels = lane_count();
+  template <class M>
+  static HWY_INLINE Px<M> load(const ZR_PixelFloat* p) {
+    const auto* const from = reinterpret_cast<const f32*>(p);
+    const auto row = [from](int i) HWY_ATTR { return hn::LoadU(Tag<f32>(), from + i * lane_count()); };
+    Px<M> v;
+    turned(row(0), row(1), row(2), row(3), v.alpha.v, v.red.v, v.green.v, v.blue.v);
+    return v;
+  }
+  template <class M>
+  static HWY_INLINE void store(const Px<M>& v, ZR_PixelFloat* p) {
+    auto* const to = reinterpret_cast<f32*>(p);
+    Floats::V rows[4];
+    turned(v.alpha.v, v.red.v, v.green.v, v.blue.v, rows[0], rows[1], rows[2], rows[3]);
+    for (int i = 0; i < 4; ++i) hn::StoreU(rows[i], Tag<f32>(), to + i * lane_count());
+  }
+
+ private:
+  // Rows to columns within each four lanes, which is its own inverse.
+  static HWY_INLINE void turned(Floats::V a, Floats::V b, Floats::V c, Floats::V d, Floats::V& first, Floats::V& second,
+                                Floats::V& third, Floats::V& fourth) {
+    const auto lower = [](Floats::V x, Floats::V y) HWY_ATTR { return hn::InterleaveLower(Tag<f32>(), x, y); };
+    const auto upper = [](Floats::V x, Floats::V y) HWY_ATTR { return hn::InterleaveUpper(Tag<f32>(), x, y); };
+    const auto ac_front = lower(a, c), ac_back = upper(a, c), bd_front = lower(b, d), bd_back = upper(b, d);
+    first = lower(ac_front, bd_front);
+    second = upper(ac_front, bd_front);
+    third = lower(ac_back, bd_back);
+    fourth = upper(ac_back, bd_back);
+  }
+};
+template <class T>
+using ApartPack = std::conditional_t<std::is_same_v<T, ZR_PixelFloat>, ApartInAnyOrder, Apart>;
+
 // Together: whole float pixels as they lie in memory, for formulas that treat the three colours alike. All three
 // colours are that one vector, so that the compiler works them out once; alpha is spread over its pixel's lanes.
 struct Together {
