@@ -52,7 +52,8 @@ void each_composite(Body&& body) {
                {XferSaturation, "saturation"},
                {XferColor, "color"},
                {XferLuminosity, "luminosity"},
-               {XferLinearLight, "linear-light"}};
+               {XferLinearLight, "linear-light"},
+               {XferDissolve, "dissolve"}};
   for (const auto& mode : modes)
     for (const Layer layer : layers) body(Composite{mode.xfer, mode.name, layer, Layer::opaque, false});
 }

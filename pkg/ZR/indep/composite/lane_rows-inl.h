@@ -6,6 +6,7 @@
 #define ZR_COMPOSITE_LANE_ROWS_INL_H
 #endif
 
+#include "composite/lane_dissolve-inl.h"
 #include "composite/lane_ground_rows.h"
 #include "composite/lane_matte_mix-inl.h"
 #include "composite/mode_kinds-inl.h"
@@ -135,6 +136,7 @@ const InnerRows<T>& lane_rows() {
     });
     functions[Copy::number - first_mode] = functions[CopyFast::number - first_mode] = &copy_row<T, masked>;
     functions[MatteMix::number - first_mode] = &matte_mix_row<T>;
+    functions[Dissolve::number - first_mode] = masked ? &dissolve_row<T> : &unmasked_dissolve_row<T>;
     return functions;
   }();
   return rows;

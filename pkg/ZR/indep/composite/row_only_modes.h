@@ -6,6 +6,7 @@
 #include <cstring>
 
 #include "composite/mode_kinds-inl.h"
+#include "world/random.h"
 
 namespace zr {
 
@@ -123,7 +124,7 @@ void run_row(Dissolve, const Row<T, masked>& row) {
     const T s = row.src[i];
     const Wide<T> A = cover(s.alpha, i);
     bool wins = A >= Depth<T>::white;
-    if (!wins && A > 0) wins = M::dissolves(ZR_Rand(&seed), A);
+    if (!wins && A > 0) wins = M::dissolves(random_number(seed = next_seed(seed)), A);
     if (!wins) continue;
     copy_colour(s, row.dst[i]);
     if (!keep_alpha) row.dst[i].alpha = static_cast<Channel<T>>(Depth<T>::white);

@@ -8,6 +8,7 @@
 #include <cstdarg>
 
 #include "world/guard.h"
+#include "world/random.h"
 
 extern "C" {
 
@@ -43,13 +44,6 @@ i32 ZR_AppCallback(void* /*ref*/, i32 selector, ...) {
 
 f64 ZR_Hypot(f64 x, f64 y) { return std::sqrt(x * x + y * y); }
 
-i32 ZR_Rand(u32* seed) {
-  // Not the textbook generator: the high part is added, and the sum wraps at 32 bits. What plug-ins render
-  // from a seed depends on it.
-  u32 next = (*seed % 44488u) * 48271u + (*seed / 44488u) * 3399u;
-  if (next == 0) next = 0x7fffffffu;
-  *seed = next;
-  return static_cast<i32>((next >> 7) & 0x7fffu);
-}
+i32 ZR_Rand(u32* seed) { return zr::random_number(*seed = zr::next_seed(*seed)); }
 
 }  // extern "C"
