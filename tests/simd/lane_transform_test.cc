@@ -154,7 +154,9 @@ TYPED_TEST(LaneWorlds, ScaledCopies) {
       src = this->world(this->src_, width, height, trial % 2 == 0, false);
       dst = this->world(this->dst_, 2 * width, 2 * height, trial % 2 != 0, false);
     }
-    for (const auto copy : {&ZR_CopyBits_Draft, &ZR_CopyBits_HQ_Straight})
+    std::vector copies = {&ZR_CopyBits_Draft, &ZR_CopyBits_HQ_Straight};
+    if (std::is_same_v<TypeParam, ZR_Pixel8>) copies.push_back(&ZR_CopyBits_HQ_Premul);
+    for (const auto copy : copies)
       this->compare("trial " + std::to_string(trial), dst, [&] { return copy(nullptr, &src, &dst, nullptr, nullptr); });
     if (this->HasFatalFailure()) return;
   }

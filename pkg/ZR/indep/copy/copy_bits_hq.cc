@@ -174,10 +174,17 @@ i32 copy_premul(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* 
   }
   SampledCopy copy;
   if (!copy.prepare(from, to, *dst)) return ZR_Err_None;
-  SampleFunc<ZR_Pixel8>* const sample =
-      copy.shrinks() ? slot<ZR_Slot_area_premul8>() : slot<ZR_Slot_bilinear_premul8>();
+  const bool boxes = copy.shrinks();
+  SampleFunc<ZR_Pixel8>*const point = slot<ZR_Slot_bilinear_premul8>(), *const area = slot<ZR_Slot_area_premul8>();
+  InnerRow<ZR_Pixel8> inner;
+  inner.boxes = boxes;
+  const LanePremul* const lanes = lane_premul_samples();
+  const bool own = point == &ZR_SubpixelSample_Premul && (!boxes || area == &ZR_AreaSample_Premul);
+  // A copy within one world reads what it has written, pixel by pixel.
+  const bool apart = !CopyPlane(*src, sizeof(ZR_Pixel8)).may_overlap(CopyPlane(*dst, sizeof(ZR_Pixel8)));
+  if (own && apart && lanes != nullptr) inner.row = boxes ? lanes->boxes : lanes->bilinear;
   // Rows and columns are counted in 16 bits: 32768 of them count as none.
-  return copy.run<ZR_Pixel8>(progress, src, dst, sample, {}, static_cast<i16>(copy.x.count()),
+  return copy.run<ZR_Pixel8>(progress, src, dst, boxes ? area : point, inner, static_cast<i16>(copy.x.count()),
                              static_cast<i16>(copy.y.count()));
 }
 

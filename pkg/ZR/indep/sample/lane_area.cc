@@ -10,6 +10,7 @@
 
 #include "simd/lanes-inl.h"
 #if ZR_HAS_LANES
+#include "sample/lane_box_axis-inl.h"
 #include "sample/lane_box_columns-inl.h"
 #include "sample/lane_copies-inl.h"
 
@@ -26,9 +27,6 @@ HWY_INLINE Doubles lesser(Doubles v, f64 limit) {  // NaN stays
   const auto most = hn::Set(Tag<f64>(), limit);
   return {hn::IfThenElse(hn::Gt(v.low, most), most, v.low), hn::IfThenElse(hn::Gt(v.high, most), most, v.high)};
 }
-HWY_INLINE i32 least_of(Ints v) { return hn::GetLane(hn::MinOfLanes(Tag<i32>(), v.v)); }
-HWY_INLINE i32 most_of(Ints v) { return hn::GetLane(hn::MaxOfLanes(Tag<i32>(), v.v)); }
-
 // Alpha, and colours times alpha, each product rounded as single numbers are.
 template <class T>
 struct BoxSums {
@@ -79,21 +77,6 @@ struct BoxSums {
       return packed<T>(channel(alpha), channel(colour(1)), channel(colour(2)), channel(colour(3)));
     }
   }
-};
-
-// The box of each lane across a row: pixels from `first` on, of which the first and the last may be partial.
-struct LaneAxis {
-  Ints first, last, before, behind;  // the last pixel counted from the first one
-  i32 whole_end, end;                // pixels up to here are whole in all lanes; no lane has more than so many
-
-  HWY_INLINE LaneAxis(Ints from, Ints to)
-      : first(shifted_right<16>(from)),
-        last(shifted_right<16>(to) - first),
-        before(Ints(0x10000) - masked(from, 65535)),
-        behind(masked(to, 65535)),
-        whole_end(least_of(last)),
-        end(most_of(last + pick(behind == 0, 0, 1))) {}
-  HWY_INLINE Ints width(i32 k) const { return k == 0 ? before : pick(last > k, 0x10000, pick(last == k, behind, 0)); }
 };
 
 // Two rows of neighbouring pairs: each destination pixel is the mean of a square of four whole pixels.

@@ -57,6 +57,13 @@ const LaneRows<T>* lane_bicubic_rows();
 template <class T>
 LaneRowFunc<T>* lane_box_row();
 
+// The same two for premultiplied pixels: bilinear ones whose neighbours lie inside, and such boxes.
+struct LanePremul {
+  LaneRowFunc<ZR_Pixel8>*bilinear, *boxes;
+};
+// The fastest that this processor has, or null.
+const LanePremul* lane_premul_samples();
+
 // Nearest pixels of a row and of a row in motion, to whose positions half a pixel has been added. May be null; the
 // bytes of the world are fewer than 2^31.
 template <class T>
