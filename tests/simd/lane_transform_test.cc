@@ -86,7 +86,12 @@ TYPED_TEST(LaneWorlds, Transforms) {
     constexpr f64 scales[] = {1, 1, 2, 1.3, 0.5, 0.4, 3.1};
     constexpr f64 shifts[] = {0, 0.5, 3, -7.25, 1.0 / 3, -0.001};
     const auto shift = [&] { return shifts[this->below(6)]; };
-    const f64 scale = scales[this->below(7)], degrees = this->below(2) != 0 ? 0 : this->between(-30, 30);
+    f64 scale = scales[this->below(7)], degrees = this->below(2) != 0 ? 0 : this->between(-30, 30);
+    if (trial % 4 == 0) {  // boxes in rows that are turned
+      src = this->world(this->src_, 22, 22, trial % 8 == 0, trial % 16 == 0);
+      dst = this->world(this->dst_, 22, 20, trial % 8 != 0, false);
+      scale = this->between(0.6, 0.95), degrees = this->between(-30, 30);
+    }
     constexpr i32 counts[] = {1, 2, 2, 3, 6};
     const i32 count = counts[this->below(5)];
     const bool turns = this->below(2) != 0;

@@ -67,13 +67,18 @@ PixelRange boxes_inside(const SampleRun& run, const ZR_SampPB& params) {
   // No box reads the pixel behind it where all of them end with a whole one.
   const bool whole = ((run.step_x | (wrap_add(run.x, params.x_radius) ^ 32768)) & 0xffff) == 0;
   const i64 end = (std::min(src.width, 32767) - i64{1}) * 65536 + (whole ? 65536 : 0);
+  // Turned rows: two pixels to the right of a box are read, and one below.
+  const i64 turned_right = (std::min(src.width, 32767) - i64{2}) * 65536;
+  const i64 turned_bottom = (std::min(src.height, 32767) - i64{1}) * 65536;
   const auto inside = [&](i32 i) {
     const i64 x = run.x + static_cast<i64>(i) * run.step_x + 32768;
-    return x >= params.x_radius && x + params.x_radius <= end;
+    if (run.step_y == 0) return x >= params.x_radius && x + params.x_radius <= end;
+    const i64 y = run.y + static_cast<i64>(i) * run.step_y + 32768;
+    return x >= params.x_radius && x + params.x_radius <= turned_right && y >= params.y_radius &&
+           y + params.y_radius <= turned_bottom;
   };
   PixelRange range = {0, run.count};
-  if (src.data == nullptr || run.step_y != 0 || params.x_radius <= half_a_pixel || params.y_radius <= half_a_pixel)
-    return {0, 0};
+  if (src.data == nullptr || params.x_radius <= half_a_pixel || params.y_radius <= half_a_pixel) return {0, 0};
   while (range.first < range.end && !inside(range.first)) ++range.first;
   while (range.end > range.first && !inside(range.end - 1)) --range.end;
   return range;

@@ -1,4 +1,4 @@
-// Box means along a row, on lanes: all pixels of a row share their source rows.
+// Box means along a row, on lanes: all pixels of a row share their source rows, unless it is turned.
 #include <bit>
 
 #include "sample/ZR_AreaSample_StraightT.h"
@@ -280,6 +280,38 @@ i32 scattered_boxes(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* su
   });
 }
 
+// Boxes that lie anywhere, pixel by pixel in reading order as the sampler takes them: those that a lane's box does not
+// cover add nothing.
+template <class T>
+i32 turned_boxes(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
+  const ZR_LayerDef& src = *params.src;
+  const f64 quarter_area = (params.x_radius / 65536.0) * (params.y_radius / 65536.0);
+  return sample_vectors<T, Scattered<T>>(run, src, sum, dst, [&](const Scattered<T>& at, T* out) HWY_ATTR {
+    constexpr i32 together = sizeof(T) == 4 ? 2 : 1;  // pixels of a read
+    const LaneAxis across(at.x() - params.x_radius + 32768, at.x() + params.x_radius + 32768);
+    const LaneAxis down(at.y() - params.y_radius + 32768, at.y() + params.y_radius + 32768);
+    Scattered<T> corner(src);
+    corner.move_to(shifted_left<16>(across.first), shifted_left<16>(down.first));
+    BoxSums<T> sums;
+    for (i32 j = 0; j < down.end; ++j) {
+      const Ints height = down.width(j);
+      const Doubles part = to_double(height) * 0x1p-32;
+      for (i32 k = 0; k < across.end; k += together) {
+        Raw<T> p[together];
+        corner.row(k, j, p);
+        for (i32 i = 0; i < together; ++i) {
+          const Ints width = across.width(k + i);
+          const Doubles area = part * to_double(width);
+          if constexpr (std::is_same_v<T, ZR_PixelFloat>)  // what is not covered may be no number
+            p[i] = pick(width == 0 || height == 0, Raw<T>{}, p[i]);
+          sums.add(p[i], [&](Doubles v) HWY_ATTR { return area * v; });
+        }
+      }
+    }
+    return put(sums.mean(quarter_area), out);
+  });
+}
+
 // Boxes whose sums can be taken down the columns first, a stretch of the row at a time.
 template <class T>
 class BoxStretches {
@@ -321,6 +353,7 @@ class BoxStretches {
 
 template <class T>
 i32 box_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
+  if (run.step_y != 0) return turned_boxes(run, params, sum, dst);
   if (Pairs<T>::fit(run, params)) return square_vectors(run, params, sum, dst);
   if constexpr (!std::is_same_v<T, ZR_PixelFloat>) {
     const BoxStretches<T> stretches(run, params);

@@ -52,8 +52,7 @@ const LaneRows<T>* lane_bilinear_rows();
 template <class T>
 const LaneRows<T>* lane_bicubic_rows();
 
-// Box means of steps along a row of the source (step_y is 0), for boxes of more than a pixel both ways that
-// boxes_inside() has let pass.
+// Box means for boxes of more than a pixel both ways that boxes_inside() has let pass.
 template <class T>
 LaneRowFunc<T>* lane_box_row();
 
@@ -89,7 +88,8 @@ struct PixelRange {
 };
 // The pixels of a run whose source pixel lies in a rectangle; none of those wraps.
 PixelRange run_within(const SampleRun& run, const GX_LRect& rect);
-// The pixels of a run along a row whose boxes, and a pixel more, lie between the world's left and right edge.
+// The pixels of a run whose boxes, and a pixel or two more, lie inside the world; of a run along a row of the source
+// between its left and right edge.
 PixelRange boxes_inside(const SampleRun& run, const ZR_SampPB& params);
 
 }  // namespace zr

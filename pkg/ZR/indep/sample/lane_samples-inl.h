@@ -230,6 +230,7 @@ class Scattered {
     locate();
   }
   HWY_INLINE Ints x() const { return x_; }
+  HWY_INLINE Ints y() const { return y_; }
   HWY_INLINE Ints fraction_x() const { return masked(x_, 65535); }
   HWY_INLINE Ints fraction_y() const { return masked(y_, 65535); }
   HWY_INLINE Bools<i32> whole() const { return masked(x_ | y_, 65535) == 0; }
@@ -240,7 +241,7 @@ class Scattered {
     constexpr i32 words = Raw<T>::words;
     const char* const base = neighbour(dx, dy);
     if constexpr (count * words == 2) {
-      gather_pairs(base, low_, high_, &p[0].w[0], &p[1].w[0]);
+      gather_pairs(base, low_, high_, &p[0].w[0], &p[1 / words].w[1 % words]);
     } else {
       for (i32 i = 0; i < count; i += 4 / words) {
         Ints block[4];
