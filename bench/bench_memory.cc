@@ -40,8 +40,8 @@ void look_up(benchmark::State& state, Size size) {
 }
 
 template <class T>
-void sum_areas(benchmark::State& state, Size size) {
-  const auto src = make_world<T>(size, Layer::translucent);
+void sum_areas(benchmark::State& state, Size size, Layer layer) {
+  const auto src = make_world<T>(size, layer);
   for (auto _ : state) benchmark::DoNotOptimize(ZR_SummedAreaTable(src.get(), false).Width());
   count_bytes<T>(state, size, 1);
 }
@@ -91,7 +91,9 @@ const bool registered = [] {
         add("unmul/" + depth + "/" + name_of(layer), size,
             [layer](benchmark::State& state, Size s) { premultiply<T>(state, s, layer, false); });
       }
-      add("summed-area/" + depth, size, [](benchmark::State& state, Size s) { sum_areas<T>(state, s); });
+      for (const Layer layer : {Layer::opaque, Layer::translucent})
+        add("summed-area/" + depth + "/" + name_of(layer), size,
+            [layer](benchmark::State& state, Size s) { sum_areas<T>(state, s, layer); });
       add("allocate/" + depth, size, [](benchmark::State& state, Size s) {
         for (auto _ : state) {
           ZR_LayerDef layer;

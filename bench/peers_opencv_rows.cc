@@ -75,7 +75,7 @@ const bool registered = [] {
     each_depth([&]<class From>() {
       const std::string depth = depth_name<From>();
       add("fill/" + depth + "/opencv", size, fill<From>);
-      add("summed-area/" + depth + "/opencv", size, sum_areas<From>);
+      add("summed-area/" + depth + "/opaque/opencv", size, sum_areas<From>);
       each_depth([&]<class To>() {
         if constexpr (!std::is_same_v<From, To>)
           add("convert/" + depth + "-to-" + depth_name<To>() + "/opencv", size, convert<From, To>);

@@ -186,6 +186,11 @@ TYPED_TEST(LaneWorlds, SummedAreas) {
   using T = TypeParam;
   for (i32 trial = 0; trial < 60; ++trial) {
     ZR_LayerDef layer = this->any_world(this->src_);
+    const i32 opaque = layer.height * (trial % 4) / 3;  // rows
+    for (i32 i = 0; i < opaque * layer.width; ++i) {
+      char* const row = static_cast<char*>(layer.data) + std::ptrdiff_t{i / layer.width} * layer.row_bytes;
+      reinterpret_cast<T*>(row)[i % layer.width].alpha = this->part_of_white(1.0f);
+    }
     const ZR_WorldX<T> world(&layer, true);
     const std::size_t entries = static_cast<std::size_t>(layer.width * layer.height);
     for (const bool use_double : {false, true}) {

@@ -8,6 +8,8 @@
 
 #include <hwy/cache_control.h>
 
+#include <cstdint>
+
 #include "simd/lanes-inl.h"
 #if ZR_HAS_LANES && HWY_TARGET <= HWY_AVX2 && (defined(__x86_64__) || defined(__i386__))
 #define ZR_SUMS_ON_LANES 1
@@ -23,6 +25,7 @@ namespace HWY_NAMESPACE {
 #if ZR_SUMS_ON_LANES
 using Quad = hn::FixedTag<f64, 4>;
 using QuadV = hn::Vec<Quad>;
+constexpr i32 opaque_rows = 4;
 
 // 1 for alpha, whose lane is the first.
 HWY_INLINE QuadV weighted(QuadV channels, QuadV factor) {
@@ -52,32 +55,52 @@ HWY_INLINE void put(QuadV v, ZR_PixelFloat* out) {
   hn::StoreU(hn::DemoteTo(d, v), d, reinterpret_cast<f32*>(out));
 }
 
+// Sums of whole numbers are the same in any order. The bits of 2^52 and a sum, as a double, are those of 2^52 plus
+// the bits of the sum, as a whole number; one rounding takes 2^52 away again and multiplies.
+constexpr f64 whole_base = 0x1p52;
+
+// What sums of some columns of `rows` rows are multiplied by.
+template <i32 rows>
+struct Inverses {
+  static constexpr i32 block = 16;  // few, so that divisions run beside the sums of the block before
+  alignas(64) f64 of[rows][block], bases[rows][block];  // and those times whole_base
+
+  HWY_INLINE void fill(i32 first, i32 y) {
+    const Quad d;
+    constexpr i32 lanes = 4;
+    for (i32 r = 0; r < rows; ++r)
+      for (i32 k = 0; k < block; k += lanes) {
+        const QuadV columns = hn::Iota(d, first + k + 1.0);
+        const QuadV inverse = hn::Div(hn::Set(d, 1.0), hn::Mul(columns, hn::Set(d, y + r + 1.0)));
+        hn::Store(inverse, d, of[r] + k);
+        hn::Store(hn::Mul(inverse, hn::Set(d, whole_base)), d, bases[r] + k);
+      }
+  }
+};
+
+template <class T>
+HWY_INLINE const T* row_at(const ZR_World& world, i32 y) {
+  return reinterpret_cast<const T*>(static_cast<const char*>(world.data) +
+                                    static_cast<std::ptrdiff_t>(y) * world.row_bytes);
+}
+
 // `rows` rows at once: the sums of one wait for those of the row above, which the processor works on meanwhile.
 template <i32 rows, class T, class Entry>
 HWY_INLINE void sum_rows(const ZR_World& world, i32 y, const f64* parts, f64* above, Entry* table) {
-  constexpr i32 block = 16;  // few, so that divisions run beside the sums of the block before
-  alignas(64) f64 inverse[rows][block];
   const Quad d;
-  const Quad wide;
   const i32 width = world.width;
+  Inverses<rows> inverse;
   const T* src[rows];
   Entry* out[rows];
   QuadV left[rows], corner[rows];
   for (i32 r = 0; r < rows; ++r) {
-    src[r] = reinterpret_cast<const T*>(static_cast<const char*>(world.data) +
-                                        static_cast<std::ptrdiff_t>(y + r) * world.row_bytes);
+    src[r] = row_at<T>(world, y + r);
     out[r] = table + static_cast<std::ptrdiff_t>(y + r) * width;
     left[r] = corner[r] = hn::Zero(d);
   }
-  for (i32 first = 0; first < width; first += block) {
-    const i32 end = std::min(first + block, width);
-    for (i32 r = 0; r < rows; ++r) {
-      auto columns = hn::Add(hn::Iota(wide, 1.0), hn::Set(wide, static_cast<f64>(first)));
-      for (i32 k = 0; k < block; k += static_cast<i32>(hn::Lanes(wide))) {
-        hn::Store(hn::Div(hn::Set(wide, 1.0), hn::Mul(columns, hn::Set(wide, y + r + 1.0))), wide, inverse[r] + k);
-        columns = hn::Add(columns, hn::Set(wide, static_cast<f64>(hn::Lanes(wide))));
-      }
-    }
+  for (i32 first = 0; first < width; first += inverse.block) {
+    const i32 end = std::min(first + inverse.block, width);
+    inverse.fill(first, y);
     for (i32 x = first; x < end; ++x) {
       f64* const cell = above + static_cast<std::size_t>(x) * 4;
       QuadV upper = hn::LoadU(d, cell);
@@ -85,20 +108,82 @@ HWY_INLINE void sum_rows(const ZR_World& world, i32 y, const f64* parts, f64* ab
         const QuadV sum = hn::Sub(hn::Add(hn::Add(premultiplied(src[r] + x, parts), left[r]), upper), corner[r]);
         corner[r] = upper;
         upper = left[r] = sum;
-        put(hn::Mul(hn::Set(d, inverse[r][x - first]), sum), out[r] + x);
+        put(hn::Mul(hn::Set(d, inverse.of[r][x - first]), sum), out[r] + x);
       }
       hn::StoreU(upper, d, cell);
     }
   }
 }
 
+// Asks for what is written a little later: four streams are more than processors follow. Nothing is touched.
+HWY_INLINE void write_ahead(const void* at) {
+  hwy::Prefetch(reinterpret_cast<const char*>(reinterpret_cast<std::uintptr_t>(at) + 2048));
+}
+
+template <class Entry>
+HWY_INLINE void sum_opaque_rows(const ZR_World& world, i32 y, f64* above, Entry* table) {
+  constexpr i32 rows = opaque_rows;
+  const Quad d;
+  const hn::FixedTag<u64, 4> whole;
+  const QuadV base = hn::Set(d, whole_base);
+  const i32 width = world.width;
+  Inverses<rows> inverse;
+  const ZR_Pixel8* src[rows];
+  Entry* out[rows];
+  hn::Vec<decltype(whole)> row[rows];
+  for (i32 r = 0; r < rows; ++r) {
+    src[r] = row_at<ZR_Pixel8>(world, y + r);
+    out[r] = table + static_cast<std::ptrdiff_t>(y + r) * width;
+    row[r] = hn::Zero(whole);
+  }
+  for (i32 first = 0; first < width; first += inverse.block) {
+    const i32 end = std::min(first + inverse.block, width);
+    inverse.fill(first, y);
+    for (i32 x = first; x < end; ++x) {
+      f64* const cell = above + static_cast<std::size_t>(x) * 4;
+      auto sum = hn::BitCast(whole, hn::Add(hn::LoadU(d, cell), base));
+      for (i32 r = 0; r < rows; ++r) {
+        i32 word;
+        std::memcpy(&word, src[r] + x, sizeof word);
+        row[r] = hn::Add(row[r], hn::Vec<decltype(whole)>{_mm256_cvtepu8_epi64(_mm_cvtsi32_si128(word))});
+        sum = hn::Add(sum, row[r]);
+        const QuadV factor = hn::Set(d, inverse.of[r][x - first]), less = hn::Set(d, inverse.bases[r][x - first]);
+        put(hn::MulSub(hn::BitCast(d, sum), factor, less), out[r] + x);
+        if (x % 4 == 0) write_ahead(out[r] + x);
+      }
+      hn::StoreU(hn::Sub(hn::BitCast(d, sum), base), d, cell);
+    }
+  }
+}
+
+HWY_INLINE bool is_opaque(const ZR_Pixel8* row, i32 n) {
+  constexpr i32 lanes = lane_count();
+  const Tag<i32> d;
+  const i32* const words = reinterpret_cast<const i32*>(row);
+  i32 every = -1, i = 0;
+  if (n >= lanes) {
+    Ints all_of = -1;
+    for (; n - i >= lanes; i += lanes) all_of = hn::And(all_of.v, hn::LoadU(d, words + i));
+    if (!all(masked(all_of, 255) == 255)) return false;
+  }
+  for (; i < n; ++i) every &= row[i].alpha;
+  return (every & 255) == 255;
+}
+
 template <class T, class Entry>
 void sum_world(const ZR_World& world, f64* above, Entry* table) {
   f64 parts[256];
-  if constexpr (sizeof(T) == 4)
-    for (i32 a = 0; a < 256; ++a) parts[a] = a / 255.0;
-  constexpr i32 rows = 4;
+  constexpr i32 rows = opaque_rows;
   i32 y = 0;
+  if constexpr (sizeof(T) == 4) {
+    for (i32 a = 0; a < 256; ++a) parts[a] = a / 255.0;
+    const auto all_opaque = [&](i32 first) {
+      for (i32 r = 0; r < rows; ++r)
+        if (!is_opaque(row_at<T>(world, first + r), world.width)) return false;
+      return true;
+    };
+    for (; world.height - y >= rows && all_opaque(y); y += rows) sum_opaque_rows(world, y, above, table);
+  }
   for (; world.height - y >= rows; y += rows) sum_rows<rows, T>(world, y, parts, above, table);
   for (; y < world.height; ++y) sum_rows<1, T>(world, y, parts, above, table);
   hwy::FlushStream();
