@@ -22,10 +22,14 @@ void copy(benchmark::State& state, Copy routine, Size from, Size to, Layer layer
 
 template <class To, class From>
 void add_copy(Size size) {
-  const bool converts = !std::is_same_v<To, From>;
+  constexpr bool converts = !std::is_same_v<To, From>;
   add(std::string("copybits-draft/") + depth_name<From>() + (converts ? std::string("-to-") + depth_name<To>() : "") +
           "/same-size",
       size, [](benchmark::State& state, Size s) { copy<To, From>(state, &ZR_CopyBits_Draft, s, s, Layer::opaque); });
+  if constexpr (converts)
+    for (const Resize* one : {&nearest_half, &nearest_double})
+      add(std::string(one->name) + "/" + depth_name<From>() + "-to-" + depth_name<To>(), size,
+          [=](benchmark::State& state, Size s) { copy<To, From>(state, one->routine, s, one->to(s), Layer::opaque); });
 }
 
 constexpr const Resize* resizes[] = {&nearest_half, &nearest_double, &area_third, &area_half, &bilinear_larger};

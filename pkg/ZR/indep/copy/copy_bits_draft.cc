@@ -30,6 +30,38 @@ void copy_in_place(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect& rect) {
   }
 }
 
+// The pixels at columns[0..n-1] of a row of `width` pixels; nothing shares memory.
+template <class T>
+void pick_pixels(const LaneColumns* lanes, i32 n, const i32* columns, i32 width, const T* src, T* dst) {
+  i32 done = 0;
+  if constexpr (sizeof(T) <= 8)
+    if (lanes != nullptr)
+      done = (sizeof(T) == 4 ? lanes->pick4 : lanes->pick8)(n, columns, width, reinterpret_cast<const char*>(src),
+                                                            reinterpret_cast<char*>(dst));
+  for (i32 k = done; k < n; ++k) dst[k] = src[columns[k]];
+}
+
+// The same at another depth: the smaller pixels are picked, unless that means to convert more of them. Columns never
+// fall.
+template <class To, class From>
+void convert_pixels(const LaneColumns* lanes, i32 n, const i32* columns, i32 width, const From* src, To* dst) {
+  constexpr i32 batch = 256;
+  for (; n > 0; n -= batch, columns += batch, dst += batch) {
+    const i32 count = std::min(n, batch), first = columns[0], span = columns[count - 1] - first + 1;
+    if (sizeof(To) < sizeof(From) && span <= count) {
+      To converted[batch];
+      i32 places[batch];
+      for (i32 k = 0; k < count; ++k) places[k] = columns[k] - first;
+      copy_row(span, src + first, converted);
+      pick_pixels(lanes, count, places, span, converted, dst);
+    } else {
+      From picked[batch];
+      pick_pixels(lanes, count, columns, width, src, picked);
+      copy_row(count, picked, dst);
+    }
+  }
+}
+
 template <class To, class From>
 i32 copy_bits(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect, const GX_LRect* dst_rect) {
   CopySide from, to;
@@ -41,14 +73,14 @@ i32 copy_bits(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect, cons
   }
   const LaneColumns* const lanes = lane_columns();
   const auto emit = [&](i32 n, const i32* columns, const char* src_row, char* dst_pixels, bool apart) {
-    i32 done = 0;
-    if constexpr (std::is_same_v<To, From> && sizeof(To) <= 8) {
-      if (lanes != nullptr && apart)
-        done = (sizeof(To) == 4 ? lanes->pick4 : lanes->pick8)(n, columns, src->width, src_row, dst_pixels);
-    }
     const From* const in = reinterpret_cast<const From*>(src_row);
     To* const out = reinterpret_cast<To*>(dst_pixels);
-    for (i32 k = done; k < n; ++k) out[k] = copy_pixel<To>(in[columns[k]]);
+    if (!apart)
+      for (i32 k = 0; k < n; ++k) out[k] = copy_pixel<To>(in[columns[k]]);
+    else if constexpr (std::is_same_v<To, From>)
+      pick_pixels(lanes, n, columns, src->width, in, out);
+    else
+      convert_pixels(lanes, n, columns, src->width, in, out);
   };
   return copy_scaled({*src, sizeof(From)}, from, {*dst, sizeof(To)}, to, overflow_texts, emit);
 }
