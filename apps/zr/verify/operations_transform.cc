@@ -57,6 +57,7 @@ const std::vector<Placement>& placements() {
       {"motion-2-whole", motion(kStill, {1, 0, 0, 1, 18, -6}, 2)},
       {"motion-2-doubled", motion({2, 0, 0, 2, 0.5, 0.5}, {2, 0, 0, 2, -11.5, 5.5}, 2)},
       {"motion-2-reduced", motion({0.4, -0.2, 0.2, 0.4, 1.75, 0}, {0.5, 0, 0, 0.5, 3, 2}, 2)},
+      {"motion-2-reduced-moved", motion({0.4, 0, 0, 0.4, 1.75, 0}, {0.4, 0, 0, 0.4, 9.5, 3.25}, 2)},
       {"motion-3", motion(kSheared, kTurned, 3)},
       {"motion-9", motion(kStill, {0.5, 0.1, -0.1, 0.6, 9, 3}, 9)},
   };

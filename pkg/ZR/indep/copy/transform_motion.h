@@ -279,6 +279,91 @@ class BestMotionRow final : public RowSampler<T> {
   f64 (*weights_)[4] = nullptr;
 };
 
+// Sums over rows of samples of the same pixels, and their means.
+template <class T>
+class RowSums {
+ public:
+  // In the scratch block or memory of the workspace. Throws out of memory.
+  RowSums(i32 count, i32 samples, void* block, Workspace* workspace) : count_(count), samples_(samples) {
+    if (samples <= most_lane_samples) lanes_ = lane_motion_sums<T>();
+    bytes_ = lanes_ != nullptr ? lanes_->bytes(count) : static_cast<std::size_t>(count) * sizeof(MotionSum<T>);
+    sums_ = workspace->take<char>(block, Workspace::block8_bytes, bytes_);
+  }
+  void clear() { std::memset(sums_, 0, bytes_); }
+  // `alphas` is their sum.
+  void add(const T* row, RowSum<T> alphas) {
+    if constexpr (!std::is_same_v<T, ZR_PixelFloat>)
+      if (alphas == 0) return;
+    if (lanes_ != nullptr)
+      lanes_->add(count_, row, sums_);
+    else
+      for (i32 i = 0; i < count_; ++i) single_sums()[i].add(row[i]);
+  }
+  void mean(T* row, RowSum<T>* sum) const {
+    RowSum<T> total = 0;
+    if (lanes_ != nullptr) {
+      lanes_->mean(count_, samples_, sums_, &total, row);
+    } else {
+      for (i32 i = 0; i < count_; ++i) {
+        row[i] = single_sums()[i].mean(samples_);
+        total += row[i].alpha;
+      }
+    }
+    *sum = total;
+  }
+
+ private:
+  MotionSum<T>* single_sums() const { return reinterpret_cast<MotionSum<T>*>(sums_); }
+
+  i32 count_, samples_;
+  const LaneMotionSums<T>* lanes_ = nullptr;  // may be null
+  char* sums_ = nullptr;                      // theirs, or those of single pixels
+  std::size_t bytes_ = 0;
+};
+
+// Box means along a straight line, of a layer that keeps its size and lies straight: sample k of all pixels of a row
+// is a row of boxes as of a layer that stands still.
+template <class T>
+class AreaMotionRow final : public RowSampler<T> {
+ public:
+  static bool suits(const RowFunctions<T>& samplers, const ZR_SampPB& params, const MotionWalk& walk) {
+    const bool level = walk.first.step_y == 0 && walk.last.step_y == 0;
+    return takes_area(params) && samplers.inner_boxes != nullptr && level && walk.first.step_x == walk.last.step_x;
+  }
+  AreaMotionRow(const RowFunctions<T>& samplers, const ZR_SampPB& params, const MotionWalk& walk, i32 count,
+                void* const scratch[10])
+      : samplers_(samplers),
+        params_(params),
+        walk_(walk),
+        count_(count),
+        sums_(count, walk.samples, scratch[8], &workspace_) {}
+
+  i32 sample(T* row, RowSum<T>* sum) override {
+    i32 error = ZR_Err_None;
+    const SampleLine line = walk_.line(0, 0);
+    sums_.clear();
+    for (i32 k = 0; k < walk_.samples; ++k) {
+      const GX_LPoint first = line.from_first(k);
+      SourceWalk placed = walk_.first;
+      placed.x = first.x, placed.y = first.y;
+      RowSum<T> alphas = 0;
+      note(sample_best_row<T>(samplers_, params_, placed, count_, nullptr, row, &alphas), &error);
+      sums_.add(row, alphas);
+    }
+    sums_.mean(row, sum);
+    return error;
+  }
+  void next_row() override { walk_.next_row(); }
+
+ private:
+  RowFunctions<T> samplers_;
+  ZR_SampPB params_;
+  MotionWalk walk_;
+  i32 count_;
+  Workspace workspace_;
+  RowSums<T> sums_;
+};
+
 // One sample through each matrix. A row is fetched through one matrix after the other, so that every pixel
 // gets its samples in order and each fetch runs as it does for a layer that stands still.
 template <class T>
@@ -286,11 +371,10 @@ class ComplexMotionRow final : public RowSampler<T> {
  public:
   ComplexMotionRow(const SampleFunctions<T>& samplers, const ZR_SampPB& params, const MatrixList& list,
                    const GX_LRect& bounds, void* const scratch[10])
-      : samplers_(samplers), count_(bounds.right - bounds.left), matrices_(list.count) {
-    if (matrices_ <= most_lane_samples) lanes_ = lane_motion_sums<T>();
-    const auto pixels = static_cast<std::size_t>(count_);
-    sum_bytes_ = lanes_ != nullptr ? lanes_->bytes(count_) : pixels * sizeof(MotionSum<T>);
-    sums_ = workspace_.take<char>(scratch[8], Workspace::block8_bytes, sum_bytes_);
+      : samplers_(samplers),
+        count_(bounds.right - bounds.left),
+        matrices_(list.count),
+        sums_(count_, matrices_, scratch[8], &workspace_) {
     placed_ = workspace_.take<Placed>(scratch[9], Workspace::block9_bytes, static_cast<std::size_t>(matrices_));
     for (i32 k = 0; k < matrices_; ++k) {
       Placed& placed = placed_[k];
@@ -308,30 +392,15 @@ class ComplexMotionRow final : public RowSampler<T> {
 
   i32 sample(T* row, RowSum<T>* sum) override {
     i32 error = ZR_Err_None;
-    std::memset(sums_, 0, sum_bytes_);
+    sums_.clear();
     for (i32 k = 0; k < matrices_; ++k) {
       const Placed& placed = placed_[k];
       if (!placed.regular) continue;  // a transparent sample adds nothing
       RowSum<T> alphas = 0;
       note(sample_best_row<T>(samplers_, placed.params, placed.walk, count_, nullptr, row, &alphas), &error);
-      if constexpr (!std::is_same_v<T, ZR_PixelFloat>)
-        if (alphas == 0) continue;
-      if (lanes_ != nullptr)
-        lanes_->add(count_, row, sums_);
-      else
-        for (i32 i = 0; i < count_; ++i) single_sums()[i].add(row[i]);
+      sums_.add(row, alphas);
     }
-    *sum = 0;
-    if (lanes_ != nullptr) {
-      lanes_->mean(count_, matrices_, sums_, sum, row);
-      return error;
-    }
-    RowSum<T> total = 0;
-    for (i32 i = 0; i < count_; ++i) {
-      row[i] = single_sums()[i].mean(matrices_);
-      total += row[i].alpha;
-    }
-    *sum = total;
+    sums_.mean(row, sum);
     return error;
   }
   void next_row() override {
@@ -345,14 +414,11 @@ class ComplexMotionRow final : public RowSampler<T> {
     SourceWalk walk;
     bool regular;
   };
-  MotionSum<T>* single_sums() const { return reinterpret_cast<MotionSum<T>*>(sums_); }
 
   RowFunctions<T> samplers_;
   i32 count_, matrices_;
   Workspace workspace_;
-  const LaneMotionSums<T>* lanes_ = nullptr;  // may be null
-  char* sums_ = nullptr;                      // theirs, or those of single pixels
-  std::size_t sum_bytes_ = 0;
+  RowSums<T> sums_;
   Placed* placed_ = nullptr;
 };
 

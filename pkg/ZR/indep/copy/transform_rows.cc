@@ -131,6 +131,7 @@ i32 draw_layer(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR
     std::optional<BestRow<T>> best;
     std::optional<DraftMotionRow<T>> draft_motion;
     std::optional<BestMotionRow<T>> best_motion;
+    std::optional<AreaMotionRow<T>> area_motion;
     std::optional<ComplexMotionRow<T>> complex_motion;
     RowSampler<T>* sampler = nullptr;
     const bool is_draft = quality == 0;
@@ -143,12 +144,15 @@ i32 draw_layer(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR
       const i32 samples = count > 2 ? count : is_draft ? 9 : 17;
       params.motion_steps = samples - 1;
       const MotionWalk motion = {walk, source_walk(shutter.last.inverse, bounds.left, bounds.top), samples};
+      const RowFunctions<T> functions(sample_functions<T>(quality));
       if (is_draft)
         sampler = &draft_motion.emplace(*src, params, motion, width);
       else if (count > 2 && is_complex_motion(list, shutter))
-        sampler = &complex_motion.emplace(sample_functions<T>(quality), params, list, bounds, scratch);
+        sampler = &complex_motion.emplace(functions, params, list, bounds, scratch);
+      else if (AreaMotionRow<T>::suits(functions, params, motion))
+        sampler = &area_motion.emplace(functions, params, motion, width, scratch);
       else
-        sampler = &best_motion.emplace(sample_functions<T>(quality), params, motion, width, scratch);
+        sampler = &best_motion.emplace(functions, params, motion, width, scratch);
     }
 
     // Around the layer the source counts as clear, and these modes clear under a clear source.
