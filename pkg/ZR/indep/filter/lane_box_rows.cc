@@ -127,7 +127,14 @@ struct LookAhead {
 };
 
 // How the means of a run are found.
-enum class Means { plain, edged, short_quotients };
+enum class Means { plain, edged, short_quotients, rounded };
+
+// 16-bit sums of few pixels are whole numbers of less than 2^23. Their means, by an odd number, are n / divisor to the
+// nearest: no n lies closer to the middle between two of them than 1 / (2 * divisor), which is more than what n times
+// the rounded reciprocal is off. Added to 2^23 the product is rounded once, and ends up in the low bits.
+HWY_INLINE bool rounded_means_serve(const BoxWeights<ZR_Pixel16>& w) {
+  return w.divisor <= 127 && static_cast<i32>(w.divisor) % 2 == 1;
+}
 
 // Some vectors of channels, from channel c on: their sums stay in registers.
 template <class T, bool straight, Means means, i32 vectors>
@@ -142,6 +149,25 @@ HWY_INLINE void run_block(const BoxRun<T>& run, i32 c) {
   const i32 pixel = c / 4;
   const T *leaving = run.leaving + pixel, *first = run.first + pixel, *entering = run.entering + pixel;
   T* out = run.out + pixel;
+  if constexpr (means == Means::rounded) {
+    Ints whole[vectors];
+    for (i32 v = 0; v < vectors; ++v) whole[v] = fitting_int(hn::LoadU(Tag<f32>(), all + v * lane_count()));
+    const Floats reciprocal(1 / run.weights.divisor), ground(0x1p23f);
+    for (i64 k = 0; k < run.count; ++k) {
+      look_ahead(k, entering, out);
+      for (i32 v = 0; v < vectors; ++v) {
+        const i32 i = v * lane_count();
+        whole[v] = whole[v] - channels_at<i32>(leaving, i) + channels_at<i32>(entering, i);
+        const Floats made = hn::MulAdd(to_float(whole[v]).v, reciprocal.v, ground.v);
+        store_low_bits(hn::BitCast(Tag<i32>(), made.v), out, i);
+      }
+      leaving += run.leaving_step;
+      entering += run.entering_step;
+      out += run.out_step;
+    }
+    for (i32 v = 0; v < vectors; ++v) hn::StoreU(to_float(whole[v]).v, Tag<f32>(), all + v * lane_count());
+    return;
+  }
   L sums[vectors];
   for (i32 v = 0; v < vectors; ++v) sums[v] = hn::LoadU(Tag<Number>(), all + v * lane_count());
   for (i64 k = 0; k < run.count; ++k) {
@@ -187,8 +213,10 @@ template <class T, bool straight>
 void run_box(const BoxRun<T>& run) {
   if (run.weights.divisor == 0) return single_box_rows<T>().premultiplied(run);
   if (run.weights.shortfall != 0) return run_form<T, straight, Means::edged>(run);
-  if constexpr (HWY_NATIVE_FMA && std::is_same_v<T, ZR_Pixel16> && !straight)
+  if constexpr (HWY_NATIVE_FMA && std::is_same_v<T, ZR_Pixel16> && !straight) {
+    if (rounded_means_serve(run.weights)) return run_form<T, straight, Means::rounded>(run);
     if (ShortQuotient::serves(run.weights.divisor)) return run_form<T, straight, Means::short_quotients>(run);
+  }
   run_form<T, straight, Means::plain>(run);
 }
 

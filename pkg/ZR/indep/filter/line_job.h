@@ -169,8 +169,8 @@ void write_strip(const LineJob<T>& job, i64 dst_line, i32 lines, i32 width, T* c
   }
   for (i64 low = job.dst_low; low < job.dst_high; low += chunk_positions) {
     const i64 high = std::min(low + chunk_positions, job.dst_high);
-    if (!job.dst.vertical) {
-      // Lines of the destination, on their way while the chunk is made.
+    if (!job.dst.vertical && sizeof(T) < 16) {
+      // Lines of the destination, on their way while the chunk is made; of floats they are too many.
       const i64 bytes = (high - low) * static_cast<i64>(sizeof(T));
       for (i32 l = 0; l < lines; ++l) {
         const char* const line = reinterpret_cast<const char*>(job.dst.at(low - job.dst_low, dst_line + l));
