@@ -92,6 +92,8 @@ class BoxPass {
       const i64 end = alike_until(low, high);
       run_.count = end - low;
       place(low - box_.reach - 1, &run_.leaving, &run_.leaving_step);
+      run_.leaves = in_.has(low - box_.reach - 1);
+      run_.enters = in_.has(low + box_.reach);
       place(low - box_.reach, &run_.first, &run_.first_step);
       place(low + box_.reach, &run_.entering, &run_.entering_step);
       run_.out = out;

@@ -39,6 +39,7 @@ struct BoxRun {
   i64 count;
   const T *leaving, *first, *entering;
   i64 leaving_step, first_step, entering_step;
+  bool leaves, enters;  // false where only zeros do
   T* out;
   i64 out_step;
   void* sums;  // four for each pixel: BoxSum<T>, or f64 for the alpha of floats
