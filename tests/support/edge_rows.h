@@ -17,20 +17,21 @@
 // n pixels between two pages that cannot be touched, at either of them.
 class EdgeRow {
  public:
-  EdgeRow() : page_(static_cast<std::size_t>(sysconf(_SC_PAGESIZE))) {
-    block_ = static_cast<char*>(mmap(nullptr, 4 * page_, PROT_NONE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0));
-    if (mprotect(block_ + page_, 2 * page_, PROT_READ | PROT_WRITE) != 0) std::abort();
+  explicit EdgeRow(std::size_t pages = 2) : page_(static_cast<std::size_t>(sysconf(_SC_PAGESIZE))), pages_(pages) {
+    block_ = static_cast<char*>(mmap(nullptr, (pages_ + 2) * page_, PROT_NONE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0));
+    if (mprotect(block_ + page_, pages_ * page_, PROT_READ | PROT_WRITE) != 0) std::abort();
   }
   EdgeRow(const EdgeRow&) = delete;
   EdgeRow& operator=(const EdgeRow&) = delete;
-  ~EdgeRow() { munmap(block_, 4 * page_); }
+  ~EdgeRow() { munmap(block_, (pages_ + 2) * page_); }
   template <class T>
   T* at(i32 n, bool at_end) {
-    return reinterpret_cast<T*>(at_end ? block_ + 3 * page_ - static_cast<std::size_t>(n) * sizeof(T) : block_ + page_);
+    return reinterpret_cast<T*>(at_end ? block_ + (pages_ + 1) * page_ - static_cast<std::size_t>(n) * sizeof(T)
+                                       : block_ + page_);
   }
 
  private:
-  std::size_t page_;
+  std::size_t page_, pages_;
   char* block_;
 };
 
