@@ -17,14 +17,15 @@ thread_local int live_news = 0;
 
 }  // namespace
 
-void* operator new(std::size_t bytes) {
+// Not inlined: the compiler would take a new that ends in free for a mistake.
+[[gnu::noinline]] void* operator new(std::size_t bytes) {
   if (failing_new > 0 && --failing_new == 0) throw std::bad_alloc();
   void* const block = std::malloc(bytes != 0 ? bytes : 1);
   if (block == nullptr) throw std::bad_alloc();
   ++live_news;
   return block;
 }
-void operator delete(void* block) noexcept {
+[[gnu::noinline]] void operator delete(void* block) noexcept {
   if (block != nullptr) --live_news;
   std::free(block);
 }
