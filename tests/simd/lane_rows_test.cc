@@ -5,6 +5,7 @@
 #include <vector>
 
 #include "composite/blend_rows.h"
+#include "composite/composite_rect.h"
 #include "composite/depth_convert_rows.h"
 #include "composite/ground_rows.h"
 #include "composite/linear_rows.h"
@@ -268,6 +269,16 @@ TEST_F(LaneRows8, Mattes) {
     compare("matte added", [&](i32 n, P*, P*, P* d) { zr::matte_rows(place).add_matte(n, matte, d); });
     compare("matte taken", [&](i32 n, P*, P*, P* d) { zr::matte_rows(place).take_matte(n, matte, d); });
   }
+}
+
+TEST_F(LaneRows8, Behind) {
+  using P = ZR_Pixel8;
+  for (const u8 opacity : {u8{255}, u8{101}, u8{1}})
+    for (zr::CompositeBehindRowFunc* const row : {zr::composite_behind_row_straight, zr::composite_behind_row_premul}) {
+      compare("behind", [&](i32 n, P* s, P*, P* d) { row(n, opacity, s, d); });
+      compare("behind itself", [&](i32 n, P*, P*, P* d) { row(n, opacity, d, d); });
+      compare("behind what it reads next", [&](i32 n, P*, P*, P* d) { row(n - 1, opacity, d, d + 1); });
+    }
 }
 
 TEST_F(LaneRows8, Planes) {

@@ -1,4 +1,4 @@
-// Rows and rectangles of the 8-bit composite behind.
+// Rectangles of the 8-bit composite behind.
 #include "composite/composite_rect.h"
 
 #include <ZR/errors.h>
@@ -9,8 +9,6 @@ namespace zr {
 namespace {
 
 using D = Depth<ZR_Pixel8>;
-
-u8 multiply(i32 a, i32 b) { return static_cast<u8>(D::mul(a, b)); }
 
 i32 composite_rect(const ZR_ProgressInfo* progress, const GX_LRect* rect, u8 opacity, ZR_LayerDef* src, i32 dest_x,
                    i32 dest_y, i32 field, ZR_LayerDef* dst, CompositeBehindRowFunc* row) {
@@ -42,37 +40,6 @@ i32 composite_rect(const ZR_ProgressInfo* progress, const GX_LRect* rect, u8 opa
 }
 
 }  // namespace
-
-void composite_behind_row_straight(i32 n, u8 opacity, const ZR_Pixel8* src, ZR_Pixel8* dst) {
-  // Weights are in 1/65025 of a pixel; their sum times a channel stays below 2^32.
-  constexpr u32 full = static_cast<u32>(D::white * D::white);
-  const u32 o = opacity;
-  for (i32 i = 0; i < n; ++i) {
-    const ZR_Pixel8 s = src[i], d = dst[i];
-    if (d.alpha == D::white) continue;
-    if (d.alpha == 0) {
-      dst[i] = {multiply(opacity, s.alpha), s.red, s.green, s.blue};
-      continue;
-    }
-    const u32 w = (static_cast<u32>(D::white) * o - o * d.alpha) * s.alpha;
-    const u32 k = d.alpha * full;
-    const auto mix = [&](u32 source, u32 below) { return static_cast<u8>((source * w + below * k) / (k + w)); };
-    dst[i] = {static_cast<u8>((k + w) / full), mix(s.red, d.red), mix(s.green, d.green), mix(s.blue, d.blue)};
-  }
-}
-
-void composite_behind_row_premul(i32 n, u8 opacity, const ZR_Pixel8* src, ZR_Pixel8* dst) {
-  for (i32 i = 0; i < n; ++i) {
-    const ZR_Pixel8 s = src[i], d = dst[i];
-    const i32 room = D::inv(d.alpha);
-    // Under a clear pixel the source replaces whatever colour stood. Colours above their alpha may wrap.
-    const i32 kept = d.alpha == 0 ? 0 : 1;
-    const auto add = [&](i32 below, i32 source) {
-      return static_cast<u8>(below * kept + multiply(room, multiply(opacity, source)));
-    };
-    dst[i] = {add(d.alpha, s.alpha), add(d.red, s.red), add(d.green, s.green), add(d.blue, s.blue)};
-  }
-}
 
 i32 composite_rect_straight(const ZR_ProgressInfo* progress, const GX_LRect* rect, u8 opacity, ZR_LayerDef* src,
                             i32 dest_x, i32 dest_y, i32 field, u32 /*flags*/, ZR_LayerDef* dst) {

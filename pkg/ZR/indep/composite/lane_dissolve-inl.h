@@ -58,8 +58,8 @@ i32 dissolve_row(i32 n, const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingT
   u32 seed = static_cast<u32>(mode->seed);
   each_block<Apart>(n, src, mask, dst, [&](const T* from, const T* cover, T* to, i32 count) HWY_ATTR {
     const Px<M> s = Apart::load<M>(from);
-    const Wide A = cover != nullptr ? M::covered(s.alpha, opacity, Apart::load<M>(cover).alpha)
-                                    : M::mul(s.alpha, opacity);
+    const Wide A =
+        cover != nullptr ? M::covered(s.alpha, opacity, Apart::load<M>(cover).alpha) : M::mul(s.alpha, opacity);
     const auto whole = A >= M::white, partial = A > 0 && A < M::white;
     auto wins = whole;
     if (none(partial))
