@@ -122,15 +122,16 @@ class BoxCopy {
   HWY_INLINE bool write() {
     // Columns are located for many pixels; of those a few rows at a time are written, from left to right.
     const i32 located = std::min(most_located / taps_, box_pixels),
-              stretch = ((box_columns - taps_ - lane_count()) << 16) / part_.step_x;
+              stretch = ((box_columns - taps_ - lane_count()) << 16) / part_.step_x / pixels * pixels;
     for (i32 at = 0; at < part_.columns; at += located) {
       const i32 first = std::max(std::min(at, part_.columns - located), 0),
                 end = std::min(first + located, part_.columns);
       locate(first, end);
       for (i32 j = 0; j < part_.rows; j += together)
         for (i32 i = 0; i < end - first; i += stretch) {
-          const i32 count = std::min(stretch, end - first);  // the last one overlaps the one before
-          if (!write_block(first, std::min(i, end - first - count), count, j, std::min(j + together, part_.rows)))
+          // From a whole vector on; one that would be short overlaps the one before.
+          const i32 begin = std::min(i, (end - first) / pixels * pixels - pixels);
+          if (!write_block(first, begin, std::min(stretch, end - first - begin), j, std::min(j + together, part_.rows)))
             return false;
         }
     }
@@ -144,17 +145,30 @@ class BoxCopy {
     i32 x = part_.x + first * part_.step_x - params_.x_radius + half_a_pixel;
     for (i32 i = 0; i < end - first; ++i, x += part_.step_x) {
       const i32 column = x >> 16, last = (x + length) >> 16, behind = (x + length) & 0xffff;
-      Number* const w = weights_ + i * taps_;
-      for (i32 k = 0; k < taps_; ++k) w[k] = column + k < last ? Number{1} : Number{0};
-      w[last - column] = static_cast<Number>(behind) * Number{0x1p-16f};
-      w[0] = static_cast<Number>(0x10000 - (x & 0xffff)) * Number{0x1p-16f};
       starts_[i] = column;
+      for (i32 k = 0; k < taps_; ++k) {
+        const i32 covered = k == 0               ? 0x10000 - (x & 0xffff)
+                            : column + k < last  ? 0x10000
+                            : column + k == last ? behind
+                                                 : 0;
+        std::fill_n(weights_ + place_of(i, k), weight_copies, static_cast<Number>(covered) * Number{0x1p-16f});
+      }
     }
+    for (i32 i = end - first; i % pixels != 0; ++i) {  // to a whole vector
+      starts_[i] = starts_[i - 1];
+      for (i32 k = 0; k < taps_; ++k) std::fill_n(weights_ + place_of(i, k), weight_copies, Number{0});
+    }
+  }
+  // Weights for a vector of pixels lie side by side, one for each of their channels, where such a vector is one read.
+  static constexpr bool vectors_across = std::is_same_v<Real, Floats>;
+  static constexpr i32 weight_copies = vectors_across ? 4 : 1;
+  i32 place_of(i32 i, i32 tap) const {
+    return vectors_across ? ((i / pixels * taps_ + tap) * pixels + i % pixels) * 4 : i * taps_ + tap;
   }
 
   HWY_INLINE bool write_block(i32 located, i32 i, i32 count, i32 j, i32 end) {
     first_ = located + i, count_ = count;
-    starts_at_ = starts_ + i, weights_at_ = weights_ + i * taps_;
+    starts_at_ = starts_ + i, weights_at_ = weights_ + i * taps_ * weight_copies;
     // Whole vectors of columns, further to the left where the source ends. Those behind are weighted by nothing, but
     // read.
     const i32 width = params_.src->width, last = starts_at_[count - 1];
@@ -180,13 +194,13 @@ class BoxCopy {
     const BoxRows above(part_.y + j * part_.step_y, params_.y_radius, rows);
     const BoxRows below(part_.y + (end - 1) * part_.step_y, params_.y_radius, rows);
     const i32 first = above.top >= 0 ? above.top : above.first, last = below.bottom >= 0 ? below.bottom + 1 : below.end;
-    Alphas all = Alphas::any;
-    for (i32 y = first; y < last; ++y) {
-      const T* const row = row_at(y);
-      const Alphas alphas = alphas_of(row, columns_);
-      if (std::is_same_v<T, ZR_Pixel16> && !legal_channels(row)) return Alphas::illegal;
-      all = y == first || alphas == all ? alphas : Alphas::any;
-    }
+    if (std::is_same_v<T, ZR_Pixel16>)
+      for (i32 y = first; y < last; ++y)
+        if (!legal_channels(row_at(y))) return Alphas::illegal;
+    if (first >= last) return Alphas::any;
+    const Alphas all = alphas_of(row_at(first), columns_);
+    for (i32 y = first + 1; y < last && all != Alphas::any; ++y)
+      if (alphas_of(row_at(y), columns_) != all) return Alphas::any;
     return all;
   }
   HWY_INLINE bool legal_channels(const T* row) const {
@@ -275,21 +289,33 @@ class BoxCopy {
   }
   template <i32 known>
   HWY_INLINE void sum_boxes_of() {
-    const hn::CappedTag<Number, 4> d;
-    constexpr i32 lanes = static_cast<i32>(hn::MaxLanes(d));
-    const i32 taps = known != 0 ? known : taps_, count = count_;
+    const i32 taps = known != 0 ? known : taps_, count = count_, left = left_;
     const Number* w = weights_at_;
     const i32* const starts = starts_at_;
     const Number* const sums = sums_;
-    const i32 left = left_;
     Number* to = totals_;
-    for (i32 i = 0; i < count; ++i, w += taps, to += 4) {
-      for (i32 c = 0; c < 4; c += lanes) {
-        const Number* const from = sums + 4 * (starts[i] - left) + c;
-        auto sum = hn::Mul(hn::LoadU(d, from), hn::Set(d, w[0]));
-        for (i32 k = 1; k < taps; ++k) sum = hn::MulAdd(hn::LoadU(d, from + 4 * k), hn::Set(d, w[k]), sum);
-        hn::StoreU(sum, d, to + c);
+    if constexpr (vectors_across) {
+      const Tag<i32> d;
+      for (i32 i = 0; i < count; i += pixels, w += 4 * pixels * taps, to += 4 * pixels) {
+        i64 offsets[pixels];
+        for (i32 k = 0; k < pixels; ++k) offsets[k] = i64{starts[i + k] - left} * 16;
+        const auto column = [&](i32 k) HWY_ATTR {
+          return as_floats(load_pixels(d, reinterpret_cast<const char*>(sums + 4 * k), offsets));
+        };
+        Floats sum = column(0) * load_numbers(w);
+        for (i32 k = 1; k < taps; ++k) sum = mul_add(column(k), load_numbers(w + 4 * pixels * k), sum);
+        store_numbers(sum, to);
       }
+    } else {
+      const hn::CappedTag<Number, 4> d;
+      constexpr i32 lanes = static_cast<i32>(hn::MaxLanes(d));
+      for (i32 i = 0; i < count; ++i, w += taps, to += 4)
+        for (i32 c = 0; c < 4; c += lanes) {
+          const Number* const from = sums + 4 * (starts[i] - left) + c;
+          auto sum = hn::Mul(hn::LoadU(d, from), hn::Set(d, w[0]));
+          for (i32 k = 1; k < taps; ++k) sum = hn::MulAdd(hn::LoadU(d, from + 4 * k), hn::Set(d, w[k]), sum);
+          hn::StoreU(sum, d, to + c);
+        }
     }
   }
 
@@ -338,9 +364,9 @@ class BoxCopy {
   const i32* starts_at_ = nullptr;
   const Number* weights_at_ = nullptr;
   i32 carried_ = -1;  // what carry_ holds is of this row of the source
-  i32 starts_[box_pixels];
-  alignas(64) Number weights_[most_located];
-  alignas(64) Number carry_[4 * box_columns], sums_[4 * (box_columns + most_taps)], totals_[4 * box_columns];
+  i32 starts_[box_pixels + pixels];
+  alignas(64) Number weights_[(most_located + pixels * most_taps) * weight_copies];
+  alignas(64) Number carry_[4 * box_columns], sums_[4 * (box_columns + most_taps)], totals_[4 * (box_columns + pixels)];
 };
 
 template <class T>
