@@ -59,24 +59,53 @@ HWY_INLINE void put(QuadV v, ZR_PixelFloat* out) {
 // the bits of the sum, as a whole number; one rounding takes 2^52 away again and multiplies.
 constexpr f64 whole_base = 0x1p52;
 
-// What sums of some columns of `rows` rows are multiplied by.
-template <i32 rows>
-struct Inverses {
-  static constexpr i32 block = 16;  // few, so that divisions run beside the sums of the block before
-  alignas(64) f64 of[rows][block], bases[rows][block];  // and those times whole_base
+// What sums of a few columns of four rows are multiplied by, in a ring: those of four columns are divided while columns
+// before them are summed, as divisions take long but keep little else from running.
+class Inverses {
+ public:
+  static constexpr i32 together = 4;
 
-  HWY_INLINE void fill(i32 first, i32 y) {
-    const Quad d;
-    constexpr i32 lanes = 4;
-    for (i32 r = 0; r < rows; ++r)
-      for (i32 k = 0; k < block; k += lanes) {
-        const QuadV columns = hn::Iota(d, first + k + 1.0);
-        const QuadV inverse = hn::Div(hn::Set(d, 1.0), hn::Mul(columns, hn::Set(d, y + r + 1.0)));
-        hn::Store(inverse, d, of[r] + k);
-        hn::Store(hn::Mul(inverse, hn::Set(d, whole_base)), d, bases[r] + k);
-      }
+  explicit HWY_INLINE Inverses(i32 y)
+      : below_(hn::Add(hn::Iota(Quad(), 1.0), hn::Set(Quad(), static_cast<f64>(y)))), column_(hn::Set(Quad(), 1.0)) {
+    for (i32 x = 0; x < ahead; x += together) divide(x);
   }
+  // Those of columns x, a multiple of four, to x + 3: four numbers a column, and behind `bases` whole_base times them.
+  HWY_INLINE const f64* next(i32 x) {
+    divide((x + ahead) % size);
+    return numbers_ + x % size * 4;
+  }
+  static constexpr i32 bases = 64;
+
+ private:
+  static constexpr i32 ahead = 8, size = 2 * ahead;
+
+  HWY_INLINE void divide(i32 place) {
+    const Quad d;
+    for (i32 k = 0; k < together; ++k, column_ = hn::Add(column_, hn::Set(d, 1.0))) {
+      const QuadV inverse = hn::Div(hn::Set(d, 1.0), hn::Mul(below_, column_));
+      f64* const at = numbers_ + (place + k) * 4;
+      hn::Store(inverse, d, at);
+      hn::Store(hn::Mul(inverse, hn::Set(d, whole_base)), d, at + bases);
+    }
+  }
+  static_assert(bases == size * 4);
+  alignas(64) f64 numbers_[2 * bases];
+  QuadV below_, column_;
 };
+
+// Calls sum(x, inverses, whether x is a multiple of four) for every column of a row.
+template <class Sum>
+HWY_INLINE void each_column(i32 width, i32 y, Sum sum) {
+  constexpr i32 together = Inverses::together;
+  Inverses inverses(y);
+  i32 x = 0;
+  for (; width - x >= together; x += together) {
+    const f64* const of = inverses.next(x);
+    for (i32 k = 0; k < together; ++k) sum(x + k, of + 4 * k, k == 0);
+  }
+  const f64* of = inverses.next(x);
+  for (; x < width; ++x, of += 4) sum(x, of, false);
+}
 
 template <class T>
 HWY_INLINE const T* row_at(const ZR_World& world, i32 y) {
@@ -89,7 +118,6 @@ template <i32 rows, class T, class Entry>
 HWY_INLINE void sum_rows(const ZR_World& world, i32 y, const f64* parts, f64* above, Entry* table) {
   const Quad d;
   const i32 width = world.width;
-  Inverses<rows> inverse;
   const T* src[rows];
   Entry* out[rows];
   QuadV left[rows], corner[rows];
@@ -98,21 +126,17 @@ HWY_INLINE void sum_rows(const ZR_World& world, i32 y, const f64* parts, f64* ab
     out[r] = table + static_cast<std::ptrdiff_t>(y + r) * width;
     left[r] = corner[r] = hn::Zero(d);
   }
-  for (i32 first = 0; first < width; first += inverse.block) {
-    const i32 end = std::min(first + inverse.block, width);
-    inverse.fill(first, y);
-    for (i32 x = first; x < end; ++x) {
-      f64* const cell = above + static_cast<std::size_t>(x) * 4;
-      QuadV upper = hn::LoadU(d, cell);
-      for (i32 r = 0; r < rows; ++r) {
-        const QuadV sum = hn::Sub(hn::Add(hn::Add(premultiplied(src[r] + x, parts), left[r]), upper), corner[r]);
-        corner[r] = upper;
-        upper = left[r] = sum;
-        put(hn::Mul(hn::Set(d, inverse.of[r][x - first]), sum), out[r] + x);
-      }
-      hn::StoreU(upper, d, cell);
+  each_column(width, y, [&](i32 x, const f64* inverses, bool) HWY_ATTR {
+    f64* const cell = above + static_cast<std::size_t>(x) * 4;
+    QuadV upper = hn::LoadU(d, cell);
+    for (i32 r = 0; r < rows; ++r) {
+      const QuadV sum = hn::Sub(hn::Add(hn::Add(premultiplied(src[r] + x, parts), left[r]), upper), corner[r]);
+      corner[r] = upper;
+      upper = left[r] = sum;
+      put(hn::Mul(hn::Set(d, inverses[r]), sum), out[r] + x);
     }
-  }
+    hn::StoreU(upper, d, cell);
+  });
 }
 
 // Asks for what is written a little later: four streams are more than processors follow. Nothing is touched.
@@ -127,7 +151,6 @@ HWY_INLINE void sum_opaque_rows(const ZR_World& world, i32 y, f64* above, Entry*
   const hn::FixedTag<u64, 4> whole;
   const QuadV base = hn::Set(d, whole_base);
   const i32 width = world.width;
-  Inverses<rows> inverse;
   const ZR_Pixel8* src[rows];
   Entry* out[rows];
   hn::Vec<decltype(whole)> row[rows];
@@ -136,24 +159,20 @@ HWY_INLINE void sum_opaque_rows(const ZR_World& world, i32 y, f64* above, Entry*
     out[r] = table + static_cast<std::ptrdiff_t>(y + r) * width;
     row[r] = hn::Zero(whole);
   }
-  for (i32 first = 0; first < width; first += inverse.block) {
-    const i32 end = std::min(first + inverse.block, width);
-    inverse.fill(first, y);
-    for (i32 x = first; x < end; ++x) {
-      f64* const cell = above + static_cast<std::size_t>(x) * 4;
-      auto sum = hn::BitCast(whole, hn::Add(hn::LoadU(d, cell), base));
-      for (i32 r = 0; r < rows; ++r) {
-        i32 word;
-        std::memcpy(&word, src[r] + x, sizeof word);
-        row[r] = hn::Add(row[r], hn::Vec<decltype(whole)>{_mm256_cvtepu8_epi64(_mm_cvtsi32_si128(word))});
-        sum = hn::Add(sum, row[r]);
-        const QuadV factor = hn::Set(d, inverse.of[r][x - first]), less = hn::Set(d, inverse.bases[r][x - first]);
-        put(hn::MulSub(hn::BitCast(d, sum), factor, less), out[r] + x);
-        if (x % 4 == 0) write_ahead(out[r] + x);
-      }
-      hn::StoreU(hn::Sub(hn::BitCast(d, sum), base), d, cell);
+  each_column(width, y, [&](i32 x, const f64* inverses, bool begins_line) HWY_ATTR {
+    f64* const cell = above + static_cast<std::size_t>(x) * 4;
+    auto sum = hn::BitCast(whole, hn::Add(hn::LoadU(d, cell), base));
+    for (i32 r = 0; r < rows; ++r) {
+      i32 word;
+      std::memcpy(&word, src[r] + x, sizeof word);
+      row[r] = hn::Add(row[r], hn::Vec<decltype(whole)>{_mm256_cvtepu8_epi64(_mm_cvtsi32_si128(word))});
+      sum = hn::Add(sum, row[r]);
+      put(hn::MulSub(hn::BitCast(d, sum), hn::Set(d, inverses[r]), hn::Set(d, inverses[r + Inverses::bases])),
+          out[r] + x);
+      if (begins_line) write_ahead(out[r] + x);
     }
-  }
+    hn::StoreU(hn::Sub(hn::BitCast(d, sum), base), d, cell);
+  });
 }
 
 HWY_INLINE bool is_opaque(const ZR_Pixel8* row, i32 n) {
