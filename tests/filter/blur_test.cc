@@ -111,27 +111,30 @@ TYPED_TEST(Blurs, EqualTheModelOnLargerWorlds) {
 // that are reached in the middle of a line only.
 using DeepBlurs = Blurs<ZR_Pixel16>;
 TEST_F(DeepBlurs, LevelsNearTheEndOfExactSums) {
-  const u16 levels[][2] = {{0, 32768}, {41600, 41800}, {65400, 65535}, {0, 65535}};
+  struct Levels {
+    u16 low, high;
+  };
+  const Levels ranges[] = {{0, 32768}, {41600, 41800}, {65400, 65535}, {0, 65535}};
   for (int level = 0; level < 4 && Instructions::has(level); ++level) {
     const Instructions instructions(level);
     for (const f32 radius : {63.0f, 64.0f, 100.0f, 127.0f, 128.0f, 130.0f, 200.5f})
-      for (const auto& [low, high] : levels)
+      for (const Levels& range : ranges)
         for (const u32 form : {0u, 1u, 2u}) {
           const bool down = form == 1;
           TestWorld<ZR_Pixel16> src(down ? 11 : 700, down ? 700 : 11), made(src.width(), src.height()),
               expected(src.width(), src.height());
           std::mt19937 random(4);
-          const auto channel = [&](u32 from) { return static_cast<u16>(from + random() % (high - from + 1u)); };
+          const auto channel = [&](u32 from) { return static_cast<u16>(from + random() % (range.high - from + 1u)); };
           for (i32 y = 0; y < src.height(); ++y)
             for (i32 x = 0; x < src.width(); ++x) {
-              const u32 from = std::max(x, y) > 250 ? low : 0;
-              src.at(x, y) = {channel(from), channel(from), high, channel(0)};
+              const u32 from = std::max(x, y) > 250 ? range.low : 0;
+              src.at(x, y) = {channel(from), channel(from), range.high, channel(0)};
             }
           const BlurCase c = {radius, 1, form == 2 ? 31u : 15u, down, true, down, true, false};
           ZR_WorldX<ZR_Pixel16> a(src.layer(), false), b(made.layer(), false);
           ASSERT_EQ(blur(nullptr, a, c, b), 0);
           model_blur(src, {0, 0}, c, {0, 0}, expected);
-          ASSERT_TRUE(made == expected) << Instructions::names[level] << " " << told(c) << " to " << high
+          ASSERT_TRUE(made == expected) << Instructions::names[level] << " " << told(c) << " to " << range.high
                                         << first_difference(made, expected);
         }
   }

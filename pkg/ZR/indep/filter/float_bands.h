@@ -53,8 +53,8 @@ struct FloatBand {
   const f32* weights;  // four for each product
   bool has_zeros;
   i32 strip;  // pixels
-  i64 sums_place,
-      product_place;  // pixels from one product of a group to the next, of half a strip where there are halves
+  // Pixels from one product of a group, or from one row of sums, to the next; of half a strip where there are halves.
+  i64 product_place, sums_place;
   f32 divisors[4];
   f64 *products, *sums;
   f32* padded;  // a source row of the strip, with clear pixels outside of the source

@@ -182,17 +182,17 @@ struct BandLanes {
 
   // ------------------------------------------------------------------------------ exact sums
   using Single = Tag<f32>;
-  using Floats16 = hn::Vec<Single>;
-  static constexpr i32 singles = lane_count(), single_vectors = 8;
+  using Numbers = hn::Vec<Single>;
+  static constexpr i32 singles = lane_count(), single_vectors = lanes == 8 ? 8 : 4;
   static constexpr i32 block_pixels = singles * single_vectors / 4;
   static_assert(float_strip_step % block_pixels == 0);
 
   // What samples that are multiples of their bound's quantum leave at 0.
   struct Rests {
-    Floats16 magic, most, rests;
+    Numbers magic, most, rests;
     HWY_INLINE explicit Rests(f32 quantum)
         : magic(hn::Set(Single(), 0x1.8p23f * quantum)), most(hn::Zero(Single())), rests(hn::Zero(Single())) {}
-    HWY_INLINE void look(Floats16 v) {
+    HWY_INLINE void look(Numbers v) {
       most = hn::Max(most, hn::Abs(v));
       rests = hn::Or(rests, hn::Sub(hn::Sub(hn::Add(v, magic), magic), v));
     }
@@ -260,9 +260,9 @@ struct BandLanes {
       }
     return count;
   }
-  HWY_INLINE void carry_block(const Target& to, i64 c, const Floats16* upper, const Floats16* lower) const {
+  HWY_INLINE void carry_block(const Target& to, i64 c, const Numbers* upper, const Numbers* lower) const {
     const Single d;
-    Floats16 sums[2 * single_vectors];
+    Numbers sums[2 * single_vectors];
     for (i32 i = 0; i < single_vectors; ++i) {
       // From 0 on, for -0 alone is 0 as a sum.
       const i64 at = c + i * singles;
@@ -329,7 +329,7 @@ struct BandLanes {
       for (i32 i = 0; i < target_count;) {
         const i32 kind = targets[i].kind;
         const f32* w = exact.weights + 4 * kind * exact.terms;
-        Floats16 high[single_vectors], low[single_vectors];
+        Numbers high[single_vectors], low[single_vectors];
         for (i32 j = 0; j < single_vectors; ++j) high[j] = low[j] = hn::Zero(d);
         const auto add_term = [&](const f32* from_upper, const f32* from_lower) HWY_ATTR {
           const auto weight = hn::LoadDup128(d, w);
