@@ -79,26 +79,6 @@ TYPED_TEST(Fills, ClearingFullRowsWithoutPaddingReachesTheWorldsEnd) {
   for (i32 i = 0; i < 40; ++i) EXPECT_EQ(pixels[static_cast<size_t>(i)].alpha, i >= 10 && i < 20 ? 0 : 1) << i;
 }
 
-TYPED_TEST(Fills, AlphaIsFilledAndInvertedAlone) {
-  using T = TypeParam;
-  const auto white = static_cast<zr::Channel<T>>(zr::Depth<T>::white);
-  this->check([](TestWorld<T>&, ZR_World* world) { world->FillAlpha(); },
-              [&](i32, i32, T before) {
-                return T{white, before.red, before.green, before.blue};
-              },
-              {});
-  this->check([](TestWorld<T>&, ZR_World* world) { world->InvertAlpha(); },
-              [&](i32, i32, T p) {
-                return T{static_cast<zr::Channel<T>>(white - p.alpha), p.red, p.green, p.blue};
-              },
-              {});
-  if constexpr (std::is_same_v<T, ZR_Pixel16>) {
-    ZR_Pixel16 pixel = {32769, 0, 0, 0};
-    ZR_WorldX<T>(&pixel, 1, 1, 8).InvertAlpha();
-    EXPECT_EQ(pixel.alpha, 65535) << "16-bit arithmetic";
-  }
-}
-
 TYPED_TEST(Fills, PremultiplyingGoesThroughTheExportsAndIsRefusedOnFloats) {
   using T = TypeParam;
   TestWorld<T> world(9, 7), by_export(9, 7);
