@@ -11,54 +11,6 @@ constexpr i32 one = 65536;
 
 class PixelMeasures : public BornLibrary {};
 
-TEST_F(PixelMeasures, OfKnownColours) {
-  const struct {
-    ZR_Pixel8 pixel;
-    i32 hls[3];
-    i32 luminance, hue, lightness, saturation;
-  } colours[] = {
-      {{255, 255, 0, 0}, {0, one / 2, one}, 7650, 0, 127, 255},
-      {{9, 0, 255, 0}, {120 * one, one / 2, one}, 15045, 85, 127, 255},
-      {{0, 0, 0, 255}, {240 * one, one / 2, one}, 2805, 170, 127, 255},
-      {{0, 255, 0, 1}, {23577540, one / 2, one}, 7661, 255, 127, 255},  // a hair below 360 degrees
-      {{0, 255, 255, 255}, {0, one, 0}, 25500, 0, 255, 0},
-      {{0, 77, 77, 77}, {0, 19789, 0}, 7700, 0, 77, 0},
-      {{0, 0, 0, 0}, {0, 0, 0}, 0, 0, 0, 0},
-      {{0, 255, 200, 200}, {0, 58468, one}, 21650, 0, 227, 11},
-  };
-  for (const auto& c : colours) {
-    i32 hls[3], luminance, hue, lightness, saturation;
-    EXPECT_EQ(ZR_RGBtoHLS_Straight(nullptr, &c.pixel, hls), 0);
-    EXPECT_NEAR(hls[0], c.hls[0], 1);
-    EXPECT_EQ(hls[1], c.hls[1]);
-    EXPECT_EQ(hls[2], c.hls[2]);
-    EXPECT_EQ(ZR_Luminance_Straight(nullptr, &c.pixel, &luminance), 0);
-    EXPECT_EQ(ZR_Hue_Straight(nullptr, &c.pixel, &hue), 0);
-    EXPECT_EQ(ZR_Lightness_Straight(nullptr, &c.pixel, &lightness), 0);
-    EXPECT_EQ(ZR_Saturation_Straight(nullptr, &c.pixel, &saturation), 0);
-    EXPECT_EQ(luminance, c.luminance);
-    EXPECT_EQ(hue, c.hue);
-    EXPECT_EQ(lightness, c.lightness);
-    EXPECT_EQ(saturation, c.saturation);
-  }
-  const ZR_Pixel16 white = {0, 32768, 32768, 32768}, violet = {0, 16384, 0, 32768};
-  i32 number;
-  ZR_Luminance_Straight16(nullptr, &white, &number);
-  EXPECT_EQ(number, 3276800);
-  ZR_Hue_Straight16(nullptr, &violet, &number);
-  EXPECT_EQ(number, 191) << "270 degrees, a byte at 16 bits too";
-  ZR_Saturation_Straight16(nullptr, &violet, &number);
-  EXPECT_EQ(number, 32768);
-  const ZR_PixelFloat olive = {0, 0.5f, 0.5f, 0};
-  f32 real;
-  ZR_Hue_StraightFloat(nullptr, &olive, &real);
-  EXPECT_EQ(real, 60.0f / 360.0f);
-  ZR_Saturation_StraightFloat(nullptr, &olive, &real);
-  EXPECT_EQ(real, 0.25f);
-  ZR_Lightness_StraightFloat(nullptr, &olive, &real);
-  EXPECT_EQ(real, 0.25f);
-}
-
 TEST_F(PixelMeasures, RoundTripsAndSumsOfRoundedTerms) {
   for (u32 seed = 0; seed < 4096; ++seed) {
     const u32 word = seed * 2654435761u;
