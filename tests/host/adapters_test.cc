@@ -4,21 +4,19 @@
 namespace {
 
 struct Seen {
-  int calls = 0;
   const ZR_ProgressInfo* progress;
   i32 quality, field, x, y;
   u32 flags;
   const void *rect, *src, *tables, *mask, *dst, *matrices;
-  ZR_CompositeModePlus mode;
+  bool operator==(const Seen&) const = default;
 } G_seen;
+ZR_CompositeModePlus G_mode;
 
 i32 see_transfer_rect(const ZR_ProgressInfo* progress, i32 quality, u32 flags, i32 field, const GX_LRect* rect,
                       ZR_LayerDef* src, const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables,
                       const ZR_MaskWorld* mask, i32 x, i32 y, ZR_LayerDef* dst) {
-  G_seen.calls++;
-  G_seen.progress = progress, G_seen.quality = quality, G_seen.flags = flags, G_seen.field = field;
-  G_seen.rect = rect, G_seen.src = src, G_seen.mode = *mode, G_seen.tables = tables, G_seen.mask = mask;
-  G_seen.x = x, G_seen.y = y, G_seen.dst = dst;
+  G_seen = {progress, quality, field, x, y, flags, rect, src, tables, mask, dst, nullptr};
+  G_mode = *mode;
   return 4711;
 }
 
@@ -26,19 +24,19 @@ i32 see_transform_world(const ZR_ProgressInfo* progress, i32 quality, u32 flags,
                         const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables,
                         const ZR_MaskWorld* mask, const GX_Matrix3* matrices, i32 count, bool src2dst,
                         const GX_LRect* rect, ZR_LayerDef* dst) {
-  G_seen.calls++;
-  G_seen.progress = progress, G_seen.quality = quality, G_seen.flags = flags, G_seen.field = field;
-  G_seen.rect = rect, G_seen.src = src, G_seen.mode = *mode, G_seen.tables = tables, G_seen.mask = mask;
-  G_seen.matrices = matrices, G_seen.x = count, G_seen.y = src2dst, G_seen.dst = dst;
+  G_seen = {progress, quality, field, count, src2dst, flags, rect, src, tables, mask, dst, matrices};
+  G_mode = *mode;
   return 4712;
 }
 
 class Adapters : public BornLibrary {
  protected:
-  void SetUp() override {
-    BornLibrary::SetUp();
-    G_seen = {};
-    G_seen.tables = &progress;  // anything but null
+  void expect_mode(const ZR_CompositeMode& plain, f32 opacity) {
+    EXPECT_EQ(G_mode.opacity, opacity);
+    EXPECT_EQ(G_mode.keep_alpha, plain.keep_alpha != 0);
+    EXPECT_EQ(G_mode.xfer, plain.xfer);
+    EXPECT_EQ(G_mode.rand_seed, plain.rand_seed);
+    EXPECT_EQ(G_mode.tables, nullptr);
   }
   ZR_ProgressInfo progress{};
   GX_LRect rect{};
@@ -47,50 +45,16 @@ class Adapters : public BornLibrary {
   GX_Matrix3 matrix{};
 };
 
-TEST_F(Adapters, TransferRectGoesThroughItsSlotWithAnExtendedRecord) {
-  const SlotOverride slot(ZR_Slot_transfer_rect, reinterpret_cast<void*>(&see_transfer_rect));
-  for (const u8 keep_alpha : {u8{0}, u8{7}}) {
-    const ZR_CompositeMode mode{9, -5, 128, keep_alpha, 16448};
-    EXPECT_EQ(transfer_rect_adapter(&progress, 1, 6, 2, &rect, &src, &mode, &mask, -3, 8, &dst), 4711);
-    EXPECT_EQ(G_seen.mode.opacity, 16448 / 32768.0f);
-    EXPECT_EQ(G_seen.mode.keep_alpha, keep_alpha != 0);
-    EXPECT_EQ(G_seen.mode.xfer, 9);
-    EXPECT_EQ(G_seen.mode.rand_seed, -5);
-    EXPECT_EQ(G_seen.mode.tables, nullptr);
-    EXPECT_EQ(G_seen.tables, nullptr);
-  }
-  EXPECT_EQ(G_seen.progress, &progress);
-  EXPECT_EQ(G_seen.quality, 1);
-  EXPECT_EQ(G_seen.flags, 6u);
-  EXPECT_EQ(G_seen.field, 2);
-  EXPECT_EQ(G_seen.rect, &rect);
-  EXPECT_EQ(G_seen.src, &src);
-  EXPECT_EQ(G_seen.mask, &mask);
-  EXPECT_EQ(G_seen.x, -3);
-  EXPECT_EQ(G_seen.y, 8);
-  EXPECT_EQ(G_seen.dst, &dst);
-}
-
-TEST_F(Adapters, TransformWorldGoesThroughItsSlot) {
-  const ZR_CompositeMode mode{2, 1, 255, 1, 32768};
-  const SlotOverride slot(ZR_Slot_transform_world, reinterpret_cast<void*>(&see_transform_world));
-  EXPECT_EQ(transform_world_adapter(&progress, 1, 6, 2, &src, &mode, &mask, &matrix, 5, true, &rect, &dst), 4712);
-  EXPECT_EQ(G_seen.calls, 1);
-  EXPECT_EQ(G_seen.progress, &progress);
-  EXPECT_EQ(G_seen.quality, 1);
-  EXPECT_EQ(G_seen.flags, 6u);
-  EXPECT_EQ(G_seen.field, 2);
-  EXPECT_EQ(G_seen.src, &src);
-  EXPECT_EQ(G_seen.mode.xfer, 2);
-  EXPECT_EQ(G_seen.mode.opacity, 1.0f);
-  EXPECT_EQ(G_seen.mode.tables, nullptr);
-  EXPECT_EQ(G_seen.tables, nullptr);
-  EXPECT_EQ(G_seen.mask, &mask);
-  EXPECT_EQ(G_seen.matrices, &matrix);
-  EXPECT_EQ(G_seen.x, 5);
-  EXPECT_EQ(G_seen.y, 1);
-  EXPECT_EQ(G_seen.rect, &rect);
-  EXPECT_EQ(G_seen.dst, &dst);
+TEST_F(Adapters, GoThroughTheirSlotsWithAnExtendedRecord) {
+  const SlotOverride transfer(ZR_Slot_transfer_rect, reinterpret_cast<void*>(&see_transfer_rect)),
+      transform(ZR_Slot_transform_world, reinterpret_cast<void*>(&see_transform_world));
+  const ZR_CompositeMode one{9, -5, 128, 0, 16448}, other{2, 1, 255, 7, 32768};
+  EXPECT_EQ(transfer_rect_adapter(&progress, 1, 6, 2, &rect, &src, &one, &mask, -3, 8, &dst), 4711);
+  EXPECT_EQ(G_seen, (Seen{&progress, 1, 2, -3, 8, 6, &rect, &src, nullptr, &mask, &dst, nullptr}));
+  expect_mode(one, 16448 / 32768.0f);
+  EXPECT_EQ(transform_world_adapter(&progress, 1, 6, 2, &src, &other, &mask, &matrix, 5, true, &rect, &dst), 4712);
+  EXPECT_EQ(G_seen, (Seen{&progress, 1, 2, 5, 1, 6, &rect, &src, nullptr, &mask, &dst, &matrix}));
+  expect_mode(other, 1.0f);
 }
 
 TEST_F(Adapters, WithoutAModeTheyRefuse) {
