@@ -10,6 +10,8 @@
 #include <random>
 #include <string>
 
+#include <ZR/transfer_mode.h>
+
 #include "model/rects.h"
 #include "support/messages.h"
 
@@ -23,7 +25,8 @@ class BornLibrary : public testing::Environment {
 inline testing::Environment* const born_library = testing::AddGlobalTestEnvironment(new BornLibrary);
 
 inline std::string mode_name(i32 mode) {
-  return std::to_string(mode) + (mode >= -3 && mode <= 40 ? std::string(" ") + modes[mode + 3].name : "");
+  const char* const name = ZR_TransferModeName(mode);
+  return std::to_string(mode) + (name != nullptr ? std::string(" ") + name : "");
 }
 
 inline std::string text(f32 v) {

@@ -6,10 +6,6 @@
 namespace model {
 
 enum class Kind { none, copy, over, row_only, black, white, grey, colour, alpha, special, weighted };
-struct ModeEntry {
-  const char* name;
-  Kind kind;
-};
 // clang-format off
 enum Mode : i32 {
   copy_fast = -3, matte_mix = -2, copy = 0, behind, in_front, dissolve, add, multiply, screen, overlay, soft_light,
@@ -18,22 +14,15 @@ enum Mode : i32 {
   difference_w, color_dodge_w, color_burn_w, linear_dodge, linear_burn, linear_light, vivid_light, pin_light,
   hard_mix, lighter_color, darker_color, subtract, divide, blue_threshold, key_protect
 };
-inline constexpr ModeEntry modes[] = {  // from -3 on
-  {"copy fast", Kind::copy}, {"matte mix", Kind::row_only}, {"none", Kind::none}, {"copy", Kind::copy},
-  {"behind", Kind::over}, {"in front", Kind::over}, {"dissolve", Kind::row_only}, {"add", Kind::black},
-  {"multiply", Kind::white}, {"screen", Kind::black}, {"overlay", Kind::grey}, {"soft light", Kind::grey},
-  {"hard light", Kind::grey}, {"darken", Kind::white}, {"lighten", Kind::black}, {"difference", Kind::black},
-  {"hue", Kind::colour}, {"saturation", Kind::colour}, {"color", Kind::colour}, {"luminosity", Kind::colour},
-  {"multiply alpha", Kind::alpha}, {"multiply alpha luma", Kind::alpha}, {"multiply not alpha", Kind::alpha},
-  {"multiply not alpha luma", Kind::alpha}, {"add premul", Kind::special}, {"alpha add", Kind::special},
-  {"color dodge", Kind::black}, {"color burn", Kind::white}, {"exclusion", Kind::black},
-  {"difference w", Kind::weighted}, {"color dodge w", Kind::weighted}, {"color burn w", Kind::weighted},
-  {"linear dodge", Kind::weighted}, {"linear burn", Kind::weighted}, {"linear light", Kind::weighted},
-  {"vivid light", Kind::weighted}, {"pin light", Kind::weighted}, {"hard mix", Kind::weighted},
-  {"lighter color", Kind::colour}, {"darker color", Kind::colour}, {"subtract", Kind::weighted},
-  {"divide", Kind::weighted}, {"blue threshold", Kind::special}, {"key protect", Kind::special}};
+inline constexpr Kind kinds[] = {  // from -3 on
+  Kind::copy, Kind::row_only, Kind::none, Kind::copy, Kind::over, Kind::over, Kind::row_only, Kind::black,
+  Kind::white, Kind::black, Kind::grey, Kind::grey, Kind::grey, Kind::white, Kind::black, Kind::black,
+  Kind::colour, Kind::colour, Kind::colour, Kind::colour, Kind::alpha, Kind::alpha, Kind::alpha, Kind::alpha,
+  Kind::special, Kind::special, Kind::black, Kind::white, Kind::black, Kind::weighted, Kind::weighted,
+  Kind::weighted, Kind::weighted, Kind::weighted, Kind::weighted, Kind::weighted, Kind::weighted, Kind::weighted,
+  Kind::colour, Kind::colour, Kind::weighted, Kind::weighted, Kind::special, Kind::special};
 // clang-format on
-inline Kind kind_of(i32 mode) { return mode >= copy_fast && mode <= key_protect ? modes[mode + 3].kind : Kind::none; }
+inline Kind kind_of(i32 mode) { return mode >= copy_fast && mode <= key_protect ? kinds[mode + 3] : Kind::none; }
 
 // Equal values and NaN give the second.
 template <class V>
