@@ -41,23 +41,24 @@ bool behind_straight(i32 n, u8 opacity, const ZR_Pixel8* src, ZR_Pixel8* dst) {
   using M = PixelMath<ZR_Pixel8>;
   constexpr i32 full = M::white * M::white;
   if (runs_into(src, dst, n)) return false;
-  each_block<Apart, ZR_Pixel8>(n, src, nullptr, dst, [&](const ZR_Pixel8* from, const ZR_Pixel8*, ZR_Pixel8* to, i32) HWY_ATTR {
-    const Px<M> d = Apart::load<M>(to);
-    const Bools<i32> none_below = d.alpha == 0, hidden = d.alpha == M::white;
-    if (all(hidden)) return;
-    const Px<M> s = Apart::load<M>(from);
-    const Px<M> alone = {M::mul(Ints(opacity), s.alpha), s.red, s.green, s.blue};
-    if (all(none_below)) {
-      Apart::store<M>(alone, to);
-      return;
-    }
-    const Ints w = M::inv(d.alpha) * opacity * s.alpha, t = w + d.alpha * full;
-    const BehindQuotient mix(w, t);
-    // No quotient of t below 2^24 rounds up to an integer.
-    const Px<M> both = {fitting_int(to_float(t) / static_cast<f32>(full)), mix(s.red, d.red), mix(s.green, d.green),
-                        mix(s.blue, d.blue)};
-    Apart::store<M>(pick(hidden, d, pick(none_below, alone, both)), to);
-  });
+  each_block<Apart, ZR_Pixel8>(n, src, nullptr, dst,
+                               [&](const ZR_Pixel8* from, const ZR_Pixel8*, ZR_Pixel8* to, i32) HWY_ATTR {
+                                 const Px<M> d = Apart::load<M>(to);
+                                 const Bools<i32> none_below = d.alpha == 0, hidden = d.alpha == M::white;
+                                 if (all(hidden)) return;
+                                 const Px<M> s = Apart::load<M>(from);
+                                 const Px<M> alone = {M::mul(Ints(opacity), s.alpha), s.red, s.green, s.blue};
+                                 if (all(none_below)) {
+                                   Apart::store<M>(alone, to);
+                                   return;
+                                 }
+                                 const Ints w = M::inv(d.alpha) * opacity * s.alpha, t = w + d.alpha * full;
+                                 const BehindQuotient mix(w, t);
+                                 // No quotient of t below 2^24 rounds up to an integer.
+                                 const Px<M> both = {fitting_int(to_float(t) / static_cast<f32>(full)),
+                                                     mix(s.red, d.red), mix(s.green, d.green), mix(s.blue, d.blue)};
+                                 Apart::store<M>(pick(hidden, d, pick(none_below, alone, both)), to);
+                               });
   return true;
 }
 
@@ -65,18 +66,18 @@ bool behind_premul(i32 n, u8 opacity, const ZR_Pixel8* src, ZR_Pixel8* dst) {
   using M = PixelMath<NarrowPixel8>;
   if (runs_into(src, dst, n)) return false;
   const Shorts factor = static_cast<i16>(opacity);
-  each_block<Narrow, ZR_Pixel8>(n, src, nullptr, dst, [&](const ZR_Pixel8* from, const ZR_Pixel8*, ZR_Pixel8* to, i32) HWY_ATTR {
-    const Px<M> d = Narrow::load<M>(to);
-    const Shorts room = M::inv(d.alpha);
-    if (all(room == 0)) return;
-    const Px<M> s = Narrow::load<M>(from);
-    const auto none_below = d.alpha == 0;
-    const auto add = [&](Shorts below, Shorts source) HWY_ATTR {
-      return M::stored(pick(none_below, 0, below) + M::mul(room, M::mul(factor, source)));
-    };
-    Narrow::store<M>(
-        {add(d.alpha, s.alpha), add(d.red, s.red), add(d.green, s.green), add(d.blue, s.blue)}, to);
-  });
+  each_block<Narrow, ZR_Pixel8>(
+      n, src, nullptr, dst, [&](const ZR_Pixel8* from, const ZR_Pixel8*, ZR_Pixel8* to, i32) HWY_ATTR {
+        const Px<M> d = Narrow::load<M>(to);
+        const Shorts room = M::inv(d.alpha);
+        if (all(room == 0)) return;
+        const Px<M> s = Narrow::load<M>(from);
+        const auto none_below = d.alpha == 0;
+        const auto add = [&](Shorts below, Shorts source) HWY_ATTR {
+          return M::stored(pick(none_below, 0, below) + M::mul(room, M::mul(factor, source)));
+        };
+        Narrow::store<M>({add(d.alpha, s.alpha), add(d.red, s.red), add(d.green, s.green), add(d.blue, s.blue)}, to);
+      });
   return true;
 }
 

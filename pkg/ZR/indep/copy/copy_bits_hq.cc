@@ -154,7 +154,7 @@ i32 copy_straight(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef
     const bool boxes = copy.shrinks();
     InnerRow<T> inner = {boxes ? box_row(samplers) : clipping_row(samplers), nullptr, boxes};
     if (inner.row != nullptr && !CopyPlane(*src, sizeof(T)).may_overlap(CopyPlane(*dst, sizeof(T))))
-      inner.copy = boxes ? lane_box_copy<T>() : lane_bilinear_copy<T>();
+      inner.copy = boxes ? lane_box_copier<T>() : lane_bilinear_copier<T>();
     return copy.run<T>(progress, src, dst, boxes ? samplers.area : samplers.clipping, inner, copy.x.count(),
                        copy.y.count());
   });

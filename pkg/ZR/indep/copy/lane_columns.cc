@@ -62,7 +62,7 @@ void stream_bytes(std::size_t bytes, const char* src, char* dst) {
 }
 void finish_streams() { hwy::FlushStream(); }
 
-const LaneColumns* columns_on_lanes() {
+const LaneColumns* columns() {
   static constexpr LaneColumns all = {&pick_columns<u32>, &pick_columns<u64>, &stream_bytes, &finish_streams};
   return &all;
 }
@@ -73,14 +73,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-const LaneColumns* lane_columns() {
-  ZR_RETURN_BEST(columns_on_lanes());
-  return nullptr;
-}
-
-}  // namespace zr
+ZR_LANE_CHOICE(const LaneColumns*, columns)
 #endif

@@ -68,14 +68,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-const GuessRuns* lane_guess_runs() {
-  ZR_RETURN_BEST(guess_runs());
-  return nullptr;
-}
-
-}  // namespace zr
+ZR_LANE_CHOICE(const GuessRuns*, guess_runs)
 #endif

@@ -99,7 +99,7 @@ void insert_any(u32 planes, i32 n, const u8* packed, ZR_Pixel8* row) {
     single_plane_rows().insert(planes, n, packed, row);
 }
 
-const PlaneRows* plane_rows_of_lanes() {
+const PlaneRows* plane_rows() {
   static constexpr PlaneRows rows = {&extract_any, &insert_any};
   return &rows;
 }
@@ -110,14 +110,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-const PlaneRows* lane_plane_rows() {
-  ZR_RETURN_BEST(plane_rows_of_lanes());
-  return nullptr;
-}
-
-}  // namespace zr
+ZR_LANE_CHOICE(const PlaneRows*, plane_rows)
 #endif

@@ -58,14 +58,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-NoiseFunc* lane_noise() {
-  ZR_RETURN_BEST(noise());
-  return nullptr;
-}
-
-}  // namespace zr
+ZR_LANE_CHOICE(NoiseFunc*, noise)
 #endif

@@ -206,8 +206,15 @@ bool bilinear_copy(const CopyPart<T>& part, const ZR_SampPB& params) {
     return copy_between<T, Windowed<T, 2>>(part, params, rows->no_clip);
   return copy_between<T, Scattered<T>>(part, params, rows->no_clip);
 }
-template bool bilinear_copy(const CopyPart<ZR_Pixel8>&, const ZR_SampPB&);
-template bool bilinear_copy(const CopyPart<ZR_Pixel16>&, const ZR_SampPB&);
+
+template <class T>
+LaneCopyFunc<T>* bilinear_copier() {
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+    return nullptr;
+  else
+    return &bilinear_copy<T>;
+}
+ZR_ROWS_OF_DEPTHS(LaneCopyFunc, bilinear_copier)
 
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
@@ -215,20 +222,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-template <class T>
-LaneCopyFunc<T>* lane_bilinear_copy() {
-  if constexpr (!std::is_same_v<T, ZR_PixelFloat>) {
-    ZR_RETURN_BEST(bilinear_copy<T>);
-  }
-  return nullptr;
-}
-template LaneCopyFunc<ZR_Pixel8>* lane_bilinear_copy<ZR_Pixel8>();
-template LaneCopyFunc<ZR_Pixel16>* lane_bilinear_copy<ZR_Pixel16>();
-template LaneCopyFunc<ZR_PixelFloat>* lane_bilinear_copy<ZR_PixelFloat>();
-
-}  // namespace zr
+ZR_LANE_ROWS(LaneCopyFunc, bilinear_copier)
 #endif

@@ -375,8 +375,15 @@ bool box_copy(const CopyPart<T>& part, const ZR_SampPB& params) {
   BoxCopy<T> copy(part, params);
   return copy.write();
 }
-template bool box_copy(const CopyPart<ZR_Pixel8>&, const ZR_SampPB&);
-template bool box_copy(const CopyPart<ZR_Pixel16>&, const ZR_SampPB&);
+
+template <class T>
+LaneCopyFunc<T>* box_copier() {
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+    return nullptr;
+  else
+    return &box_copy<T>;
+}
+ZR_ROWS_OF_DEPTHS(LaneCopyFunc, box_copier)
 
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
@@ -384,20 +391,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-template <class T>
-LaneCopyFunc<T>* lane_box_copy() {
-  if constexpr (!std::is_same_v<T, ZR_PixelFloat>) {
-    ZR_RETURN_BEST(box_copy<T>);
-  }
-  return nullptr;
-}
-template LaneCopyFunc<ZR_Pixel8>* lane_box_copy<ZR_Pixel8>();
-template LaneCopyFunc<ZR_Pixel16>* lane_box_copy<ZR_Pixel16>();
-template LaneCopyFunc<ZR_PixelFloat>* lane_box_copy<ZR_PixelFloat>();
-
-}  // namespace zr
+ZR_LANE_ROWS(LaneCopyFunc, box_copier)
 #endif

@@ -26,9 +26,9 @@ using LaneCopyFunc = bool(const CopyPart<T>& part, const ZR_SampPB& params);
 // The fastest that this processor has, or null. Bilinear, of parts whose neighbours lie inside and in the first 32768
 // columns and rows.
 template <class T>
-LaneCopyFunc<T>* lane_bilinear_copy();
+LaneCopyFunc<T>* lane_bilinear_copier();
 // Means of boxes that boxes_inside() has let pass.
 template <class T>
-LaneCopyFunc<T>* lane_box_copy();
+LaneCopyFunc<T>* lane_box_copier();
 
 }  // namespace zr

@@ -136,13 +136,8 @@ const LaneMotionSums<T>* motion_sums() {
   return &rows;
 }
 
-#define ZR_INSTANTIATE(T)                           \
-  template const LaneNearest<T>* nearest_rows<T>(); \
-  template const LaneMotionSums<T>* motion_sums<T>();
-ZR_INSTANTIATE(ZR_Pixel8)
-ZR_INSTANTIATE(ZR_Pixel16)
-ZR_INSTANTIATE(ZR_PixelFloat)
-#undef ZR_INSTANTIATE
+ZR_ROWS_OF_DEPTHS(const LaneNearest, nearest_rows)
+ZR_ROWS_OF_DEPTHS(const LaneMotionSums, motion_sums)
 
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
@@ -150,28 +145,6 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-template <class T>
-const LaneNearest<T>* lane_nearest_rows() {
-  ZR_RETURN_BEST(nearest_rows<T>());
-  return nullptr;
-}
-template <class T>
-const LaneMotionSums<T>* lane_motion_sums() {
-  ZR_RETURN_BEST(motion_sums<T>());
-  return nullptr;
-}
-
-#define ZR_INSTANTIATE(T)                                \
-  template const LaneNearest<T>* lane_nearest_rows<T>(); \
-  template const LaneMotionSums<T>* lane_motion_sums<T>();
-ZR_INSTANTIATE(ZR_Pixel8)
-ZR_INSTANTIATE(ZR_Pixel16)
-ZR_INSTANTIATE(ZR_PixelFloat)
-#undef ZR_INSTANTIATE
-
-}  // namespace zr
+ZR_LANE_ROWS(const LaneNearest, nearest_rows)
+ZR_LANE_ROWS(const LaneMotionSums, motion_sums)
 #endif

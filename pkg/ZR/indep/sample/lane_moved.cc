@@ -171,14 +171,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-const LaneMoved* lane_moved() {
-  ZR_RETURN_BEST(moved());
-  return nullptr;
-}
-
-}  // namespace zr
+ZR_LANE_CHOICE(const LaneMoved*, moved)
 #endif

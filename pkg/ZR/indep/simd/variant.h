@@ -40,3 +40,11 @@ enum CpuWord { cpu_sse2 = 2, cpu_sse4 = 6, cpu_avx2 = 7, cpu_avx512 = 8 };
   }                                      \
   ZR_ROWS_OF_DEPTHS(RESULT, lane_##NAME) \
   }
+// The same for a function that is no template and returns a pointer.
+#define ZR_LANE_CHOICE(RESULT, NAME) \
+  namespace zr {                     \
+  RESULT lane_##NAME() {             \
+    ZR_RETURN_BEST(NAME());          \
+    return nullptr;                  \
+  }                                  \
+  }
