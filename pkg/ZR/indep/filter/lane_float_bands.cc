@@ -216,7 +216,11 @@ struct BandLanes {
     return rests;
   }
   // Whether the strip's samples between two source rows are such multiples; finds their bound.
-  HWY_INLINE bool find_bound(i64 first_row, i64 end_row) {
+  bool find_bound(i64 first_row, i64 end_row) {
+    // A row that fails with its own bound does so with a larger one, too.
+    return find_bound_of(first_row, first_row + 1) && find_bound_of(first_row, end_row);
+  }
+  bool find_bound_of(i64 first_row, i64 end_row) {
     const Rests rests = rests_of(first_row, end_row);
     if (rests.within(band.bound)) return true;
     const f32 greatest = rests.greatest();
