@@ -127,9 +127,10 @@ TYPED_TEST(Convolutions, TablesAndOuterProducts) {
   }
 }
 
-// Floats that are whole multiples of a quantum, as those from 16 bits are, have exact sums, found another way; single
-// pixels that are not, and other levels, change that from one part of a picture to the next.
-TEST_F(Filters, ConvolutionsOfWholeMultiples) {
+// Floats that are multiples of a quantum have exact sums, found in other ways: of few bits, as those from 16 bits are,
+// and of many, as those from bytes and most random ones. Single pixels that are none, and other levels, change that
+// from one part of a picture to the next.
+TEST_F(Filters, ConvolutionsOfMultiples) {
   constexpr f32 nan = std::numeric_limits<f32>::quiet_NaN();
   struct Spot {
     i32 x, y;
@@ -143,12 +144,25 @@ TEST_F(Filters, ConvolutionsOfWholeMultiples) {
   struct Kernel {
     i32 size, low, high;
     u32 flags;
-    bool mirrored;
+    enum { no, sideways, both_ways } mirrored;
   };
   // Divisors are small, have more than 20 bits, and are negative.
-  const Kernel kernels[] = {{3, 0, 255, 2, true},         {5, -60, 90, 2, true},   {7, 0, 31, 0, false},
-                            {15, 0, 255, 2, true},        {9, -128, 127, 3, true}, {9, 0, 128, 35, false},
-                            {3, 131000, 131072, 2, true}, {5, -4, -1, 2, false}};
+  const Kernel kernels[] = {{3, 0, 255, 2, Kernel::both_ways},
+                            {5, -60, 90, 2, Kernel::sideways},
+                            {5, 1, 255, 2, Kernel::both_ways},
+                            {7, 0, 31, 0, Kernel::no},
+                            {15, 0, 255, 2, Kernel::sideways},
+                            {9, -128, 127, 3, Kernel::sideways},
+                            {9, 0, 128, 35, Kernel::no},
+                            {3, -255, 255, 0, Kernel::both_ways},
+                            {3, 131000, 131072, 2, Kernel::both_ways},
+                            {5, -4, -1, 2, Kernel::no}};
+  struct Samples {
+    u32 count;
+    f32 unit;
+    i32 darker;  // by so many halves from row to row, in turn
+  };
+  const Samples samples[] = {{65537, 0x1p-16f, 1}, {256, 1 / 255.0f, 1}, {~0u, 0x1p-32f, 1}, {~0u, 0x1p-32f, 12}};
   for (int level = 0; level < 4 && Instructions::has(level); ++level) {
     const Instructions instructions(level);
     for (const Kernel& kernel : kernels) {
@@ -156,22 +170,32 @@ TEST_F(Filters, ConvolutionsOfWholeMultiples) {
       Taps taps[4];
       for (u32 k = 0; k < 4; ++k) {
         taps[k] = taps_of(side * rows, kernel.low, kernel.high, 3 + k);
-        for (i32 i = 0; kernel.mirrored && i < side * rows; ++i)
+        for (i32 i = 0; kernel.mirrored != Kernel::no && i < side * rows; ++i) {
           taps[k][static_cast<size_t>(i)] = taps[k][static_cast<size_t>(i / side * side + side - 1 - i % side)];
+          if (kernel.mirrored == Kernel::both_ways)
+            taps[k][static_cast<size_t>(i)] = taps[k][static_cast<size_t>((rows - 1 - i / side) * side + i % side)];
+        }
       }
-      for (const auto& places : spots) {
+      // All spots in small multiples, some in the others.
+      for (size_t turn = 0; turn < std::size(spots) + 2 * std::size(samples) - 2; ++turn) {
+        const bool small = turn < std::size(spots);
+        const Samples& of = samples[small ? 0 : 1 + (turn - std::size(spots)) / 2];
+        const auto& places = spots[small ? turn : 2 * ((turn - std::size(spots)) % 2)];
         TestWorld<ZR_PixelFloat> src(300, 70), made(302, 71), expected(302, 71);
         std::mt19937 random(8);
-        const auto channel = [&] { return static_cast<f32>(random() % 65537) * 0x1p-16f; };
-        for (i32 y = 0; y < 70; ++y)
+        for (i32 y = 0; y < 70; ++y) {
+          const auto channel = [&] {
+            return std::ldexp(static_cast<f32>(random() % of.count) * of.unit, -(y % of.darker));
+          };
           for (i32 x = 0; x < 300; ++x) src.at(x, y) = {channel(), channel(), channel(), y < 40 ? 0 : -channel()};
+        }
         for (const Spot& spot : places) src.at(spot.x, spot.y).green = spot.value;
         ASSERT_EQ(ZR_Convolve(nullptr, src, nullptr, kernel.flags, side, taps[0].data(), taps[1].data(), taps[2].data(),
                               taps[3].data(), made),
                   0);
         model_convolve(src, kernel.flags, side, taps, expected);
         ASSERT_TRUE(made == expected) << Instructions::names[level] << " size " << side << " taps from " << kernel.low
-                                      << ", " << places.size() << " spots";
+                                      << ", " << places.size() << " spots, multiples of " << of.unit;
       }
     }
   }

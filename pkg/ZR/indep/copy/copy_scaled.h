@@ -9,6 +9,7 @@
 
 #include "copy/copy_rects.h"
 #include "copy/lane_columns.h"
+#include "simd/streamed.h"
 #include "world/guard.h"
 
 namespace zr {
@@ -41,9 +42,6 @@ struct OverflowTexts {
   ZR_CallSite site;
   const char *x, *y;
 };
-
-// Above this a destination does not stay in the caches: what is written to it need not come there.
-inline constexpr i64 streamed_bytes = i64{4} << 20;
 
 // emit(n, source columns, source row, destination pixels, apart) writes n pixels; the source row is that of column 0.
 // Unless source and destination are apart it writes one pixel after the other.

@@ -166,16 +166,18 @@ template <class T>
 class RowsInTurn {
  public:
   RowsInTurn(const Convolution<T>& c, const ZR_LayerDef& dst, bool one_by_one) : dst_(dst), one_by_one_(one_by_one) {
-    if constexpr (banded) bands_.emplace(c);
+    if constexpr (banded) bands_.emplace(c, dst);
     if (!banded || !*bands_) rows_.emplace(c);
   }
   void make(i32 y) {
-    char* const row = static_cast<char*>(dst_.data) + static_cast<i64>(y) * dst_.row_bytes;
-    if (rows_) return rows_->row(y, dst_.width, reinterpret_cast<T*>(row));
+    if (rows_) {
+      char* const row = static_cast<char*>(dst_.data) + i64{y} * dst_.row_bytes;
+      return rows_->row(y, dst_.width, reinterpret_cast<T*>(row));
+    }
     if constexpr (banded) {
       if (y < made_) return;
       made_ = one_by_one_ ? y + 1 : dst_.height;
-      bands_->make(y, made_, dst_.width, row, dst_.row_bytes);
+      bands_->make(y, made_);
     }
   }
 

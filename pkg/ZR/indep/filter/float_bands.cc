@@ -11,15 +11,16 @@
 #include <cstring>
 
 #include "filter/short_quotient.h"
+#include "simd/streamed.h"
 #include "world/guard.h"
 
 namespace zr {
 namespace {
 
 constexpr i32 most_shared = 12;  // products for all rows, before each kind of row gets its own
-constexpr i32 least_strip = 32, most_strip = 128;
+constexpr i32 least_strip = 32;
 constexpr i64 near_memory = 44 * 1024;  // that processors keep closest, with some to spare
-constexpr i32 least_rows = 16;          // of a band
+constexpr i32 least_rows = 128;         // of a band
 constexpr i64 pixel_bytes = 4 * sizeof(f64);
 
 // Pieces of memory; of none it only finds the size.
@@ -51,22 +52,28 @@ class Plan {
     fewer_places_ = cutter.take<i32>(taps);
     kinds_ = cutter.take<FloatBand::Group>(c.height);
     order_ = cutter.take<i32>(c.height);
+    sample_lines_ = cutter.take<FloatBand::Exact::Line>(c.height);
+    product_lines_ = cutter.take<FloatBand::Exact::Line>(c.height);
+    sample_places_ = cutter.take<i32>(c.width);
+    product_places_ = cutter.take<i32>(taps);
     term_weights_ = cutter.take<f32>(4 * taps);
-    padded_ = cutter.take<f32>(4 * (most_strip + c.width));
+    lines_ = cutter.take<i32>(c.height);
+    padded_ = cutter.take<f32>(4 * (float_most_strip + c.width));
+    spare_ = cutter.take<f32>(4 * float_most_strip);
     const i64 most_made = std::max(c.width, most_shared);
-    blocks_ = cutter.take<char>(std::max(block_bytes(most_strip, most_made), exact_bytes()));
+    blocks_ = cutter.take<char>(std::max(block_bytes(float_most_strip, most_made), exact_bytes(most_made)));
     bytes_ = cutter.used();
   }
   i64 bytes() const { return bytes_; }
 
   void fill(FloatBand* band) {
     find_kinds();
-    find_exact(&band->exact);
     if (!share_among_all()) share_among_rows();
+    find_exact(&band->exact);
     i32 most_made = 1;
     for (i32 g = 0; g < group_count_; ++g)
       most_made = std::max(most_made, groups_[g].end_product - groups_[g].first_product);
-    i32 strip = most_strip;
+    i32 strip = float_most_strip;
     while (strip > least_strip && near_bytes(strip, most_made) > near_memory) strip -= float_strip_step;
 
     band->kernel = c_;
@@ -75,30 +82,31 @@ class Plan {
     band->rows = rows_;
     band->weights = weights_;
     band->strip = strip;
-    band->product_place = spread(product_pixels(strip));
-    band->sums_place = spread(strip / halves_);
+    band->product_place = spread_lines(product_pixels(strip));
+    band->sums_place = spread_lines(strip / halves_);
     for (i32 k = 0; k < 4; ++k) band->divisors[k] = static_cast<f32>(c_.divisors[k]);
     band->products = reinterpret_cast<f64*>(blocks_);
     band->sums = band->products + most_made * band->product_place * 4 * halves_;
     band->padded = padded_;
+    band->spare = spare_;
     for (i32 g = 0; g < group_count_; ++g)
       for (i32 r = groups_[g].first_row; r < groups_[g].end_row; ++r) find_places(groups_[g], &rows_[r], band);
   }
 
  private:
-  // Blocks whose addresses have the same last 12 bits would wait for each other.
-  static constexpr i64 spread(i64 places) { return (places + 52) / 64 * 64 + 11; }
   i64 product_pixels(i32 strip) const { return strip / halves_ + c_.width - 1; }
   i64 near_bytes(i32 strip, i64 products) const {
     return pixel_bytes * halves_ * (products * product_pixels(strip) + i64{c_.height} * strip / halves_);
   }
   i64 block_bytes(i32 strip, i64 products) const {
-    return pixel_bytes * halves_ * (products * spread(product_pixels(strip)) + c_.height * spread(strip / halves_));
+    return pixel_bytes * halves_ *
+           (products * spread_lines(product_pixels(strip)) + c_.height * spread_lines(strip / halves_));
   }
-  i64 exact_samples() const { return (c_.width + 1) * exact_samples_place(); }
-  i64 exact_samples_place() const { return 16 * spread((most_strip + c_.width - 1) / 4 + 1); }
-  static i64 exact_sums_place() { return 16 * spread(8 * most_strip / 16); }
-  i64 exact_bytes() const { return (exact_samples() + c_.height * exact_sums_place()) * static_cast<i64>(sizeof(f32)); }
+  static i64 exact_sums_place() { return 16 * spread_lines(8 * float_most_strip / 16); }
+  i64 planes_end(i64 products) const { return 2 * std::max<i64>(products, c_.width / 2 + 1) * float_plane_place; }
+  i64 exact_bytes(i64 products) const {
+    return (planes_end(products) + (c_.height + 1) * exact_sums_place()) * static_cast<i64>(sizeof(f32));
+  }
   // The number of a tap's product, which may be a new one, from those of its group on.
   i32 product_of(i32 v, i32 u, i32 group_begin) {
     f32 w[4];
@@ -160,21 +168,43 @@ class Plan {
           if (kernel[i64{v} * c_.width + u] != kernel[i64{v} * c_.width + c_.width - 1 - u]) return false;
     return true;
   }
+  // Products of samples of up to 2^bits quanta fit the 24 bits of single precision. The lower parts, of up to 2^lower
+  // quanta, and the upper parts, of up to 2^(bits - lower - 1) times that, are summed in 24 bits too.
+  static FloatBand::Exact::Condition whole_products(u64 greatest_tap, u64 tap_sum) {
+    const i32 product_bits = static_cast<i32>(std::bit_width(greatest_tap - 1));
+    const i32 sum_bits = static_cast<i32>(std::bit_width(tap_sum - 1));
+    const i32 bits = std::min({24 - product_bits, 47 - 2 * sum_bits, 22}), lower = 24 - sum_bits;
+    return {bits >= 8, std::ldexp(1.0f, -bits), std::ldexp(1.0f, std::min(lower + 1 - bits, 0))};
+  }
+  // Products, each rounded to a multiple of the quantum, and their sums in a kernel row are up to 2^22 times the split,
+  // so that they can be rounded to it, and all upper parts' sums up to 2^24 times. Lower parts are up to half of it,
+  // and their sums up to 2^24 quanta.
+  static FloatBand::Exact::Condition rounded_products(u64 row_sum, u64 tap_sum, i64 taps) {
+    constexpr i32 most_bits = 24;  // of weights
+    const i32 tap_bits = static_cast<i32>(std::bit_width(static_cast<u64>(taps) - 1));
+    i32 split = -most_bits;
+    while (std::ldexp(static_cast<f64>(row_sum), -split) > 0x1p22 ||
+           std::ldexp(static_cast<f64>(tap_sum), -split) + static_cast<f64>(taps) > 0x1p24)
+      ++split;
+    const i32 quantum = split + tap_bits - 25;
+    return {tap_sum < 1u << most_bits && quantum <= -most_bits, std::ldexp(1.0f, quantum), std::ldexp(1.0f, split)};
+  }
   void find_exact(FloatBand::Exact* exact) const {
-    u64 greatest = 1, sum = 1;
+    u64 greatest = 1, row_sum = 1, sum = 1;
     for (i32 k = 0; k < 4; ++k) {
       sum = std::max(sum, c_.tap_sums[k]);
-      for (i64 i = 0; i < i64{c_.width} * c_.height; ++i)
-        greatest = std::max(greatest, static_cast<u64>(std::abs(i64{c_.kernels[k][i]})));
+      for (i32 v = 0; v < c_.height; ++v) {
+        u64 of_row = 0;
+        for (i64 i = i64{v} * c_.width; i < (i64{v} + 1) * c_.width; ++i) {
+          const u64 tap = static_cast<u64>(std::abs(i64{c_.kernels[k][i]}));
+          greatest = std::max(greatest, tap);
+          of_row += tap;
+        }
+        row_sum = std::max(row_sum, of_row);
+      }
     }
-    // Samples are up to 2^bits quanta, so that products fit the 24 bits of single precision. The lower halves, of up to
-    // 2^lower quanta, and the upper halves, of up to 2^(bits - lower - 1) times that, are summed in 24 bits too.
-    const i32 product_bits = static_cast<i32>(std::bit_width(greatest - 1));
-    const i32 sum_bits = static_cast<i32>(std::bit_width(sum - 1));
-    const i32 bits = std::min({24 - product_bits, 47 - 2 * sum_bits, 22}), lower = 24 - sum_bits;
-    exact->possible = bits >= 8;
-    exact->quantum = std::ldexp(1.0f, -bits);
-    exact->split = std::ldexp(1.0f, std::min(lower + 1 - bits, 0));
+    exact->whole = whole_products(greatest, sum);
+    exact->rounded = rounded_products(row_sum, sum, i64{c_.width} * c_.height);
     exact->short_quotients = true;
     for (i32 k = 0; k < 4; ++k) {
       const f32 divisor = static_cast<f32>(c_.divisors[k]);
@@ -184,20 +214,50 @@ class Plan {
       exact->reciprocals[1][k] = by.lower;
     }
     exact->mirrored = is_mirrored();
-    exact->terms = exact->mirrored ? c_.width / 2 + 1 : c_.width;
-    exact->weights = term_weights_;
-    exact->kinds = kinds_;
-    exact->kind_count = kind_count_;
+    exact->line_count = kind_count_;
     exact->order = order_;
-    exact->samples = reinterpret_cast<f32*>(blocks_);
-    exact->samples_place = exact_samples_place();
-    exact->sums = exact->samples + exact_samples();
-    exact->sums_place = exact_sums_place();
     for (i32 k = 0; k < kind_count_; ++k)
-      for (i32 t = 0; t < exact->terms; ++t)
-        for (i32 c = 0; c < 4; ++c)
-          term_weights_[4 * (k * exact->terms + t) + c] =
-              static_cast<f32>(c_.kernels[c][i64{order_[kinds_[k].first_row]} * c_.width + t]);
+      for (i32 i = kinds_[k].first_row; i < kinds_[k].end_row; ++i) lines_[order_[i]] = k;
+    exact->lines = lines_;
+    exact->small = exact->mirrored && c_.width == c_.height && (c_.width == 3 || c_.width == 5);
+    for (i32 v = 0; v < c_.height; ++v) exact->small = exact->small && lines_[v] == lines_[c_.height - 1 - v];
+    find_sample_lines(exact->mirrored);
+    find_product_lines();
+    exact->samples = sample_lines_;
+    exact->products = product_lines_;
+    exact->planes = reinterpret_cast<f32*>(blocks_);
+    const i64 products = std::max(c_.width, most_shared);
+    exact->sums = exact->planes + planes_end(products);
+    exact->sums_place = exact_sums_place();
+  }
+  // Terms of samples are those of one plane, or of pairs: a plane for each, after that of the samples themselves.
+  void find_sample_lines(bool mirrored) const {
+    const i32 pairs = mirrored ? c_.width / 2 : 0, terms = c_.width - pairs;
+    for (i32 t = 0; t < terms; ++t)
+      sample_places_[t] = t < pairs ? static_cast<i32>((2 * t + 2) * float_plane_place) : 4 * t;
+    for (i32 k = 0; k < kind_count_; ++k) {
+      f32* const weights = term_weights_ + 4 * i64{k} * c_.width;
+      const i64 first_tap = i64{order_[kinds_[k].first_row]} * c_.width;
+      for (i32 t = 0; t < terms; ++t)
+        for (i32 c = 0; c < 4; ++c) weights[4 * t + c] = static_cast<f32>(c_.kernels[c][first_tap + t]);
+      sample_lines_[k] = {sample_places_, weights, terms, kinds_[k].first_row, kinds_[k].end_row};
+    }
+  }
+  // Terms of products, one plane for each product of a group, but those of weight 0.
+  void find_product_lines() const {
+    for (i32 k = 0; k < kind_count_; ++k) {
+      const i32 first_product = groups_[group_count_ == kind_count_ ? k : 0].first_product;
+      const i64 first_tap = i64{order_[kinds_[k].first_row]} * c_.width;
+      i32* const places = product_places_ + first_tap;
+      i32 count = 0;
+      for (i32 u = 0; u < c_.width; ++u) {
+        const i32 product = places_[first_tap + u];
+        const f32* const w = weights_ + 4 * i64{product};
+        if (w[0] != 0 || w[1] != 0 || w[2] != 0 || w[3] != 0)
+          places[count++] = static_cast<i32>(2 * (product - first_product) * float_plane_place + 4 * u);
+      }
+      product_lines_[k] = {places, nullptr, count, kinds_[k].first_row, kinds_[k].end_row};
+    }
   }
   void find_places(const FloatBand::Group& group, FloatBand::Row* row, FloatBand* band) const {
     const i64 first_tap = i64{row->v} * c_.width;
@@ -220,8 +280,9 @@ class Plan {
   FloatBand::Group* groups_;
   FloatBand::Row* rows_;
   FloatBand::Group* kinds_;
-  f32 *weights_, *term_weights_, *padded_;
-  i32 *places_, *fewer_places_, *order_;
+  FloatBand::Exact::Line *sample_lines_, *product_lines_;
+  f32 *weights_, *term_weights_, *padded_, *spare_;
+  i32 *places_, *fewer_places_, *order_, *sample_places_, *product_places_, *lines_;
   char* blocks_;
   i64 bytes_;
   i32 product_count_ = 0, group_count_ = 0, kind_count_ = 0;
@@ -229,7 +290,7 @@ class Plan {
 
 }  // namespace
 
-FloatBands::FloatBands(const Convolution<ZR_PixelFloat>& c) {
+FloatBands::FloatBands(const Convolution<ZR_PixelFloat>& c, const ZR_LayerDef& dst) : dst_(dst) {
   const FloatBandLanes lanes = lane_float_band();
   run_ = lanes.run;
   if (run_ == nullptr || c.width > largest_banded_side || c.height > largest_banded_side) return;
@@ -238,25 +299,27 @@ FloatBands::FloatBands(const Convolution<ZR_PixelFloat>& c) {
                                               ZR_ModuleCode | ZR_Site_Convolve));
   if (memory_ == nullptr) fail(ZR_Err_OutOfMemory);
   Plan(c, lanes.halves, memory_ + (64 - reinterpret_cast<std::uintptr_t>(memory_) % 64) % 64).fill(&band_);
+  band_.pixels = dst.width;
+  band_.dst_row_bytes = dst.row_bytes;
+  band_.streams = i64{dst.width} * dst.height * static_cast<i64>(sizeof(ZR_PixelFloat)) >= streamed_bytes;
 }
 FloatBands::~FloatBands() { HB_FreePtr(memory_); }
 
-void FloatBands::make(i32 first, i32 end, i32 pixels, char* dst, i64 dst_row_bytes) {
+void FloatBands::make(i32 first, i32 end) {
   // Rows further down meet no source.
   const i64 below = i64{band_.kernel.src_height} + band_.kernel.height / 2;
   const i32 met = band_.kernel.src_height > 0 ? static_cast<i32>(std::clamp<i64>(below, first, end)) : first;
-  band_.pixels = pixels;
-  band_.dst_row_bytes = dst_row_bytes;
   // Few enough that what they read twice stays near.
   const i32 rows_of_band = std::max(least_rows, 4 * band_.kernel.height);
-  for (i32 y = first; y < met && pixels > 0; y = band_.end) {
+  const auto row = [&](i32 y) { return static_cast<char*>(dst_.data) + i64{y} * dst_.row_bytes; };
+  for (i32 y = first; y < met && dst_.width > 0; y = band_.end) {
     band_.first = y;
     band_.end = std::min(y + rows_of_band, met);
-    band_.dst = dst + (y - first) * dst_row_bytes;
+    band_.dst = row(y);
     run_(band_);
   }
   for (i32 y = met; y < end; ++y)
-    convolve_pixels(band_.kernel, y, 0, pixels, reinterpret_cast<ZR_PixelFloat*>(dst + (y - first) * dst_row_bytes));
+    convolve_pixels(band_.kernel, y, 0, dst_.width, reinterpret_cast<ZR_PixelFloat*>(row(y)));
 }
 
 }  // namespace zr

@@ -11,6 +11,12 @@ namespace zr {
 
 inline constexpr i32 largest_banded_side = 63;  // of kernels; of larger ones few taps are alike
 inline constexpr i32 float_strip_step = 32;     // strips are whole multiples of so many pixels
+inline constexpr i32 float_most_strip = 128;
+
+// Blocks of so many lines of 64 bytes, at addresses that differ in their last 12 bits: equal ones wait for each other.
+constexpr i64 spread_lines(i64 lines) { return (lines + 52) / 64 * 64 + 11; }
+// Numbers from one plane of a strip's numbers, with those that taps reach, to the next.
+inline constexpr i64 float_plane_place = 16 * spread_lines((float_most_strip + largest_banded_side - 1) / 4 + 1);
 
 struct FloatBand {
   // A kernel row: where the products of its taps are, in pixels from the first of its group's. Taps of weight 0 add
@@ -25,28 +31,40 @@ struct FloatBand {
     i32 first_product, end_product, first_row, end_row;
   };
 
-  // Where a strip's samples are whole multiples of a quantum, few bits above it, all products and sums are exact: they
-  // may be made in any order and form. Samples are then split into two numbers of single precision, the upper a
-  // multiple of `split`; sums of both halves are exact too. Kernel rows that are alike share their sums.
+  // Sums that are exact in single precision, so that they may be made in any order and form: each of two numbers, the
+  // upper one a multiple of `split`. Kernel rows that are alike share their sums, and sums their pairs of samples.
   struct Exact {
-    bool possible;
-    bool mirrored;       // every kernel row: taps go in pairs
-    i32 terms;           // pairs, or taps
-    f32 quantum, split;  // of samples up to 1
+    // What samples of up to 1 are multiples of.
+    struct Condition {
+      bool possible;
+      f32 quantum, split;
+    };
+    // The numbers of a kernel row's terms, counted from its pixel on, and their weights, four for each; null are ones.
+    struct Line {
+      const i32* places;
+      const f32* weights;
+      i32 count, first_row, end_row;  // in `order`
+    };
+    // Whole products: samples are split, then weighted. Rounded products: these are split.
+    Condition whole, rounded;
+    bool mirrored;   // every kernel row: terms of samples are pairs
+    i32 line_count;  // kinds of kernel rows
+    const Line *samples, *products;
+    const i32* order;    // of kernel rows
+    const i32* lines;    // of each kernel row
+    bool small;          // 3x3 or 5x5, alike from left and right, from above and below
+    f32 *planes, *sums;  // upper and lower parts of a row; of a destination row, and of none
+    i64 sums_place;      // numbers from one row to the next
     bool short_quotients;
     f32 reciprocals[2][4];  // upper and lower parts of the divisors'
-    const f32* weights;     // of each kind of kernel row, four for each term
-    const Group* kinds;     // their places in `order`
-    i32 kind_count;
-    const i32* order;               // of kernel rows
-    f32 *samples, *sums;            // upper and lower halves of a row and of its pairs; of a destination row
-    i64 samples_place, sums_place;  // numbers from one to the next
   };
+  enum class Form { whole, rounded, doubles };
 
   Convolution<ZR_PixelFloat> kernel;
   Exact exact;
-  f32 bound = 1;         // of the last strip's samples, a power of two
-  bool doubtful = true;  // whether the next strip's sums are exact
+  // Of the last strip.
+  Form form = Form::doubles;
+  f32 bound = 1;  // of its samples, a power of two
   const Group* groups;
   i32 group_count;
   const Row* rows;
@@ -58,11 +76,13 @@ struct FloatBand {
   f32 divisors[4];
   f64 *products, *sums;
   f32* padded;  // a source row of the strip, with clear pixels outside of the source
+  f32* spare;   // a strip of a destination row that is not in the destination, or not all of it
 
   // Destination rows, all of which meet the source.
   i32 first, end, pixels;
   char* dst;  // of row `first`
   i64 dst_row_bytes;
+  bool streams;  // the destination is too large for the caches
 };
 // How lanes hold a strip: its halves side by side in each vector, where vectors hold two pixels.
 struct FloatBandLanes {
@@ -75,15 +95,16 @@ FloatBandLanes lane_float_band();
 // The plan of a call, and the memory it takes. There is none without lanes, and for kernels that are too large.
 class FloatBands {
  public:
-  explicit FloatBands(const Convolution<ZR_PixelFloat>& c);
+  FloatBands(const Convolution<ZR_PixelFloat>& c, const ZR_LayerDef& dst);
   ~FloatBands();
   FloatBands(const FloatBands&) = delete;
   FloatBands& operator=(const FloatBands&) = delete;
   explicit operator bool() const { return memory_ != nullptr; }
-  // Rows first..end-1 of a destination.
-  void make(i32 first, i32 end, i32 pixels, char* dst, i64 dst_row_bytes);
+  // Rows first..end-1 of the destination.
+  void make(i32 first, i32 end);
 
  private:
+  const ZR_LayerDef& dst_;
   char* memory_ = nullptr;
   void (*run_)(FloatBand&);
   FloatBand band_ = {};

@@ -5,10 +5,14 @@
 #define HWY_TARGET_INCLUDE "filter/lane_float_bands.cc"
 #include <hwy/foreach_target.h>
 
+#include <hwy/cache_control.h>
+
 #include <algorithm>
 
 #include "simd/lanes-inl.h"
 #if ZR_HAS_LANES
+#include "filter/lane_exact_bands-inl.h"
+
 HWY_BEFORE_NAMESPACE();
 namespace zr {
 namespace HWY_NAMESPACE {
@@ -27,23 +31,12 @@ struct BandLanes {
   static constexpr i32 place_numbers = lanes * parts;      // of a pixel, or one of each half
   static_assert(float_strip_step % (halves * pixels_of_block) == 0 && lanes * parts == 4 * halves);
 
-  FloatBand& band;
-  i64 left = 0;  // the strip's first pixel
+  StripLanes strip;
+  FloatBand& band = strip.band;
   i64 part = 0;  // pixels of the strip, or of half of it
 
-  HWY_INLINE i64 reach() const { return band.kernel.width / 2; }
+  HWY_INLINE i64 reach() const { return strip.reach(); }
 
-  // The strip's samples of a source row, with those that its taps reach on both sides.
-  HWY_INLINE const f32* samples_of(i64 r) const {
-    const i64 first = left - reach(), end = left + part * halves + reach();
-    const i64 inside_first = std::max<i64>(first, 0), inside_end = std::min<i64>(end, band.kernel.src_width);
-    const f32* const row = reinterpret_cast<const f32*>(band.kernel.source_row(r));
-    if (first == inside_first && end == inside_end) return row + 4 * first;
-    std::fill(band.padded, band.padded + 4 * (end - first), 0.0f);
-    if (inside_first < inside_end)
-      std::copy(row + 4 * inside_first, row + 4 * inside_end, band.padded + 4 * (inside_first - first));
-    return band.padded;
-  }
   HWY_INLINE bool all_finite(const f32* samples) const {
     const hn::FixedTag<f32, 4> d;
     auto rests = hn::Zero(d);
@@ -99,6 +92,12 @@ struct BandLanes {
     f32* out;
     i64 pixels;  // of the strip, that the destination has
   };
+  template <class D>
+  static HWY_INLINE void write(hn::Vec<D> v, D d, bool streams, f32* to) {
+    if constexpr (hn::MaxLanes(D()) >= 4)
+      if (streams) return hn::Stream(v, d, to);
+    hn::StoreU(v, d, to);
+  }
   // Adds its taps to a block of them, at place x.
   template <bool begins, bool ends>
   HWY_INLINE void add_block(const Way& way, i64 x) const {
@@ -121,14 +120,15 @@ struct BandLanes {
     const bool cut = way.pixels < x + pixels_of_block + (halves - 1) * part;
     f32* to = cut ? rest : way.out + 4 * x;
     const i64 half_step = 4 * (cut ? pixels_of_block : part);
+    const bool streams = band.streams && !cut && reinterpret_cast<std::uintptr_t>(to) % 16 == 0;
     for (i32 i = 0; i < vectors; ++i, to += lanes / halves) {
       const auto made = hn::Div(hn::DemoteTo(Half(), sum[i]), divisors[i % parts]);
       if constexpr (halves == 2) {
         const hn::Half<Half> pixel;
-        hn::StoreU(hn::LowerHalf(pixel, made), pixel, to);
-        hn::StoreU(hn::UpperHalf(pixel, made), pixel, to + half_step);
+        write(hn::LowerHalf(pixel, made), pixel, streams, to);
+        write(hn::UpperHalf(pixel, made), pixel, streams, to + half_step);
       } else {
-        hn::StoreU(made, Half(), to);
+        write(made, Half(), streams, to);
       }
     }
     for (i32 h = 0; cut && h < halves; ++h) {
@@ -148,7 +148,7 @@ struct BandLanes {
   }
   // Carries source row r to all destination rows of the band that it meets.
   HWY_INLINE void meet(i64 r) {
-    const f32* const samples = samples_of(r);
+    const f32* const samples = strip.samples_of(r);
     const bool finite = !band.has_zeros || all_finite(samples);
     for (i32 g = 0; g < band.group_count; ++g) {
       const FloatBand::Group& group = band.groups[g];
@@ -165,8 +165,8 @@ struct BandLanes {
         way.begins = row.v == met.first;
         way.ends = row.v == met.end - 1;
         way.sums = band.sums + y % band.kernel.height * band.sums_place * place_numbers;
-        way.out = reinterpret_cast<f32*>(band.dst + (y - band.first) * band.dst_row_bytes) + 4 * left;
-        way.pixels = band.pixels - left;
+        way.out = reinterpret_cast<f32*>(band.dst + (y - band.first) * band.dst_row_bytes) + 4 * strip.left;
+        way.pixels = band.pixels - strip.left;
       }
       if (count == 0) continue;
       // Close to each other, so that processors do some of both at once.
@@ -180,190 +180,21 @@ struct BandLanes {
     }
   }
 
-  // ------------------------------------------------------------------------------ exact sums
-  using Single = Tag<f32>;
-  using Numbers = hn::Vec<Single>;
-  static constexpr i32 singles = lane_count(), single_vectors = lanes == 8 ? 8 : 4;
-  static constexpr i32 block_pixels = singles * single_vectors / 4;
-  static_assert(float_strip_step % block_pixels == 0);
-
-  // What samples that are multiples of their bound's quantum leave at 0.
-  struct Rests {
-    Numbers magic, most, rests;
-    HWY_INLINE explicit Rests(f32 quantum)
-        : magic(hn::Set(Single(), 0x1.8p23f * quantum)), most(hn::Zero(Single())), rests(hn::Zero(Single())) {}
-    HWY_INLINE void look(Numbers v) {
-      most = hn::Max(most, hn::Abs(v));
-      rests = hn::Or(rests, hn::Sub(hn::Sub(hn::Add(v, magic), magic), v));
-    }
-    HWY_INLINE f32 greatest() const { return hn::GetLane(hn::MaxOfLanes(Single(), most)); }
-    HWY_INLINE bool within(f32 bound) const {
-      const Single d;
-      return hn::AllTrue(d, hn::And(hn::Eq(rests, hn::Zero(d)), hn::Le(most, hn::Set(d, bound))));
-    }
-  };
-  HWY_INLINE Rests rests_of(i64 first_row, i64 end_row) const {
-    const Single d;
-    const i64 first = std::max<i64>(left - reach(), 0);
-    const i64 end = std::min<i64>(left + part * halves + reach(), band.kernel.src_width);
-    Rests rests(band.exact.quantum * band.bound);
-    for (i64 r = first_row; r < end_row; ++r) {
-      const f32* const row = reinterpret_cast<const f32*>(band.kernel.source_row(r));
-      i64 c = 4 * first;
-      for (; c + singles <= 4 * end; c += singles) rests.look(hn::LoadU(d, row + c));
-      for (; c < 4 * end; c += 4) rests.look(hn::LoadDup128(d, row + c));
-    }
-    return rests;
-  }
-  // Whether the strip's samples between two source rows are such multiples; finds their bound.
-  bool find_bound(i64 first_row, i64 end_row) {
-    // A row that fails with its own bound does so with a larger one, too.
-    return find_bound_of(first_row, first_row + 1) && find_bound_of(first_row, end_row);
-  }
-  bool find_bound_of(i64 first_row, i64 end_row) {
-    const Rests rests = rests_of(first_row, end_row);
-    if (rests.within(band.bound)) return true;
-    const f32 greatest = rests.greatest();
-    if (!(greatest > 0x1p-30f && greatest < 0x1p30f)) return false;
-    const f32 before = band.bound;
-    for (band.bound = 0x1p-30f; band.bound < greatest;) band.bound *= 2;
-    return band.bound != before && rests_of(first_row, end_row).within(band.bound);
-  }
-  // The strip from a source row to another, if it can be made so.
-  HWY_INLINE bool run_exactly(i64 first, i64 end) {
-    if (!band.exact.possible) return false;
-    // Strips resemble the last one: what that allowed is not looked at before, but on the way.
-    for (i32 turn = 0; turn < 2; ++turn) {
-      if (band.doubtful && !find_bound(first, end)) return false;
-      i64 r = first;
-      while (r < end && meet_exactly(r)) ++r;
-      band.doubtful = r < end;
-      if (!band.doubtful) return true;
-    }
-    return false;
-  }
-
-  struct Target {
-    f32 *upper, *lower;  // sums
-    f32* out;
-    i32 kind;
-    bool begins, ends;
-  };
-  // The destination rows that source row r meets, by kinds of kernel rows; their count.
-  HWY_INLINE i32 find_targets(i64 r, Target* targets) const {
-    i32 count = 0;
-    for (i32 k = 0; k < band.exact.kind_count; ++k)
-      for (i32 i = band.exact.kinds[k].first_row; i < band.exact.kinds[k].end_row; ++i) {
-        const i32 v = band.exact.order[i];
-        const i64 y = r - v + band.kernel.height / 2;
-        if (y < band.first || y >= band.end) continue;
-        const KernelRows met = kernel_rows_at(band.kernel, static_cast<i32>(y));
-        f32* const sums = band.exact.sums + y % band.kernel.height * band.exact.sums_place;
-        f32* const out = reinterpret_cast<f32*>(band.dst + (y - band.first) * band.dst_row_bytes) + 4 * left;
-        targets[count++] = {sums, sums + 4 * band.strip, out, k, v == met.first, v == met.end - 1};
-      }
-    return count;
-  }
-  HWY_INLINE void carry_block(const Target& to, i64 c, const Numbers* upper, const Numbers* lower) const {
-    const Single d;
-    Numbers sums[2 * single_vectors];
-    for (i32 i = 0; i < single_vectors; ++i) {
-      // From 0 on, for -0 alone is 0 as a sum.
-      const i64 at = c + i * singles;
-      sums[i] = hn::Add(to.begins ? hn::Zero(d) : hn::Load(d, to.upper + at), upper[i]);
-      sums[single_vectors + i] = hn::Add(to.begins ? hn::Zero(d) : hn::Load(d, to.lower + at), lower[i]);
-    }
-    if (!to.ends) {
-      for (i32 i = 0; i < single_vectors; ++i) {
-        hn::Store(sums[i], d, to.upper + c + i * singles);
-        hn::Store(sums[single_vectors + i], d, to.lower + c + i * singles);
-      }
-      return;
-    }
-    const i64 inside = 4 * (band.pixels - left) - c;
-    f32 rest[singles * single_vectors];
-    f32* const out = inside < singles * single_vectors ? rest : to.out + c;
-    for (i32 i = 0; i < single_vectors; ++i) sums[i] = hn::Add(sums[i], sums[single_vectors + i]);
-    if (HWY_NATIVE_FMA && band.exact.short_quotients) {
-      const auto by = hn::LoadDup128(d, band.exact.reciprocals[0]),
-                 rest_by = hn::LoadDup128(d, band.exact.reciprocals[1]);
-      for (i32 i = 0; i < single_vectors; ++i)
-        hn::StoreU(hn::MulAdd(sums[i], by, hn::Mul(sums[i], rest_by)), d, out + i * singles);
-    } else {
-      const auto divisor = hn::LoadDup128(d, band.divisors);
-      for (i32 i = 0; i < single_vectors; ++i) hn::StoreU(hn::Div(sums[i], divisor), d, out + i * singles);
-    }
-    if (out == rest) std::copy(rest, rest + std::max<i64>(inside, 0), to.out + c);
-  }
-  // Like meet(), where sums are exact; false, with the rest to be made otherwise, where they turn out not to be.
-  HWY_INLINE bool meet_exactly(i64 r) const {
-    const Single d;
-    const FloatBand::Exact& exact = band.exact;
-    const i64 count = 4 * (part * halves + 2 * reach()), place = exact.samples_place;
-    f32* const upper = exact.samples;
-    f32* const lower = upper + place;
-    f32* const pairs = lower + place;
-    {
-      const f32* const samples = samples_of(r);
-      const auto magic = hn::Set(d, 0x1.8p23f * exact.split * band.bound);
-      Rests rests(exact.quantum * band.bound);
-      const auto split = [&](i64 c) HWY_ATTR {
-        const auto v = hn::LoadU(d, samples + c);
-        rests.look(v);
-        const auto high = hn::Sub(hn::Add(v, magic), magic);
-        hn::StoreU(high, d, upper + c);
-        hn::StoreU(hn::Sub(v, high), d, lower + c);
-      };
-      i64 c = 0;
-      for (; c + singles <= count; c += singles) split(c);
-      if (c < count) split(count - singles);
-      if (!rests.within(band.bound)) return false;
-    }
-    const i64 all = 4 * part * halves, opposite = 8 * reach(), pair_terms = exact.mirrored ? reach() : 0;
-    Target targets[largest_banded_side];
-    const i32 target_count = find_targets(r, targets);
-    for (i64 c = 0; c < all; c += singles * single_vectors) {
-      for (i64 t = 0; t < pair_terms; ++t)
-        for (const f32* const half : {upper, lower}) {
-          f32* const to = pairs + (2 * t + (half == lower)) * place + c;
-          for (i32 i = 0; i < single_vectors * singles; i += singles)
-            hn::StoreU(hn::Add(hn::LoadU(d, half + c + i + 4 * t), hn::LoadU(d, half + c + i + opposite - 4 * t)), d,
-                       to + i);
-        }
-      for (i32 i = 0; i < target_count;) {
-        const i32 kind = targets[i].kind;
-        const f32* w = exact.weights + 4 * kind * exact.terms;
-        Numbers high[single_vectors], low[single_vectors];
-        for (i32 j = 0; j < single_vectors; ++j) high[j] = low[j] = hn::Zero(d);
-        const auto add_term = [&](const f32* from_upper, const f32* from_lower) HWY_ATTR {
-          const auto weight = hn::LoadDup128(d, w);
-          for (i32 j = 0; j < single_vectors; ++j) {
-            high[j] = hn::MulAdd(weight, hn::LoadU(d, from_upper + j * singles), high[j]);
-            low[j] = hn::MulAdd(weight, hn::LoadU(d, from_lower + j * singles), low[j]);
-          }
-          w += 4;
-        };
-        for (i64 t = 0; t < pair_terms; ++t) add_term(pairs + 2 * t * place + c, pairs + (2 * t + 1) * place + c);
-        for (i64 t = pair_terms; t < exact.terms; ++t) add_term(upper + 4 * t + c, lower + 4 * t + c);
-        for (; i < target_count && targets[i].kind == kind; ++i) carry_block(targets[i], c, high, low);
-      }
-    }
-    return true;
-  }
-
   HWY_INLINE void run() {
     const i64 half = band.kernel.height / 2;
     const i64 first = std::max<i64>(band.first - half, 0), end = std::min<i64>(band.end + half, band.kernel.src_height);
-    for (; left < band.pixels; left += band.strip) {
-      const i64 wide = std::min<i64>(band.strip, band.pixels - left);
+    for (; strip.left < band.pixels; strip.left += band.strip) {
+      const i64 wide = std::min<i64>(band.strip, band.pixels - strip.left);
       part = (wide + halves * pixels_of_block - 1) / (halves * pixels_of_block) * pixels_of_block;
-      if (run_exactly(first, end)) continue;
+      strip.pixels = part * halves;
+      if (ExactLanes{strip}.run(first, end)) continue;
       for (i64 r = first; r < end; ++r) meet(r);
     }
+    if (band.streams) hwy::FlushStream();
   }
 };
 
-void run_band(FloatBand& band) { BandLanes{band}.run(); }
+void run_band(FloatBand& band) { BandLanes{{band}}.run(); }
 FloatBandLanes float_band() { return {&run_band, BandLanes::halves}; }
 
 }  // namespace HWY_NAMESPACE
