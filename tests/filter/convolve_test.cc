@@ -176,8 +176,9 @@ TEST_F(Filters, ConvolutionsOfMultiples) {
             taps[k][static_cast<size_t>(i)] = taps[k][static_cast<size_t>((rows - 1 - i / side) * side + i % side)];
         }
       }
-      // All spots in small multiples, some in the others.
-      for (size_t turn = 0; turn < std::size(spots) + 2 * std::size(samples) - 2; ++turn) {
+      // All spots in small multiples, some in the others, which larger kernels do not tell apart.
+      const size_t turns = std::size(spots) + (side > 7 ? 0 : 2 * std::size(samples) - 2);
+      for (size_t turn = 0; turn < turns; ++turn) {
         const bool small = turn < std::size(spots);
         const Samples& of = samples[small ? 0 : 1 + (turn - std::size(spots)) / 2];
         const auto& places = spots[small ? turn : 2 * ((turn - std::size(spots)) % 2)];
@@ -190,8 +191,11 @@ TEST_F(Filters, ConvolutionsOfMultiples) {
           for (i32 x = 0; x < 300; ++x) src.at(x, y) = {channel(), channel(), channel(), y < 40 ? 0 : -channel()};
         }
         for (const Spot& spot : places) src.at(spot.x, spot.y).green = spot.value;
-        ASSERT_EQ(ZR_Convolve(nullptr, src, nullptr, kernel.flags, side, taps[0].data(), taps[1].data(), taps[2].data(),
-                              taps[3].data(), made),
+        // A host that is asked after each row gets rows that were made before.
+        ZR_ProgressInfo asking{};
+        asking.progress = [](void*, i32, i32) -> i32 { return 0; };
+        ASSERT_EQ(ZR_Convolve(turn % 2 == 0 ? nullptr : &asking, src, nullptr, kernel.flags, side, taps[0].data(),
+                              taps[1].data(), taps[2].data(), taps[3].data(), made),
                   0);
         model_convolve(src, kernel.flags, side, taps, expected);
         ASSERT_TRUE(made == expected) << Instructions::names[level] << " size " << side << " taps from " << kernel.low

@@ -161,12 +161,12 @@ class LaneTaps {
   LaneConvolution<T> work_ = {};
 };
 
-// Rows of a destination from the first on: one at a time where the host is asked after each, else as it is fastest.
+// Rows of a destination from the first on: where the host is asked after each, those that follow stay as they were.
 template <class T>
 class RowsInTurn {
  public:
   RowsInTurn(const Convolution<T>& c, const ZR_LayerDef& dst, bool one_by_one) : dst_(dst), one_by_one_(one_by_one) {
-    if constexpr (banded) bands_.emplace(c, dst);
+    if constexpr (banded) bands_.emplace(c, dst, one_by_one);
     if (!banded || !*bands_) rows_.emplace(c);
   }
   void make(i32 y) {
@@ -175,9 +175,10 @@ class RowsInTurn {
       return rows_->row(y, dst_.width, reinterpret_cast<T*>(row));
     }
     if constexpr (banded) {
-      if (y < made_) return;
-      made_ = one_by_one_ ? y + 1 : dst_.height;
-      bands_->make(y, made_);
+      if (one_by_one_)
+        bands_->make_next(y);
+      else if (y == 0)
+        bands_->make_all();
     }
   }
 
@@ -187,7 +188,6 @@ class RowsInTurn {
   bool one_by_one_;
   std::optional<FloatBands> bands_;
   std::optional<LaneTaps<T>> rows_;
-  i32 made_ = 0;
 };
 
 template <class T>

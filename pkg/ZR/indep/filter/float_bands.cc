@@ -21,6 +21,7 @@ constexpr i32 most_shared = 12;  // products for all rows, before each kind of r
 constexpr i32 least_strip = 32;
 constexpr i64 near_memory = 44 * 1024;  // that processors keep closest, with some to spare
 constexpr i32 least_rows = 128;         // of a band
+constexpr i32 kept_rows = 32;
 constexpr i64 pixel_bytes = 4 * sizeof(f64);
 
 // Pieces of memory; of none it only finds the size.
@@ -290,36 +291,56 @@ class Plan {
 
 }  // namespace
 
-FloatBands::FloatBands(const Convolution<ZR_PixelFloat>& c, const ZR_LayerDef& dst) : dst_(dst) {
+FloatBands::FloatBands(const Convolution<ZR_PixelFloat>& c, const ZR_LayerDef& dst, bool kept) : dst_(dst) {
   const FloatBandLanes lanes = lane_float_band();
   run_ = lanes.run;
   if (run_ == nullptr || c.width > largest_banded_side || c.height > largest_banded_side) return;
-  const u64 bytes = static_cast<u64>(Plan(c, lanes.halves, nullptr).bytes());
-  memory_ = static_cast<char*>(HB_AllocatePtr(bytes + 64, HB_ZLookupLStrCache(ZR_G_zref, ZR_Str_BlurMemory, 0, 0),
+  constexpr u64 line = 64;
+  const u64 plan_bytes = (static_cast<u64>(Plan(c, lanes.halves, nullptr).bytes()) + line - 1) / line * line;
+  const u64 kept_bytes = kept && dst.width > 0 ? kept_rows * static_cast<u64>(row_bytes()) : 0;
+  memory_ = static_cast<char*>(HB_AllocatePtr(plan_bytes + kept_bytes + line,
+                                              HB_ZLookupLStrCache(ZR_G_zref, ZR_Str_BlurMemory, 0, 0),
                                               ZR_ModuleCode | ZR_Site_Convolve));
   if (memory_ == nullptr) fail(ZR_Err_OutOfMemory);
-  Plan(c, lanes.halves, memory_ + (64 - reinterpret_cast<std::uintptr_t>(memory_) % 64) % 64).fill(&band_);
+  char* const first = memory_ + (line - reinterpret_cast<std::uintptr_t>(memory_) % line) % line;
+  Plan(c, lanes.halves, first).fill(&band_);
+  kept_ = first + plan_bytes;
   band_.pixels = dst.width;
-  band_.dst_row_bytes = dst.row_bytes;
-  band_.streams = i64{dst.width} * dst.height * static_cast<i64>(sizeof(ZR_PixelFloat)) >= streamed_bytes;
 }
 FloatBands::~FloatBands() { HB_FreePtr(memory_); }
 
-void FloatBands::make(i32 first, i32 end) {
+void FloatBands::make_all() {
+  band_.dst_row_bytes = dst_.row_bytes;
+  band_.streams = row_bytes() * dst_.height >= streamed_bytes;
+  make(0, dst_.height, static_cast<char*>(dst_.data));
+}
+void FloatBands::make_next(i32 y) {
+  if (dst_.width <= 0) return;
+  if (y >= kept_end_) {
+    kept_first_ = y;
+    kept_end_ = std::min(y + kept_rows, dst_.height);
+    band_.dst_row_bytes = row_bytes();
+    make(kept_first_, kept_end_, kept_);
+  }
+  std::memcpy(row(y), kept_ + (y - kept_first_) * row_bytes(), static_cast<std::size_t>(row_bytes()));
+}
+
+// Rows first..end-1, to memory whose rows lie as band_ says.
+void FloatBands::make(i32 first, i32 end, char* rows) {
   // Rows further down meet no source.
   const i64 below = i64{band_.kernel.src_height} + band_.kernel.height / 2;
   const i32 met = band_.kernel.src_height > 0 ? static_cast<i32>(std::clamp<i64>(below, first, end)) : first;
+  const auto at = [&](i32 y) { return rows + (y - first) * band_.dst_row_bytes; };
   // Few enough that what they read twice stays near.
   const i32 rows_of_band = std::max(least_rows, 4 * band_.kernel.height);
-  const auto row = [&](i32 y) { return static_cast<char*>(dst_.data) + i64{y} * dst_.row_bytes; };
   for (i32 y = first; y < met && dst_.width > 0; y = band_.end) {
     band_.first = y;
     band_.end = std::min(y + rows_of_band, met);
-    band_.dst = row(y);
+    band_.dst = at(y);
     run_(band_);
   }
   for (i32 y = met; y < end; ++y)
-    convolve_pixels(band_.kernel, y, 0, dst_.width, reinterpret_cast<ZR_PixelFloat*>(row(y)));
+    convolve_pixels(band_.kernel, y, 0, dst_.width, reinterpret_cast<ZR_PixelFloat*>(at(y)));
 }
 
 }  // namespace zr

@@ -95,19 +95,28 @@ FloatBandLanes lane_float_band();
 // The plan of a call, and the memory it takes. There is none without lanes, and for kernels that are too large.
 class FloatBands {
  public:
-  FloatBands(const Convolution<ZR_PixelFloat>& c, const ZR_LayerDef& dst);
+  // With `kept`, rows can be made apart from the destination.
+  FloatBands(const Convolution<ZR_PixelFloat>& c, const ZR_LayerDef& dst, bool kept);
   ~FloatBands();
   FloatBands(const FloatBands&) = delete;
   FloatBands& operator=(const FloatBands&) = delete;
   explicit operator bool() const { return memory_ != nullptr; }
-  // Rows first..end-1 of the destination.
-  void make(i32 first, i32 end);
+  // All rows of the destination.
+  void make_all();
+  // Row y alone, those before having been made; rows that follow are made with it, and kept.
+  void make_next(i32 y);
 
  private:
+  void make(i32 first, i32 end, char* rows);
+  i64 row_bytes() const { return i64{dst_.width} * static_cast<i64>(sizeof(ZR_PixelFloat)); }
+  char* row(i32 y) const { return static_cast<char*>(dst_.data) + i64{y} * dst_.row_bytes; }
+
   const ZR_LayerDef& dst_;
   char* memory_ = nullptr;
   void (*run_)(FloatBand&);
   FloatBand band_ = {};
+  char* kept_ = nullptr;
+  i32 kept_first_ = 0, kept_end_ = 0;
 };
 
 }  // namespace zr

@@ -206,7 +206,8 @@ class ExactLanes {
   // What the next source row has for the strip: rows are too far apart for processors to see them coming.
   HWY_INLINE const f32* fetched_after(i64 r) const {
     const i64 row = std::min<i64>(r + rows_ahead, band_.kernel.src_height - 1);
-    return reinterpret_cast<const f32*>(band_.kernel.source_row(row)) + 4 * std::max<i64>(strip_.left - strip_.reach(), 0);
+    return reinterpret_cast<const f32*>(band_.kernel.source_row(row)) +
+           4 * std::max<i64>(strip_.left - strip_.reach(), 0);
   }
   // Calls each(c) for the samples of a row of the strip with those that taps reach, a vector at a time; the last may
   // overlap the one before.
@@ -291,8 +292,7 @@ class ExactLanes {
         add_terms<weighted>(lines[k], c, upper, lower);
         for (i32 i = lines[k].first_row; i < lines[k].end_row; ++i) {
           const i32 v = band_.exact.order[i];
-          for (i32 j = 0; j < vectors; ++j)
-            carry(targets, v, band_.kernel.height, c + j * lanes, upper[j], lower[j]);
+          for (i32 j = 0; j < vectors; ++j) carry(targets, v, band_.kernel.height, c + j * lanes, upper[j], lower[j]);
         }
       }
   }

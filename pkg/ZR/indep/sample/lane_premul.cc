@@ -137,14 +137,5 @@ HWY_AFTER_NAMESPACE();
 #endif
 
 #if HWY_ONCE
-#include "simd/variant.h"
-
-namespace zr {
-
-const LanePremul* lane_premul_samples() {
-  ZR_RETURN_BEST(premul_samples());
-  return nullptr;
-}
-
-}  // namespace zr
+ZR_LANE_CHOICE(const LanePremul*, premul_samples)
 #endif
