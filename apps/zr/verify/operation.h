@@ -6,7 +6,7 @@
 #include <vector>
 
 #include "verify/digest.h"
-#include "verify/pictures.h"
+#include "verify/canvas.h"
 
 namespace zr::tool {
 

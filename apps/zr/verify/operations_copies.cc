@@ -18,9 +18,9 @@ constexpr Scale kScales[] = {{{0, 0, 131, 31}, {0, 0, 131, 31}},   {{3, 2, 40, 1
 using CopyFunc = i32 (*)(const ZR_ProgressInfo*, ZR_LayerDef*, ZR_LayerDef*, const GX_LRect*, const GX_LRect*);
 template <class From, class To>
 void copies(Digest& digest, CopyFunc function, Content content, std::span<const Scale> scales) {
-  Picture<From> src(odd_width, kHeight, content, 50);
+  Canvas<From> src(odd_width, kHeight, content, 50);
   for (const Scale& scale : scales) {
-    Picture<To> dst(odd_width, kHeight, Content::untouched);
+    Canvas<To> dst(odd_width, kHeight, Content::untouched);
     digest.number(function(nullptr, &src, &dst, &scale.from, &scale.to));
     dst.digest(digest);
   }
@@ -76,11 +76,11 @@ void add_copy_operations(Operations& list) {
     copies<T, ZR_Pixel8>(digest, &ZR_CopyBits_HQ_Straight, content, all.first(1));
   });
   add_all_with_hostile(list, "matrix-copy", []<class T>(Digest& digest, Content content) {
-    Picture<T> src(odd_width, kHeight, content, 52);
+    Canvas<T> src(odd_width, kHeight, content, 52);
     const GX_LRect clip{9, 3, 90, 28};
     for (const GX_Matrix3& matrix : kMatrices)
       for (const bool src2dst : {false, true}) {
-        Picture<T> dst(odd_width, kHeight, Content::untouched);
+        Canvas<T> dst(odd_width, kHeight, Content::untouched);
         digest.number(ZR_CopyBits3_LO_Straight(nullptr, &src, &matrix, src2dst, src2dst ? nullptr : &clip, &dst));
         dst.digest(digest);
       }

@@ -35,7 +35,7 @@ constexpr MeasureFuncs<ZR_PixelFloat> kMeasuresFloat = {
 
 template <class T>
 void measure(Digest& digest, const MeasureFuncs<T>& functions, Content content) {
-  Picture<T> src(odd_width, 9, content, 21), back(odd_width, 9, content, 22);
+  Canvas<T> src(odd_width, 9, content, 21), back(odd_width, 9, content, 22);
   for (i32 y = 0; y < 9; ++y)
     for (i32 x = 0; x < odd_width; ++x) {
       const T& pixel = *src->At(x, y);
@@ -60,7 +60,7 @@ void measure(Digest& digest, const MeasureFuncs<T>& functions, Content content) 
 void guesses(Digest& digest) {
   for (const Content content : {Content::mixed, Content::opaque, Content::noise, Content::premul, Content::untouched})
     for (const i32 height : {1, 25}) {
-      Picture<ZR_Pixel8> world(odd_width, height, content, 23);
+      Canvas<ZR_Pixel8> world(odd_width, height, content, 23);
       i32 code = -1;
       ZR_Pixel8 matte{};
       digest.number(ZR_GuessAlpha(nullptr, &world, nullptr, &code, &matte));
@@ -72,11 +72,11 @@ void guesses(Digest& digest) {
 void matte_family(Digest& digest) {
   for (i32 (*const row)(void*, i32, ZR_Pixel8*) :
        {ZR_BlackMatteARGB, ZR_DeBlackMatteARGB, ZR_BlackMatteBGRA, ZR_DeBlackMatteBGRA}) {
-    Picture<ZR_Pixel8> world(odd_width, 9, Content::mixed, 24);
+    Canvas<ZR_Pixel8> world(odd_width, 9, Content::mixed, 24);
     for (i32 y = 0; y < 9; ++y) digest.number(row(nullptr, odd_width, world->Row(y)));
     world.digest(digest);
   }
-  Picture<ZR_Pixel8> src(odd_width, 9, Content::mixed, 25), dst(odd_width, 9, Content::untouched);
+  Canvas<ZR_Pixel8> src(odd_width, 9, Content::mixed, 25), dst(odd_width, 9, Content::untouched);
   for (auto* const row : {ZR_BlackMatte, ZR_DeBlackMatte}) {
     for (i32 y = 0; y < 9; ++y) digest.number(row(nullptr, odd_width, src->Row(y), dst->Row(y)));
     dst.digest(digest);
@@ -93,7 +93,7 @@ void planes(Digest& digest) {
   void* block[ZR_CallbackEntryCount];
   digest.number(ZR_GetCallbackBlock(ZR_Quality_Best, 0, block));
   const auto dispose = reinterpret_cast<ZR_HandleDisposeFunc>(block[ZR_Entry_handle_dispose]);
-  Picture<ZR_Pixel8> src(odd_width, 5, Content::noise, 26), dst(odd_width, 5, Content::untouched);
+  Canvas<ZR_Pixel8> src(odd_width, 5, Content::noise, 26), dst(odd_width, 5, Content::untouched);
   for (u32 mask = 0; mask < 16; ++mask) {
     void** handle = nullptr;
     i32 row_bytes = 0;
@@ -110,7 +110,7 @@ void planes(Digest& digest) {
 
 template <class T>
 void lines_and_outlines(Digest& digest, Content content) {
-  Picture<T> world(odd_width, 43, content, 27);
+  Canvas<T> world(odd_width, 43, content, 27);
   for (const i32 step : {1, 3}) {
     ZR_Wireframe frame{};
     digest.number(
@@ -137,7 +137,7 @@ void spots(Digest& digest) {
   Random random(29);
   std::vector<u32> weights(15 * 15);
   for (u32& weight : weights) weight = random.below(256);
-  Picture<ZR_Pixel8> world(odd_width, 25, Content::noise, 30);
+  Canvas<ZR_Pixel8> world(odd_width, 25, Content::noise, 30);
   for (const u32 flags : {0u, 1u, 33u})
     for (i32 i = -6; i < 30; ++i)
       digest.number(ZR_PaintSpot(nullptr, i * 5, i, flags, 1 + 2 * (i & 7), weights.data(),
@@ -147,8 +147,8 @@ void spots(Digest& digest) {
 
 template <class T>
 void viewer(Digest& digest, Content content) {
-  Picture<T> src(odd_width, 43, content, 31);
-  Picture<ZR_Pixel8> dst(odd_width, 43, Content::untouched);
+  Canvas<T> src(odd_width, 43, content, 31);
+  Canvas<ZR_Pixel8> dst(odd_width, 43, Content::untouched);
   const ZR_PixelFloat grey = {0.5f, 0.4f, 0.4f, 0.4f}, pale = {0.75f, 0.9f, 0.7f, 0.5f}, black = {1, 0, 0, 0};
   for (const ZR_SpecialCaseBlitStyle style : {ZR_BlitStyle_Flat, ZR_BlitStyle_Checker, ZR_BlitStyle_Tint})
     for (const bool reverse : {false, true})

@@ -16,8 +16,8 @@ void blurs(Digest& digest, f32 radius, u32 iterations, Content content) {
   for (u32 form = 0; form < 16; ++form) {
     const u32 flags = form % 5 == 4 ? 14 : form % 3 == 1 ? 31 : form % 7 == 5 ? 1 : 15;
     const bool down = (form & 1) != 0, premultiplied = (form & 2) != 0;
-    Picture<T> src(odd_width, kHeight, premultiplied ? premul_of(content) : content, 70);
-    Picture<T> dst(odd_width - 4, kHeight + 3, Content::untouched);
+    Canvas<T> src(odd_width, kHeight, premultiplied ? premul_of(content) : content, 70);
+    Canvas<T> dst(odd_width - 4, kHeight + 3, Content::untouched);
     src->origin = {2, -1};
     i32 error = 0;
     try {
@@ -44,7 +44,7 @@ std::vector<i32> noise_taps(i32 count, i32 limit, u64 seed) {
 
 template <class T>
 void convolve(Digest& digest, i32 size, u32 flags, i32 limit, Content content) {
-  Picture<T> src(odd_width, kHeight, content, 71), dst(odd_width, kHeight, Content::untouched);
+  Canvas<T> src(odd_width, kHeight, content, 71), dst(odd_width, kHeight, Content::untouched);
   const i32 count = (flags & ZR_ConvolveFlag_1D) != 0 ? size : size * size;
   std::array<std::vector<i32>, 4> kernels;
   for (u32 k = 0; k < 4; ++k) kernels[k] = noise_taps(count, limit, 72 + k);

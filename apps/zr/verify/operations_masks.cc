@@ -14,7 +14,7 @@ template <class T>
 class MaskOf {
  public:
   MaskOf(i32 width, i32 height, Content content, u64 seed) : buffer_(width, height, static_cast<i32>(Depth<T>::bits)) {
-    Picture<T> picture(width, height, content, seed);
+    Canvas<T> picture(width, height, content, seed);
     for (i32 y = 0; y < height; ++y)
       for (i32 x = 0; x < width; ++x) values()[y * width + x] = picture->At(x, y)->alpha;
   }
@@ -56,7 +56,7 @@ template <class T, class M>
 void merge(Digest& digest, Content content) {
   MaskOf<M> mask(odd_width - 31, 300, content, 26);
   const GX_LRect clip = {4, 2, 90, 250}, area = {1, 3, 130, 200};
-  Picture<T> world(odd_width, 310, content, 27), clipped(odd_width, 310, content, 28);
+  Canvas<T> world(odd_width, 310, content, 27), clipped(odd_width, 310, content, 28);
   ZR_MergeMaskAlpha(nullptr, 7, -5, nullptr, &mask, nullptr, &world);
   ZR_MergeMaskAlpha(nullptr, -3, 20, &clip, &mask, &area, &clipped);
   world.digest(digest);
@@ -126,7 +126,7 @@ void add_mask_operations(Operations& list) {
   });
   add_all_with_hostile(list, "mask-blend", []<class T>(Digest& digest, Content content) {
     MaskOf<T> mask(odd_width, 1, content, 37);
-    Picture<T> row(odd_width, 1, content, 38);
+    Canvas<T> row(odd_width, 1, content, 38);
     using C = Channel<T>;
     for (const f32 part : {0.0f, 0.3f, 1.0f}) {
       const C target = static_cast<C>(part * static_cast<f32>(Depth<T>::white));

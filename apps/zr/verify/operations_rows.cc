@@ -15,10 +15,10 @@ const T kMattes[] = {convert_colour<T>(ZR_PixelFloat{1, 0, 0, 0}), convert_colou
 
 template <class T>
 void premul_colour(Digest& digest, i32 forward, Content content) {
-  Picture<T> src(odd_width, 25, content, 4);
+  Canvas<T> src(odd_width, 25, content, 4);
   const GX_LRect part{5, 3, 99, 20};
   for (const T& colour : kMattes<T>) {
-    Picture<T> dst(odd_width, 25, Content::untouched);
+    Canvas<T> dst(odd_width, 25, Content::untouched);
     digest.number(
         pick<T>(&ZR_PremulColor, &ZR_PremulColor16, &ZR_PremulColorFloat)(nullptr, &src, &colour, forward, &dst));
     if constexpr (std::is_same_v<T, ZR_Pixel16>)
@@ -33,7 +33,7 @@ void premul_colour(Digest& digest, i32 forward, Content content) {
 using BlendFunc = i32 (*)(const ZR_ProgressInfo*, ZR_LayerDef*, ZR_LayerDef*, i32, ZR_LayerDef*);
 template <class T>
 void blend(Digest& digest, BlendFunc function, Content content) {
-  Picture<T> one(odd_width, 17, content, 5), other(odd_width, 17, content, 6), dst(odd_width, 17, Content::untouched);
+  Canvas<T> one(odd_width, 17, content, 5), other(odd_width, 17, content, 6), dst(odd_width, 17, Content::untouched);
   for (const i32 ratio : {0, 1, 0x5555, 0x8000, 0xc123, 0xffff, 0x10000}) {
     digest.number(function(nullptr, &one, &other, ratio, &dst));
     dst.digest(digest);
@@ -42,9 +42,9 @@ void blend(Digest& digest, BlendFunc function, Content content) {
 
 using CompositeFunc = decltype(&ZR_CompositeRectDraft_Straight);
 void composite_behind(Digest& digest, CompositeFunc function, Content content) {
-  Picture<ZR_Pixel8> src(odd_width, 21, content, 7);
+  Canvas<ZR_Pixel8> src(odd_width, 21, content, 7);
   for (const u8 opacity : {u8{255}, u8{254}, u8{100}, u8{0}}) {
-    Picture<ZR_Pixel8> dst(odd_width + 9, 29, content, 8);
+    Canvas<ZR_Pixel8> dst(odd_width + 9, 29, content, 8);
     const GX_LRect part{3, 2, 120, 17};
     for (const i32 field : {0, 1, 2}) {
       digest.number(function(nullptr, nullptr, opacity, &src, 5, 4, field, 0, &dst));
@@ -73,7 +73,7 @@ void byte_tables(Digest& digest) {
   u8 tables[4][256];
   for (auto& table : tables)
     for (u8& entry : table) entry = static_cast<u8>(random.below(256));
-  Picture<ZR_Pixel8> src(odd_width, 43, Content::mixed, 9), dst(odd_width, 43, Content::untouched);
+  Canvas<ZR_Pixel8> src(odd_width, 43, Content::mixed, 9), dst(odd_width, 43, Content::untouched);
   const GX_LRect part{3, 2, 100, 40};
   const auto walk = [&](ZR_LayerDef* from, const GX_LRect* area, int without) {
     const u8* used[4];
@@ -88,7 +88,7 @@ void byte_tables(Digest& digest) {
 
 template <class T>
 void matte_rows(Digest& digest, Content content) {
-  Picture<T> src(odd_width, 4, content, 10);
+  Canvas<T> src(odd_width, 4, content, 10);
   std::vector<T> out(96);
   for (u32 kind = 0; kind < 4; ++kind)
     for (const i32 offset : {-40, -1, 0, 7, 95, 200}) {
@@ -103,14 +103,14 @@ void matte_rows(Digest& digest, Content content) {
 
 void add_row_operations(Operations& list) {
   add_all_with_hostile(list, "premultiply", []<class T>(Digest& digest, Content content) {
-    Picture<T> world(odd_width, kBandedHeight, content, 4);
+    Canvas<T> world(odd_width, kBandedHeight, content, 4);
     const GX_LRect part{3, 20, 90, 25};
     digest.number(ZR_Premul(nullptr, kForward, &world));
     digest.number(ZR_PremulRect(nullptr, kForward, &part, &world));
     world.digest(digest);
   });
   add_all_with_hostile(list, "unmultiply", []<class T>(Digest& digest, Content content) {
-    Picture<T> world(odd_width, kBandedHeight, content, 5), premul(odd_width, 30, premul_of(content), 6);
+    Canvas<T> world(odd_width, kBandedHeight, content, 5), premul(odd_width, 30, premul_of(content), 6);
     digest.number(ZR_Premul(nullptr, kBack, &world));
     world.digest(digest);
     const GX_LRect part{3, 20, 90, 25};
@@ -120,7 +120,7 @@ void add_row_operations(Operations& list) {
     premul.digest(digest);
   });
   add_with_hostile<ZR_Pixel8, ZR_Pixel16>(list, "premultiply-world", []<class T>(Digest& digest, Content content) {
-    Picture<T> world(odd_width, 25, content, 4);
+    Canvas<T> world(odd_width, 25, content, 4);
     world->Premultiply();
     world.digest(digest);
     world->Unmultiply();
@@ -144,7 +144,7 @@ void add_row_operations(Operations& list) {
     composite_behind(digest, &ZR_CompositeRectBest_Premul, Content::premul);
   });
   add_all(list, "iterate", []<class T>(Digest& digest) {
-    Picture<T> src(odd_width, 25, Content::mixed, 7), dst(odd_width, 25, Content::noise, 8);
+    Canvas<T> src(odd_width, 25, Content::mixed, 7), dst(odd_width, 25, Content::noise, 8);
     const GX_LRect part{-3, 4, 77, 19};
     u32 calls = 0;
     digest.number(ZR_Iterate(nullptr, 0, 0, &src, nullptr, &calls, &weave<T>, &dst));
@@ -153,7 +153,7 @@ void add_row_operations(Operations& list) {
     dst.digest(digest);
   });
   add_all(list, "iterate-origin", []<class T>(Digest& digest) {
-    Picture<T> src(odd_width, 25, Content::mixed, 7), dst(odd_width, 25, Content::noise, 8);
+    Canvas<T> src(odd_width, 25, Content::mixed, 7), dst(odd_width, 25, Content::noise, 8);
     u32 calls = 0;
     for (const GX_LPoint origin : {GX_LPoint{0, 0}, GX_LPoint{7, 3}, GX_LPoint{-9, -5}})
       digest.number(ZR_IterateOrigin(nullptr, 0, 0, &src, nullptr, &origin, &calls, &weave<T>, &dst));

@@ -39,7 +39,7 @@ ZR_SampPB params_of(ZR_LayerDef* src, i32 x_radius = 0, i32 y_radius = 0) {
 // Calls body(position, params, one) for the positions and digests each result.
 template <class T, class Body>
 void at_positions(Digest& digest, i32 margin, Content content, Body body) {
-  Picture<T> src(kWidth, kHeight, content, 30);
+  Canvas<T> src(kWidth, kHeight, content, 30);
   const ZR_SampPB params = params_of(&src);
   Random random(31);
   std::vector<T> results(kPositions);
@@ -86,7 +86,7 @@ void translates(Digest& digest, Translate<T> sample, Content content) {
 
 template <class T>
 void spans(Digest& digest, Span<T> sample, Content content) {
-  Picture<T> src(kWidth, kHeight, content, 32);
+  Canvas<T> src(kWidth, kHeight, content, 32);
   const ZR_SampPB params = params_of(&src);
   Random random(33);
   for (i32 i = 0; i < 150; ++i) {
@@ -112,7 +112,7 @@ void boxes(Digest& digest, Point<T> sample, Content content) {
   };
   constexpr Radii radii[] = {{kOne / 2, kOne / 2}, {kOne, kOne},         {kOne / 4, 3 * kOne}, {5 * kOne / 2, kOne / 3},
                              {0x19a3b, 0x2c0f1},   {9 * kOne, 7 * kOne}, {kOne / 3, kOne / 5}};
-  Picture<T> src(kWidth, kHeight, content, 34);
+  Canvas<T> src(kWidth, kHeight, content, 34);
   Random random(35);
   for (const Radii& radius : radii) {
     const ZR_SampPB params = params_of(&src, radius.x, radius.y);
@@ -126,7 +126,7 @@ void boxes(Digest& digest, Point<T> sample, Content content) {
 }
 
 void four_at_once(Digest& digest) {
-  Picture<ZR_Pixel8> src(kWidth, kHeight, Content::mixed, 36);
+  Canvas<ZR_Pixel8> src(kWidth, kHeight, Content::mixed, 36);
   const ZR_SampPB params = params_of(&src);
   Random random(37);
   for (i32 i = 0; i < 500; ++i) {
@@ -163,7 +163,7 @@ void table_means(Digest& digest, const ZR_SummedAreaTable& table, const Entry* e
 
 template <class T>
 void summed_area(Digest& digest, Content content) {
-  Picture<T> src(kWidth, kHeight, content, 38);
+  Canvas<T> src(kWidth, kHeight, content, 38);
   const size_t channels = static_cast<size_t>(kWidth) * kHeight * 4;
   for (const bool use_double : {false, true}) {
     const ZR_SummedAreaTable table(&src, use_double);
@@ -254,7 +254,7 @@ void add_sample_operations(Operations& list) {
   add_all_with_hostile(list, "summed-area",
                        []<class T>(Digest& digest, Content content) { summed_area<T>(digest, content); });
   add_all_with_hostile(list, "horizontal-sums", []<class T>(Digest& digest, Content content) {
-    Picture<T> src(kWidth, kHeight, content, 40);
+    Canvas<T> src(kWidth, kHeight, content, 40);
     const ZR_HorizontalSumTable<T> table(&src, 50, 40, 1.5, 3.5, 2.0, 1.0, 1.0, 0.0, false, nullptr, nullptr);
     digest.number(table.PaddingX());
     for (i32 y = 0; y < kHeight; ++y)

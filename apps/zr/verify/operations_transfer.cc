@@ -20,16 +20,16 @@ struct Transfer {
 };
 
 template <class T>
-i32 transfer(const Transfer& how, Picture<T>& src, const GX_LRect& rect, i32 x, i32 y, Picture<T>& dst) {
+i32 transfer(const Transfer& how, Canvas<T>& src, const GX_LRect& rect, i32 x, i32 y, Canvas<T>& dst) {
   return ZR_TransferRect(nullptr, 1, 0, how.field, &rect, &src, &how.mode, how.tables, how.mask, x, y, &dst);
 }
 
 // The whole picture over a mixed and an opaque one, and rows of every length up to two vectors of bytes.
 template <class T>
 void over_pictures(Digest& digest, Content content, const Transfer& how) {
-  Picture<T> src(odd_width, kHeight, content, 20);
+  Canvas<T> src(odd_width, kHeight, content, 20);
   for (const Content under : {content, Content::opaque}) {
-    Picture<T> dst(odd_width, kHeight, under, 21);
+    Canvas<T> dst(odd_width, kHeight, under, 21);
     digest.number(transfer(how, src, src.all(), 0, 0, dst));
     dst.digest(digest);
   }
@@ -37,7 +37,7 @@ void over_pictures(Digest& digest, Content content, const Transfer& how) {
 template <class T>
 void over_short_rows(Digest& digest, Content content, const Transfer& how) {
   constexpr i32 widths[] = {1, 2, 3, 4, 5, 7, 8, 9, 15, 16, 17, 31, 33};
-  Picture<T> src(odd_width, kHeight, content, 22), dst(odd_width, kHeight, content, 23);
+  Canvas<T> src(odd_width, kHeight, content, 22), dst(odd_width, kHeight, content, 23);
   i32 y = 0;
   for (const i32 width : widths) {
     digest.number(transfer(how, src, {y, y, y + width, y + 1}, 2 * y, y, dst));
@@ -56,7 +56,7 @@ void transfer_plain(Digest& digest, i32 mode, Content content) {
 }
 
 template <class T>
-ZR_MaskWorld mask_of(Picture<T>& picture, u32 kind, i32 x, i32 y) {
+ZR_MaskWorld mask_of(Canvas<T>& picture, u32 kind, i32 x, i32 y) {
   ZR_MaskWorld mask{};
   picture->FillOutEffectWorld(&mask.world);
   mask.offset_x = x;
@@ -67,7 +67,7 @@ ZR_MaskWorld mask_of(Picture<T>& picture, u32 kind, i32 x, i32 y) {
 
 template <class T>
 void transfer_masked(Digest& digest, i32 mode, Content content, const ZR_LinearBlendingTables* tables) {
-  Picture<T> picture(odd_width, kHeight, content, 24);
+  Canvas<T> picture(odd_width, kHeight, content, 24);
   for (u32 kind = 0; kind < 4; ++kind) {
     const i32 shift = static_cast<i32>(kind) * 3;
     const ZR_MaskWorld mask = mask_of(picture, kind, shift, shift / 3);
@@ -93,7 +93,7 @@ void single_pixels(Digest& digest, i32 mode, Content content) {
       pick<T>(&ZR_Get_Xfer1_Opacity2_table8, &ZR_Get_Xfer1_Opacity2_table16, &ZR_Get_Xfer1_Opacity2_tableF)(mode);
   const T opacity = convert_colour<T>(ZR_PixelFloat{0.5f, 0.9f, 0, 0});
   for (const auto* tables : {stored, &square_tables()}) {
-    Picture<T> src(odd_width, 3, content, 25), dst(odd_width, 3, content, 26);
+    Canvas<T> src(odd_width, 3, content, 25), dst(odd_width, 3, content, 26);
     for (i32 x = 0; x < odd_width; ++x) {
       if (plain != nullptr) plain(*src->At(x, 0), tables, dst->At(x, 0));
       if (faint != nullptr) faint(*src->At(x, 1), tables, opacity.alpha, dst->At(x, 1));

@@ -75,7 +75,7 @@ struct Drawing {
 
 template <class T>
 void draw(Digest& digest, const Drawing& how, const std::vector<GX_Matrix3>& matrices, Content content) {
-  Picture<T> src(odd_width, kHeight, content, 60),
+  Canvas<T> src(odd_width, kHeight, content, 60),
       dst(odd_width, kHeight, content == Content::opaque ? Content::mixed : content, 61);
   digest.number(ZR_TransformWorld(nullptr, how.quality, 0, how.field, &src, &how.mode, how.tables, how.mask,
                                   matrices.data(), static_cast<i32>(matrices.size()), true, &how.area, &dst));
@@ -90,7 +90,7 @@ void in_every_quality(Digest& digest, const std::vector<GX_Matrix3>& matrices, C
 
 template <class T>
 void with_masks(Digest& digest, const std::vector<GX_Matrix3>& matrices, Content content) {
-  Picture<T> picture(odd_width, kHeight, content, 62);
+  Canvas<T> picture(odd_width, kHeight, content, 62);
   for (u32 kind = 0; kind < 4; ++kind) {
     ZR_MaskWorld mask{};
     picture->FillOutEffectWorld(&mask.world);

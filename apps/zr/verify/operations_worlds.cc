@@ -20,7 +20,7 @@ T half_orange() {
 template <class T>
 class Shifted {
  public:
-  Shifted(Picture<T>& picture, size_t shift)
+  Shifted(Canvas<T>& picture, size_t shift)
       : memory_(static_cast<size_t>(stride(picture)) * static_cast<size_t>(picture.height()) * 4 + 32),
         world_(start(shift), picture.width(), picture.height(), stride(picture) * static_cast<i32>(sizeof(T))) {
     world_.CopyWorld(&picture);
@@ -28,7 +28,7 @@ class Shifted {
   ZR_WorldX<T>* operator&() { return &world_; }
 
  private:
-  static i32 stride(Picture<T>& picture) { return picture.width() + 2; }
+  static i32 stride(Canvas<T>& picture) { return picture.width() + 2; }
   void* start(size_t shift) {
     const auto address = reinterpret_cast<uintptr_t>(memory_.data());
     return memory_.data() + (16 - address % 16) % 16 / sizeof(Channel<T>) + shift;
@@ -46,10 +46,10 @@ template <class From, class To>
 void add_conversion(Operations& list, const char* name, const Conversion& how) {
   const size_t before = list.size();
   add_with_hostile<From>(list, name, [how]<class>(Digest& digest, Content content) {
-    Picture<From> picture(odd_width, 25, content, 11);
+    Canvas<From> picture(odd_width, 25, content, 11);
     for (const size_t shift : how.shifts) {
       Shifted<From> src(picture, shift);
-      Picture<To> dst(odd_width, 25, Content::untouched);
+      Canvas<To> dst(odd_width, 25, Content::untouched);
       dst->CopyRectPossiblyDifferentBitdepth(&src, picture.all(), how.dither, 0, 0, nullptr);
       for (const GX_LRect& rect : kRects)  // most of these begin where no vector does
         dst->CopyRectPossiblyDifferentBitdepth(&src, rect, how.dither, rect.top, rect.left / 5, nullptr);
@@ -64,8 +64,8 @@ void add_conversion(Operations& list, const char* name, const Conversion& how) {
 template <class From, class To>
 void add_linear_conversion(Operations& list, const char* name) {
   add_with_hostile<From>(list, name, []<class>(Digest& digest, Content content) {
-    Picture<From> src(odd_width, 43, content, 12);
-    Picture<To> dst(odd_width, 43, Content::untouched);
+    Canvas<From> src(odd_width, 43, content, 12);
+    Canvas<To> dst(odd_width, 43, Content::untouched);
     ZR_DepthConvertWorld(square_tables().to_linear, &src, &dst);
     dst.digest(digest);
   });
@@ -89,7 +89,7 @@ void add_conversions_to(Operations& list, const char* plain, const char* linear)
 
 void add_world_operations(Operations& list) {
   add_all(list, "fill", []<class T>(Digest& digest) {
-    Picture<T> world(odd_width, 25, Content::mixed);
+    Canvas<T> world(odd_width, 25, Content::mixed);
     const T colour = half_orange<T>();
     for (const GX_LRect& rect : kRects)
       digest.number(pick<T>(&ZR_Fill, &ZR_Fill16, &ZR_FillFloat)(nullptr, &colour, &rect, &world));
@@ -99,7 +99,7 @@ void add_world_operations(Operations& list) {
     world.digest(digest);
   });
   add_all(list, "clear", []<class T>(Digest& digest) {
-    Picture<T> world(odd_width, 25, Content::noise);
+    Canvas<T> world(odd_width, 25, Content::noise);
     for (const GX_LRect& rect : kRects) world->Clear(&rect);
     world.digest(digest);
     world->Clear(nullptr);
@@ -107,32 +107,32 @@ void add_world_operations(Operations& list) {
   });
   add_all(list, "clear-outside", []<class T>(Digest& digest) {
     for (const GX_LRect& rect : kRects) {
-      Picture<T> world(odd_width, 25, Content::noise);
+      Canvas<T> world(odd_width, 25, Content::noise);
       world->ClearExceptRect(rect);
       world.digest(digest);
     }
   });
   add_all(list, "clear-alpha-outside", []<class T>(Digest& digest) {
     for (const GX_LRect& rect : kRects) {
-      Picture<T> world(odd_width, 25, Content::noise);
+      Canvas<T> world(odd_width, 25, Content::noise);
       digest.number(ZR_ClearAlphaExceptRect(nullptr, &rect, &world));
       world.digest(digest);
     }
   });
   add_all(list, "fill-alpha", []<class T>(Digest& digest) {
-    Picture<T> world(odd_width, 9, Content::mixed);
+    Canvas<T> world(odd_width, 9, Content::mixed);
     world->FillAlpha();
     world.digest(digest);
   });
   add_all_with_hostile(list, "invert-alpha", []<class T>(Digest& digest, Content content) {
-    Picture<T> world(odd_width, 25, content);
+    Canvas<T> world(odd_width, 25, content);
     world->InvertAlpha();
     world.digest(digest);
   });
   add_all(list, "stores-in-bands", []<class T>(Digest& digest) {  // large enough for several bands
     using Other = std::conditional_t<std::is_same_v<T, ZR_Pixel16>, ZR_Pixel8, ZR_Pixel16>;
-    Picture<T> world(701, 400, Content::mixed, 13);
-    Picture<Other> converted(701, 400, Content::untouched);
+    Canvas<T> world(701, 400, Content::mixed, 13);
+    Canvas<Other> converted(701, 400, Content::untouched);
     world->InvertAlpha();
     converted->CopyRectPossiblyDifferentBitdepth(&world, world.all(), false, 0, 0, nullptr);
     world.digest(digest);
@@ -146,7 +146,7 @@ void add_world_operations(Operations& list) {
     world.digest(digest);
   });
   add_all(list, "copy", []<class T>(Digest& digest) {
-    Picture<T> src(odd_width, 25, Content::mixed, 2), dst(odd_width, 25, Content::noise, 3);
+    Canvas<T> src(odd_width, 25, Content::mixed, 2), dst(odd_width, 25, Content::noise, 3);
     for (const GX_LRect& rect : kRects) dst->CopyRect(&src, rect, rect.top, rect.left);
     for (const GX_LRect& rect : kRects) dst->CopyRect(&dst, rect, rect.left + 3, rect.top + 1);
     dst.digest(digest);

@@ -1,5 +1,5 @@
 // The fixed inputs of `zr verify`.
-#include "verify/pictures.h"
+#include "verify/canvas.h"
 
 #include <limits>
 
@@ -180,7 +180,7 @@ T* aligned(std::vector<T>& memory) {
 }  // namespace
 
 template <class T>
-Picture<T>::Picture(i32 width, i32 height, Content content, u64 seed)
+Canvas<T>::Canvas(i32 width, i32 height, Content content, u64 seed)
     : memory_(static_cast<size_t>(stride_of<T>(width)) * static_cast<size_t>(height) + 2 * 64 / sizeof(T),
               T{5, 6, 7, 8}),
       first_(aligned(memory_)),
@@ -191,9 +191,9 @@ Picture<T>::Picture(i32 width, i32 height, Content content, u64 seed)
     for (i32 x = 0; x < width; ++x) *world_.At(x, y) = source.next();
 }
 
-template class Picture<ZR_Pixel8>;
-template class Picture<ZR_Pixel16>;
-template class Picture<ZR_PixelFloat>;
+template class Canvas<ZR_Pixel8>;
+template class Canvas<ZR_Pixel16>;
+template class Canvas<ZR_PixelFloat>;
 
 const ZR_LinearBlendingTables& square_tables() {
   static const ZR_LinearBlendingTables tables = [] {

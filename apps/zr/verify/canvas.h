@@ -36,9 +36,9 @@ constexpr Content premul_of(Content content) { return content == Content::mixed 
 // A world over memory of our own, with guard pixels between and behind the rows. Rows begin at all
 // places that their pixels allow within 16 bytes, since alignment may choose the code.
 template <class T>
-class Picture {
+class Canvas {
  public:
-  Picture(i32 width, i32 height, Content content, u64 seed = 1);
+  Canvas(i32 width, i32 height, Content content, u64 seed = 1);
   ZR_WorldX<T>* operator&() { return &world_; }
   ZR_WorldX<T>* operator->() { return &world_; }
   i32 width() const { return world_.width; }
@@ -58,9 +58,9 @@ class Picture {
 // Width of most pictures: no multiple of any vector's length.
 inline constexpr i32 odd_width = 131;
 
-extern template class Picture<ZR_Pixel8>;
-extern template class Picture<ZR_Pixel16>;
-extern template class Picture<ZR_PixelFloat>;
+extern template class Canvas<ZR_Pixel8>;
+extern template class Canvas<ZR_Pixel16>;
+extern template class Canvas<ZR_PixelFloat>;
 
 // Tables of linear light for a gamma of 2, without any function of the C library.
 const ZR_LinearBlendingTables& square_tables();
