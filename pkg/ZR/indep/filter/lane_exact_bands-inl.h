@@ -174,32 +174,33 @@ class ExactLanes {
   // Carries source row r to all destination rows of the band that it meets; false, with the strip to be made anew,
   // where its samples do not meet the condition.
   HWY_INLINE bool meet(Form form, i64 r) const {
-    const FloatBand::Exact& exact = band_.exact;
     const f32 *const samples = strip_.samples_of(r), *const fetched = fetched_after(r);
     const Targets targets = targets_of(r);
-    const i32 small = exact.small ? band_.kernel.width : 0;
-    if (form == Form::whole) {
-      if (small == 0) {
-        if (!split_samples(samples, fetched)) return false;
-        if (exact.mirrored) add_pairs();
-        add_lines<true>(exact.samples, 0, exact.line_count, targets);
-      } else if (!(small == 3 ? add_whole<3>(samples, fetched, targets) : add_whole<5>(samples, fetched, targets))) {
-        return false;
-      }
-    } else if (small == 3) {
-      if (!add_rounded(samples, fetched, targets)) return false;
-    } else {
-      for (i32 g = 0; g < band_.group_count; ++g) {
-        if (!split_group(samples, fetched, band_.groups[g])) return false;
-        const bool of_one_kind = band_.group_count == exact.line_count;
-        const bool all_terms = !of_one_kind && !band_.has_zeros;
-        if (small == 5 && all_terms)
-          add_products<5>(targets);
-        else
-          add_lines<false>(exact.products, of_one_kind ? g : 0, of_one_kind ? g + 1 : exact.line_count, targets);
-      }
+    const bool whole = form == Form::whole;
+    bool made = false;
+    if (!band_.exact.small)
+      made = whole ? add_all_whole(samples, fetched, targets) : add_all_rounded(samples, fetched, targets);
+    else if (band_.kernel.width == 3)
+      made = whole ? add_whole<3>(samples, fetched, targets) : add_rounded<3>(samples, fetched, targets);
+    else
+      made = whole ? add_whole<5>(samples, fetched, targets) : add_rounded<5>(samples, fetched, targets);
+    if (made) take_spare(r - band_.kernel.height / 2);
+    return made;
+  }
+  // Kernels of any size, by planes.
+  HWY_INLINE bool add_all_whole(const f32* samples, const f32* fetched, const Targets& targets) const {
+    if (!split_samples(samples, fetched)) return false;
+    if (band_.exact.mirrored) add_pairs();
+    add_lines<true>(band_.exact.samples, 0, band_.exact.line_count, targets);
+    return true;
+  }
+  HWY_INLINE bool add_all_rounded(const f32* samples, const f32* fetched, const Targets& targets) const {
+    const i32 lines = band_.exact.line_count;
+    for (i32 g = 0; g < band_.group_count; ++g) {
+      if (!split_group(samples, fetched, band_.groups[g])) return false;
+      const bool of_one_kind = band_.group_count == lines;
+      add_lines<false>(band_.exact.products, of_one_kind ? g : 0, of_one_kind ? g + 1 : lines, targets);
     }
-    take_spare(r - band_.kernel.height / 2);
     return true;
   }
 
@@ -390,15 +391,17 @@ class ExactLanes {
     };
     return add_samples<side>(band_.exact.whole, samples, fetched, targets, terms);
   }
-  // Rounded products, of few terms: cheaper made for each term than kept. Upper parts are what a product moves the sum
-  // by, which is a multiple of `split` all the time.
+  // Rounded products: of few terms they are cheaper made for each term than kept. Upper parts are what a product moves
+  // the sum by, which is a multiple of `split` all the time.
+  template <i32 side>
   HWY_INLINE bool add_rounded(const f32* samples, const f32* fetched, const Targets& targets) const {
+    constexpr i32 half = side / 2;
     const auto terms = [](const auto& w, Numbers magic, const auto& sample, Numbers middle, Numbers* upper,
                           Numbers* lower) HWY_ATTR {
-      for (i32 k = 0; k < 2; ++k) {
+      for (i32 k = 0; k <= half; ++k) {
         upper[k] = magic, lower[k] = hn::Zero(Tag<f32>());
-        for (i32 t = 0; t < 3; ++t) {
-          const auto product = hn::Mul(t == 1 ? middle : sample(t), w[k][t % 2]);
+        for (i32 t = 0; t < side; ++t) {
+          const auto product = hn::Mul(t == half ? middle : sample(t), w[k][std::min(t, side - 1 - t)]);
           const auto sum = hn::Add(upper[k], product);
           lower[k] = hn::Add(lower[k], hn::Sub(product, hn::Sub(sum, upper[k])));
           upper[k] = sum;
@@ -406,28 +409,7 @@ class ExactLanes {
         upper[k] = hn::Sub(upper[k], magic);
       }
     };
-    return add_samples<3>(band_.exact.rounded, samples, fetched, targets, terms);
-  }
-  // Rounded products, all of which have their planes.
-  template <i32 side>
-  HWY_INLINE void add_products(const Targets& targets) const {
-    constexpr i32 kinds = side / 2 + 1;
-    const Tag<f32> d;
-    // Of a line as of its mirror image.
-    const f32* planes[kinds][kinds];
-    for (i32 k = 0; k < kinds; ++k)
-      for (i32 t = 0; t < kinds; ++t)
-        planes[k][t] = band_.exact.planes + band_.exact.products[band_.exact.lines[k]].places[t] - 4 * t;
-    add_small<side>(targets, [&](i64 c, Numbers* upper, Numbers* lower) HWY_ATTR {
-      for (i32 k = 0; k < kinds; ++k) {
-        upper[k] = lower[k] = hn::Zero(d);
-        for (i32 t = 0; t < side; ++t) {
-          const f32* const from = planes[k][std::min(t, side - 1 - t)] + c + 4 * t;
-          upper[k] = hn::Add(upper[k], hn::LoadU(d, from));
-          lower[k] = hn::Add(lower[k], hn::LoadU(d, from + float_plane_place));
-        }
-      }
-    });
+    return add_samples<side>(band_.exact.rounded, samples, fetched, targets, terms);
   }
   HWY_INLINE Numbers divided(Numbers sum) const {
     const Tag<f32> d;
