@@ -13,7 +13,7 @@ struct TapRange {
   i32 first = 1, end = 1;
 };
 
-// `pixels` (whole groups) side by side at each of `count` positions, which all have the same taps.
+// `pixels` (whole groups, or of floats one) side by side at each of `count` positions, which all have the same taps.
 template <class T>
 struct BellRun {
   i32 pixels;

@@ -156,7 +156,7 @@ void box_blur(const LineJob<T>& job, const Box& box, u32 iterations) {
   const u64 sum_bytes = static_cast<u64>(width) * 4 * sizeof(f64), chunk_bytes = row_bytes * chunk_positions;
   const u64 buffer_bytes = static_cast<u64>(longest) * row_bytes;
   const ThreadScratch scratch(sum_bytes + chunk_bytes + (iterations > 1 ? 2 : 1) * buffer_bytes);
-  for_strips(job, scratch, [&](char* memory, i64 line, i32 lines) {
+  for_strips(job, width, scratch, [&](char* memory, i64 line, i32 lines) {
     char* const sums = memory;
     T* const chunk = reinterpret_cast<T*>(memory + sum_bytes);
     T* const first_buffer = chunk + chunk_positions * width;

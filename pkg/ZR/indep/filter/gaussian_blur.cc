@@ -103,15 +103,21 @@ class BellPass {
 
 template <class T>
 void gaussian_blur(const LineJob<T>& job, const Bell& bell) {
-  const i32 width = job.strip_lines();
+  // Pixels of floats fill vectors with their neighbours in the row as well as with those below.
+  const bool by_rows = sizeof(T) == 16 && job.rows_in_place() && lane_bell_rows<T>() != nullptr;
+  const i32 width = by_rows ? 1 : job.strip_lines();
   // The whole source line, or of a copy what the destination needs.
   const i64 low = std::clamp<i64>(job.dst_low - bell.reach(), 0, job.src.length);
   const i64 high = std::clamp<i64>(job.dst_high + bell.reach(), low, job.src.length);
   const u64 row_bytes = static_cast<u64>(width) * sizeof(T);
-  const ThreadScratch scratch((chunk_positions + static_cast<u64>(high - low)) * row_bytes);
-  for_strips(job, scratch, [&](char* memory, i64 line, i32 lines) {
-    T* const chunk = reinterpret_cast<T*>(memory);
+  const ThreadScratch scratch(by_rows ? 0 : (chunk_positions + static_cast<u64>(high - low)) * row_bytes);
+  for_strips(job, width, scratch, [&](char* memory, i64 line, i32 lines) {
     const i64 src_line = line + job.line_shift;
+    if (by_rows) {
+      const Strip<T> row = {job.src.at(0, src_line), 1, 0, job.src.length};
+      return BellPass<T>(job, bell, row, 1).make(job.dst_low, job.dst_high, job.dst.at(0, line), 1);
+    }
+    T* const chunk = reinterpret_cast<T*>(memory);
     Strip<T> strip;
     if (job.reads_in_place(lines))
       strip = {job.src.at(0, src_line), job.src.along / static_cast<i64>(sizeof(T)), 0, job.src.length};

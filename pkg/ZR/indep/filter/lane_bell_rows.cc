@@ -146,9 +146,16 @@ void run_bell(const BellRun<T>& run) {
     const BellRows<T>& single = single_bell_rows<T>();
     return straight ? single.straight(run) : single.premultiplied(run);
   }
-  // Positions that follow each other in memory are one long row.
-  if (run.step == run.pixels && run.out_step == run.pixels)
-    return make_channels<T, straight>(run, run.middle, 4 * run.pixels * run.count, run.out);
+  // Positions that follow each other in memory are one long row, of single pixels maybe with a rest.
+  if (run.step == run.pixels && run.out_step == run.pixels) {
+    constexpr i64 pixels_at_once = lane_count() / 4;
+    const i64 pixels = run.pixels * run.count, rest = run.pixels == 1 ? pixels % pixels_at_once : 0;
+    make_channels<T, straight>(run, run.middle, 4 * (pixels - rest), run.out);
+    if (rest == 0) return;
+    BellRun<T> last = run;
+    last.middle += pixels - rest, last.out += pixels - rest, last.count = rest;
+    return straight ? single_bell_rows<T>().straight(last) : single_bell_rows<T>().premultiplied(last);
+  }
   for (i64 k = 0; k < run.count; ++k)
     make_channels<T, straight>(run, run.middle + k * run.step, 4 * run.pixels, run.out + k * run.out_step);
 }

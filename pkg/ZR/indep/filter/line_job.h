@@ -86,12 +86,17 @@ struct LineJob {
     return std::max(64 / static_cast<i32>(sizeof(T)), strip_group);
   }
   // Whether strips of so many lines are read where they lie.
-  bool reads_in_place(i32 lines) const {
-    return src.vertical && !call.premultiply && !call.copy_source && lines % strip_group == 0 && src.whole_pixels();
+  bool reads_in_place(i32 lines) const { return src.vertical && lines % strip_group == 0 && reads_as_it_is(); }
+  bool writes_in_place(i32 lines) const { return dst.vertical && lines % strip_group == 0 && writes_all(); }
+  // Whether rows can be filtered one by one where they lie.
+  bool rows_in_place() const {
+    return !src.vertical && !dst.vertical && src.data != dst.data && reads_as_it_is() && writes_all();
   }
-  bool writes_in_place(i32 lines) const {
-    return dst.vertical && (call.flags & ZR_BlurFlag_AllChannels) == ZR_BlurFlag_AllChannels &&
-           lines % strip_group == 0 && dst.whole_pixels();
+
+ private:
+  bool reads_as_it_is() const { return !call.premultiply && !call.copy_source && src.whole_pixels(); }
+  bool writes_all() const {
+    return (call.flags & ZR_BlurFlag_AllChannels) == ZR_BlurFlag_AllChannels && dst.whole_pixels();
   }
 };
 
@@ -221,12 +226,13 @@ void clear_lines(const LineJob<T>& job, i64 first, i64 end) {
     for (i64 l = first; l < end; ++l) std::memset(dst.at(0, l), 0, static_cast<std::size_t>(dst.length) * sizeof(T));
 }
 
-// Hands strips of destination lines to body(scratch, first_line, lines), all with a source line, through the
-// generic iterator. Throws what stops it.
+// Hands strips of up to `width` destination lines to body(scratch, first_line, lines), all with a source line, through
+// the generic iterator. Throws what stops it.
 template <class T, class Body>
-void for_strips(const LineJob<T>& job, const ThreadScratch& scratch, const Body& body) {
+void for_strips(const LineJob<T>& job, i32 width, const ThreadScratch& scratch, const Body& body) {
   struct Work {
     const LineJob<T>& job;
+    const i32 width;
     const ThreadScratch& scratch;
     const Body& body;
     std::atomic<i32> stop = 0;
@@ -248,8 +254,8 @@ void for_strips(const LineJob<T>& job, const ThreadScratch& scratch, const Body&
     i32 strip(i32 thread, i32 index) {
       char* const memory = scratch.of(thread);
       if (memory == nullptr) return failed_verification(ZR_Site_Blur, "a blur runs on more threads than announced");
-      const i64 first = static_cast<i64>(index) * job.strip_lines();
-      const i64 end = allowed(thread, first, std::min(first + job.strip_lines(), job.dst.count));
+      const i64 first = i64{index} * width;
+      const i64 end = allowed(thread, first, std::min(first + width, job.dst.count));
       const i64 low = std::clamp<i64>(-job.line_shift, first, end);
       const i64 high = std::clamp<i64>(job.src.count - job.line_shift, low, end);
       clear_lines(job, first, low);
@@ -259,8 +265,8 @@ void for_strips(const LineJob<T>& job, const ThreadScratch& scratch, const Body&
     }
   };
   if (job.dst.count < 1 || job.dst.length < 1) return;
-  Work work{job, scratch, body};
-  const i32 strips = static_cast<i32>((job.dst.count - 1) / job.strip_lines() + 1);
+  Work work{job, width, scratch, body};
+  const i32 strips = static_cast<i32>((job.dst.count - 1) / width + 1);
   const i32 error = ZR_IterateGeneric(strips, &work, [](void* refcon, i32 thread, i32 i, i32) -> i32 {
     return guarded([&] { return static_cast<Work*>(refcon)->strip(thread, i); });
   });
