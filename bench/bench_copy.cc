@@ -1,4 +1,5 @@
 // Copies between worlds: whole, converting, scaled by nearest neighbour and by samples.
+#include "divided.h"
 #include "placements.h"
 
 namespace bench {
@@ -10,6 +11,7 @@ template <class To, class From>
 void copy(benchmark::State& state, Copy routine, Size from, Size to, Layer layer) {
   const auto src = make_world<From>(from, layer);
   const auto dst = make_world<To>(to, Layer::opaque);
+  routine = divided(routine);
   for (auto _ : state)
     if (routine(nullptr, src.get(), dst.get(), nullptr, nullptr) != 0) {
       state.SkipWithError("the copy failed");

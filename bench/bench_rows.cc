@@ -1,6 +1,7 @@
 // Rows that composites and effects are made of: mixes, matte colours, mask cells, alphas.
 #include <ZR/zr.h>
 
+#include "divided.h"
 #include "workloads.h"
 
 namespace bench {
@@ -10,6 +11,7 @@ template <class T>
 void mix(benchmark::State& state, Size size, decltype(&ZR_Blend_Straight) routine, Layer layer) {
   const auto one = make_world<T>(size, layer, 1), other = make_world<T>(size, layer, 2);
   const auto dst = make_world<T>(size, Layer::opaque, 3);
+  routine = divided(routine);
   for (auto _ : state) routine(nullptr, one.get(), other.get(), 0x5555, dst.get());
   count_bytes<T>(state, size, 3);
 }

@@ -1,7 +1,9 @@
-// What a host does with ZR_BENCH_THREADS above 1: composites and transforms go in bands over the Hostkit's threads,
-// work on single lines is dealt out by ZR_IterateGeneric. With one thread the calls are the library's own.
+// What a host does with ZR_BENCH_THREADS above 1: composites, transforms, copies and blends go in bands over the
+// Hostkit's threads, work on single lines is dealt out by ZR_IterateGeneric. With one thread the calls are the
+// library's own.
 #pragma once
 
+#include <ZR/copy_bits.h>
 #include <ZR/hostkit.h>
 #include <ZR/zr.h>
 
@@ -16,6 +18,18 @@ inline int threads_wanted() {
 
 inline const auto transfer_rect = threads_wanted() == 1 ? ZR_TransferRect : ZRHost_TransferRect;
 inline const auto transform_world = threads_wanted() == 1 ? ZR_TransformWorld : ZRHost_TransformWorld;
+
+// The divided form of a copy or a blend.
+inline auto divided(decltype(&ZR_CopyBits_Draft) copy) {
+  if (threads_wanted() == 1) return copy;
+  return copy == &ZR_CopyBits_Draft         ? ZRHost_CopyBits_Draft
+         : copy == &ZR_CopyBits_HQ_Straight ? ZRHost_CopyBits_HQ_Straight
+                                            : ZRHost_CopyBits_HQ_Premul;
+}
+inline auto divided(decltype(&ZR_Blend) blend) {
+  if (threads_wanted() == 1) return blend;
+  return blend == &ZR_Blend_Premul ? ZRHost_Blend_Premul : ZRHost_Blend;
+}
 
 // Runs body(line) for lines 0 to count-1.
 template <class Body>

@@ -1,20 +1,15 @@
 // One composite or one layer transform on all threads of the Hostkit: what may be cut into bands, and how a band
 // is asked for so that its bytes are those of the whole.
 #include <ZR/composite.h>
-#include <ZR/errors.h>
 #include <ZR/hostkit.h>
-#include <ZR/slots.h>
 #include <ZR/transfer_mode.h>
-#include <ZR/world.h>
 
 #include <algorithm>
-#include <cstdint>
-#include <cstdlib>
 #include <limits>
-#include <new>
 
 #include "bands.h"
 #include "divided_calls_state.h"
+#include "divided_worlds.h"
 
 namespace zr {
 namespace {
@@ -22,47 +17,18 @@ namespace {
 // What makes waking a thread worth while.
 constexpr i32 least_composite_pixels = 32768, least_sampled_pixels = 8192, most_counted_samples = 16;
 
-template <class Routine>
-bool holds(ZR_SlotIndex slot, Routine* routine) {
-  return ZRp_G_OverFuncs[slot] == reinterpret_cast<ZR_SlotFunc>(routine);
-}
-
-// Bytes of a pixel; 0 for a record that says nothing known.
-i32 pixel_bytes(const ZR_LayerDef& world) {
-  if (world.owner != nullptr) return world.owner->PixelSize();
-  const u32 format = world.flags >> 24;
-  return format <= 2 ? 4 << format : 0;
-}
-
-// Worlds whose depths and pixels are in order; others are the library's to report.
+// Worlds of one depth that are in order.
 bool well_formed(const ZR_LayerDef& src, const ZR_MaskWorld* mask, const ZR_LayerDef& dst) {
-  const i32 bytes = pixel_bytes(dst);
-  const auto good = [=](const ZR_LayerDef& world) {
-    return pixel_bytes(world) == bytes && world.data != nullptr && world.width > 0 && world.height > 0;
-  };
-  return bytes != 0 && good(src) && good(dst) && (mask == nullptr || good(mask->world));
+  const auto good = [&](const ZR_LayerDef& world) { return in_order(world) && pixel_bytes(world) == pixel_bytes(dst); };
+  return good(src) && good(dst) && (mask == nullptr || good(mask->world));
 }
 
 bool known_mode(i32 mode) { return mode >= XferCopyFast && mode <= XferKeyProtect && mode != -1; }
 bool clears_around(i32 mode) { return mode == XferMultiplyAlpha || mode == XferMultiplyAlphaLuma; }
 
-bool share_memory(const ZR_LayerDef& a, const ZR_LayerDef& b) {
-  struct Range {
-    std::intptr_t first, end;
-  };
-  const auto range = [](const ZR_LayerDef& world) {
-    const auto data = reinterpret_cast<std::intptr_t>(world.data);
-    const std::intptr_t last_row = data + std::intptr_t{world.height - 1} * world.row_bytes;
-    return Range{std::min(data, last_row), std::max(data, last_row) + std::intptr_t{world.width} * pixel_bytes(world)};
-  };
-  const Range x = range(a), y = range(b);
-  return x.first < y.end && y.first < x.end;
-}
-
 // No row writes what another one reads or writes, so that their order does not tell.
 bool rows_are_apart(const ZR_LayerDef& src, const ZR_MaskWorld* mask, const ZR_LayerDef& dst) {
-  const bool own_bytes = std::abs(i64{dst.row_bytes}) >= i64{dst.width} * pixel_bytes(dst);
-  return own_bytes && !share_memory(src, dst) && (mask == nullptr || !share_memory(mask->world, dst));
+  return owns_rows(dst) && !share_memory(src, dst) && (mask == nullptr || !share_memory(mask->world, dst));
 }
 
 // Draws `bands` by body(band, scratch).
@@ -137,10 +103,7 @@ struct Composite {
   i32 draw_alone(Rows band, void** scratch) const {
     const GX_LRect part = rect_of(band);
     const i32 base = band.first & ~1;
-    ZR_LayerDef rows = *dst;
-    rows.data = static_cast<char*>(dst->data) + std::ptrdiff_t{base} * dst->row_bytes;
-    rows.height = band.end - base;
-    rows.extent = {0, 0, rows.width, rows.height};
+    ZR_LayerDef rows = only_rows(*dst, {base, band.end});
     ZR_MaskWorld moved;
     if (mask != nullptr) {
       moved = *mask;
@@ -202,32 +165,20 @@ struct Transform {
   }
 };
 
-template <class Call>
-i32 run(const Call& call) noexcept {
-  try {
-    return call.run();
-  } catch (const i32 code) {
-    return code;
-  } catch (const std::bad_alloc&) {
-    return ZR_Err_OutOfMemory;
-  } catch (...) {
-    return ZR_Err_Internal;
-  }
-}
-
 }  // namespace
 }  // namespace zr
 
 i32 ZRHost_TransferRect(const ZR_ProgressInfo* progress, i32 quality, u32 flags, i32 field, const GX_LRect* rect,
                         ZR_LayerDef* src, const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables,
                         const ZR_MaskWorld* mask, i32 dest_x, i32 dest_y, ZR_LayerDef* dst) {
-  return zr::run(zr::Composite{progress, quality, flags, field, rect, src, mode, tables, mask, dest_x, dest_y, dst});
+  return zr::run_divided(
+      zr::Composite{progress, quality, flags, field, rect, src, mode, tables, mask, dest_x, dest_y, dst});
 }
 
 i32 ZRHost_TransformWorld(const ZR_ProgressInfo* progress, i32 quality, u32 flags, i32 field, ZR_LayerDef* src,
                           const ZR_CompositeModePlus* mode, const ZR_LinearBlendingTables* tables,
                           const ZR_MaskWorld* mask, const GX_Matrix3* matrices, i32 count, bool src2dst,
                           const GX_LRect* dst_rect, ZR_LayerDef* dst) {
-  return zr::run(
+  return zr::run_divided(
       zr::Transform{progress, quality, flags, field, src, mode, tables, mask, matrices, count, src2dst, dst_rect, dst});
 }

@@ -5,7 +5,7 @@
 #include <memory>
 #include <optional>
 
-#include <ZR/copy_bits.h>
+#include <ZR/hostkit.h>
 
 #include "commands.h"
 #include "common_options.h"
@@ -81,7 +81,7 @@ PixelSize size_for(const Request& request, i32 width, i32 height) {
 }
 
 void copy(OwnedWorld& from, const GX_LRect& in, OwnedWorld& to, const GX_LRect& out) {
-  check(ZR_CopyBits_Draft(nullptr, from.layer(), to.layer(), &in, &out), "resize");
+  check(ZRHost_CopyBits_Draft(nullptr, from.layer(), to.layer(), &in, &out), "resize");
 }
 
 // The picture with its edge pixels once more around it: samplers see transparent black outside of a world, and
@@ -97,24 +97,8 @@ OwnedWorld with_border(OwnedWorld& picture) {
   return framed;
 }
 
-// In bands of rows on the host's threads. A band is a world of its own, of which the whole result reaches out
-// above and below: so every band samples where the result in one piece would.
-void sample_bands(OwnedWorld& from, const GX_LRect& in, OwnedWorld& to) {
-  static constexpr i32 band_rows = 64;
-  struct Work {
-    OwnedWorld &from, &to;
-    const GX_LRect& in;
-  } work{from, to, in};
-  const auto band = [](void* refcon, i32, i32 index, i32) -> i32 {
-    const Work& all = *static_cast<const Work*>(refcon);
-    const i32 top = index * band_rows, width = all.to.width(), height = all.to.height();
-    ZR_LayerDef rows = *all.to.layer();
-    rows.data = static_cast<char*>(rows.data) + static_cast<ptrdiff_t>(top) * rows.row_bytes;
-    rows.height = std::min(band_rows, height - top);
-    const GX_LRect whole = {0, -top, width, height - top};
-    return ZR_CopyBits_HQ_Straight(&abort_on_interrupt(), all.from.layer(), &rows, &all.in, &whole);
-  };
-  check(ZR_IterateGeneric((to.height() + band_rows - 1) / band_rows, &work, band), "resize");
+void sample(OwnedWorld& from, const GX_LRect& in, OwnedWorld& to) {
+  check(ZRHost_CopyBits_HQ_Straight(&abort_on_interrupt(), from.layer(), to.layer(), &in, nullptr), "resize");
 }
 
 OwnedWorld resized(OwnedWorld& picture, PixelSize size, bool best) {
@@ -127,9 +111,9 @@ OwnedWorld resized(OwnedWorld& picture, PixelSize size, bool best) {
     copy(picture, picture.bounds(), result, result.bounds());
   } else if ((size.width > w || size.height > h) && std::max(w, h) + 2 <= kLargestSide) {
     OwnedWorld framed = with_border(picture);
-    sample_bands(framed, {1, 1, w + 1, h + 1}, result);
+    sample(framed, {1, 1, w + 1, h + 1}, result);
   } else {
-    sample_bands(picture, picture.bounds(), result);
+    sample(picture, picture.bounds(), result);
   }
   return result;
 }

@@ -16,6 +16,10 @@ ZR_API i32 ZR_CopyBits_Draft(const ZR_ProgressInfo* progress, ZR_LayerDef* src, 
                              const GX_LRect* src_rect, const GX_LRect* dst_rect);
 ZR_API i32 ZR_CopyBits_Draft_Static(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst,
                                     const GX_LRect* src_rect, const GX_LRect* dst_rect);
+/* Of ZR_CopyBits_Draft_Static the destination rows first_row..end_row-1, with the bytes that the whole copy gives
+ * them. Where the worlds share no memory, calls for different rows may run together. */
+ZR_API i32 ZR_CopyBits_DraftRows(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect, const GX_LRect* dst_rect,
+                                 i32 first_row, i32 end_row);
 /* Bilinear where neither axis shrinks, else the mean of each pixel's footprint. Sizes that differ need one depth.
  * Only the abort function is asked, after rows 0, 64, 128, ... An inverted destination copies nothing. */
 ZR_API i32 ZR_CopyBits_HQ_Straight(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst,

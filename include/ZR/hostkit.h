@@ -86,3 +86,19 @@ i32 ZRHost_TransformWorld(const ZR_ProgressInfo* progress, i32 quality, u32 flag
                           const ZR_MaskWorld* mask, const GX_Matrix3* matrices, i32 count, bool src2dst,
                           const GX_LRect* dst_rect, ZR_LayerDef* dst);
 }
+
+// The copies of <ZR/copy_bits.h> and the blends of <ZR/zr.h> likewise: arguments, results and bytes of the undivided
+// call. The copies of high quality ask the abort function only, before the first row and then now and then; draft
+// copies and blends ask nobody. Undivided run: small rectangles and inverted ones, a call from inside an iterate
+// callback, copies within one memory (a blend may be onto one of its worlds), a replaced slot of the copy.
+extern "C" {
+i32 ZRHost_CopyBits_Draft(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect,
+                          const GX_LRect* dst_rect);
+i32 ZRHost_CopyBits_HQ_Straight(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst,
+                                const GX_LRect* src_rect, const GX_LRect* dst_rect);
+i32 ZRHost_CopyBits_HQ_Premul(const ZR_ProgressInfo* progress, ZR_LayerDef* src, ZR_LayerDef* dst,
+                              const GX_LRect* src_rect, const GX_LRect* dst_rect);
+i32 ZRHost_Blend(const ZR_ProgressInfo* progress, ZR_LayerDef* src1, ZR_LayerDef* src2, i32 ratio, ZR_LayerDef* dst);
+i32 ZRHost_Blend_Premul(const ZR_ProgressInfo* progress, ZR_LayerDef* src1, ZR_LayerDef* src2, i32 ratio,
+                        ZR_LayerDef* dst);
+}

@@ -74,7 +74,7 @@ i32 ZR_ChannelCopy(const ZR_ProgressInfo* /*progress*/, ZR_Chunk* src, ZR_Chunk*
       return ZR_Err_None;
     }
     zr::EmitRow* const emit = zr::emit_row_of(bytes);
-    return zr::copy_scaled(in, from, out, to, zr::overflow_texts,
+    return zr::copy_scaled(in, from, out, to, {}, zr::overflow_texts,
                            [&](i32 n, const i32* columns, const char* src_row, char* dst_pixels, bool) {
                              emit(static_cast<std::size_t>(bytes), n, columns, src_row, dst_pixels);
                            });

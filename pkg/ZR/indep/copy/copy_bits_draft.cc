@@ -15,18 +15,19 @@ namespace {
 constexpr OverflowTexts overflow_texts = {ZR_Site_CopyBitsDraft, "ZRp_CopyBitsUniversal x overflow detected",
                                           "ZRp_CopyBitsUniversal y overflow detected"};
 
-// One rectangle at one place of both worlds, clipped to both; its left and top are not negative.
+// Rows of one rectangle at one place of both worlds, clipped to both; its left and top are not negative.
 template <class To, class From>
-void copy_in_place(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect& rect) {
+void copy_in_place(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect& rect, const CopyRows& rows) {
   const i32 right = std::min({rect.right, src->width, dst->width});
-  const i32 bottom = std::min({rect.bottom, src->height, dst->height});
-  if (right <= rect.left || bottom <= rect.top) return;
+  const i32 top = std::max(rect.top, rows.first);
+  const i32 bottom = std::min({rect.bottom, src->height, dst->height, rows.end});
+  if (right <= rect.left || bottom <= top) return;
   const ZR_WorldX<From> from(src, false);
   ZR_WorldX<To> to(dst, false);
   if constexpr (std::is_same_v<To, From>) {
-    to.CopyRect(&from, rect, rect.left, rect.top);
+    to.CopyRect(&from, {rect.left, top, right, bottom}, rect.left, top);
   } else {
-    for (i32 y = rect.top; y < bottom; ++y) copy_row(right - rect.left, from.At(rect.left, y), to.At(rect.left, y));
+    for (i32 y = top; y < bottom; ++y) copy_row(right - rect.left, from.At(rect.left, y), to.At(rect.left, y));
   }
 }
 
@@ -63,12 +64,13 @@ void convert_pixels(const LaneColumns* lanes, i32 n, const i32* columns, i32 wid
 }
 
 template <class To, class From>
-i32 copy_bits(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect, const GX_LRect* dst_rect) {
+i32 copy_bits(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect, const GX_LRect* dst_rect,
+              const CopyRows& rows) {
   CopySide from, to;
   if (!take_rect(src_rect, src->width, src->height, &from) || !take_rect(dst_rect, dst->width, dst->height, &to))
     return ZR_Err_None;
   if (same_rect(from.rect, to.rect) && from.rect.left >= 0 && from.rect.top >= 0) {
-    copy_in_place<To, From>(src, dst, from.rect);
+    copy_in_place<To, From>(src, dst, from.rect, rows);
     return ZR_Err_None;
   }
   const LaneColumns* const lanes = lane_columns();
@@ -82,15 +84,25 @@ i32 copy_bits(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect, cons
     else
       convert_pixels(lanes, n, columns, src->width, in, out);
   };
-  return copy_scaled({*src, sizeof(From)}, from, {*dst, sizeof(To)}, to, overflow_texts, emit);
+  return copy_scaled({*src, sizeof(From)}, from, {*dst, sizeof(To)}, to, rows, overflow_texts, emit);
+}
+
+i32 copy_draft(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect, const GX_LRect* dst_rect,
+               const CopyRows& rows) {
+  return guarded([&]() -> i32 {
+    if (src == nullptr || dst == nullptr || src->data == nullptr || dst->data == nullptr)
+      return ZR_ReportBadCallbackParam(ZR_Site_CopyBitsDraft);
+    return copy_bits_any_depths(src, dst, src_rect, dst_rect, rows);
+  });
 }
 
 }  // namespace
 
-i32 copy_bits_any_depths(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect, const GX_LRect* dst_rect) {
+i32 copy_bits_any_depths(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect, const GX_LRect* dst_rect,
+                         const CopyRows& rows) {
   return on_depth(ZRp_WorldDepth(src), unknown_depth_text, [&]<class From>() {
     return on_depth(ZRp_WorldDepth(dst), unknown_depth_text,
-                    [&]<class To>() { return copy_bits<To, From>(src, dst, src_rect, dst_rect); });
+                    [&]<class To>() { return copy_bits<To, From>(src, dst, src_rect, dst_rect, rows); });
   });
 }
 
@@ -98,9 +110,10 @@ i32 copy_bits_any_depths(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src
 
 i32 ZR_CopyBits_Draft_Static(const ZR_ProgressInfo* /*progress*/, ZR_LayerDef* src, ZR_LayerDef* dst,
                              const GX_LRect* src_rect, const GX_LRect* dst_rect) {
-  return zr::guarded([&]() -> i32 {
-    if (src == nullptr || dst == nullptr || src->data == nullptr || dst->data == nullptr)
-      return ZR_ReportBadCallbackParam(ZR_Site_CopyBitsDraft);
-    return zr::copy_bits_any_depths(src, dst, src_rect, dst_rect);
-  });
+  return zr::copy_draft(src, dst, src_rect, dst_rect, {});
+}
+
+i32 ZR_CopyBits_DraftRows(ZR_LayerDef* src, ZR_LayerDef* dst, const GX_LRect* src_rect, const GX_LRect* dst_rect,
+                          i32 first_row, i32 end_row) {
+  return zr::copy_draft(src, dst, src_rect, dst_rect, {first_row, end_row});
 }

@@ -5,6 +5,8 @@
 #include <ZR/depth.h>
 #include <ZR/types.h>
 
+#include <limits>
+
 namespace zr {
 
 // Truncating division that wraps where the quotient does not fit; b is not 0.
@@ -26,6 +28,11 @@ bool take_rect(const GX_LRect* rect, i32 width, i32 height, CopySide* out);
 inline bool same_rect(const GX_LRect& a, const GX_LRect& b) {
   return a.left == b.left && a.top == b.top && a.right == b.right && a.bottom == b.bottom;
 }
+
+// Destination rows that a part of a copy writes; what it writes there does not depend on the part.
+struct CopyRows {
+  i32 first = 0, end = std::numeric_limits<i32>::max();
+};
 
 // One axis of a scaled copy: from `begin` to `end` on both sides.
 struct CopyAxis {

@@ -43,11 +43,12 @@ struct OverflowTexts {
   const char *x, *y;
 };
 
-// emit(n, source columns, source row, destination pixels, apart) writes n pixels; the source row is that of column 0.
+// Copies `rows` of the destination. emit(n, source columns, source row, destination pixels, apart) writes n pixels; the
+// source row is that of column 0.
 // Unless source and destination are apart it writes one pixel after the other.
 template <class EmitRow>
 i32 copy_scaled(const CopyPlane& src, const CopySide& from, const CopyPlane& dst, const CopySide& to,
-                const OverflowTexts& texts, EmitRow&& emit) {
+                const CopyRows& rows, const OverflowTexts& texts, EmitRow&& emit) {
   const AxisWalk x(clip_axis({from.rect.left, from.rect.right, to.rect.left, to.rect.right}, from.full, src.width,
                              to.full, dst.width),
                    src.width, dst.width);
@@ -59,13 +60,16 @@ i32 copy_scaled(const CopyPlane& src, const CopySide& from, const CopyPlane& dst
   if (y.dst_extent < 0) return failed_verification(texts.site, texts.y);
   if (y.dst_extent > 0 && x.src_extent > 0 && x.dst_extent < 0) return failed_verification(texts.site, texts.x);
 
+  const i32 first = static_cast<i32>(std::clamp<i64>(i64{rows.first} - y.first, 0, y.count));
+  const i32 end = static_cast<i32>(std::clamp<i64>(i64{rows.end} - y.first, first, y.count));
+
   // The columns' sources are worked out once for all rows, in blocks that fit a table. Where the planes may share
   // memory the rows have to be finished one by one, and a row may have changed between its copies.
   constexpr i32 block = 1024;
   i32 columns[block], row;
   const auto out = [&](i32 k, i32 column) { return dst.at(i64{x.first} + column, i64{y.first} + k); };
   if (src.may_overlap(dst)) {
-    for (i32 k = 0; k < y.count; ++k) {
+    for (i32 k = first; k < end; ++k) {
       y.sources(k, 1, &row);
       for (i32 column = 0; column < x.count; column += block) {
         const i32 n = std::min(block, x.count - column);
@@ -75,7 +79,7 @@ i32 copy_scaled(const CopyPlane& src, const CopySide& from, const CopyPlane& dst
     }
     return ZR_Err_None;
   }
-  // Rows that are shown several times are made once, beside the destination where that is large.
+  // Rows that are shown several times are made once, beside the destination where that is large, in parts or not.
   const LaneColumns* const lanes = lane_columns();
   const bool large = i64{x.count} * y.count * dst.pixel_bytes >= streamed_bytes;
   alignas(64) char kept[block * 16];
@@ -85,7 +89,7 @@ i32 copy_scaled(const CopyPlane& src, const CopySide& from, const CopyPlane& dst
     const std::size_t bytes = static_cast<std::size_t>(n) * static_cast<std::size_t>(dst.pixel_bytes);
     x.sources(column, n, columns);
     i32 row_above = -1;
-    for (i32 k = 0; k < y.count; ++k, row_above = row) {
+    for (i32 k = first; k < end; ++k, row_above = row) {
       y.sources(k, 1, &row);
       char* const pixels = out(k, column);
       if (streams) {
