@@ -3,9 +3,14 @@
 #include <HB/hb.h>
 #include <RS/rs.h>
 
+#include <cstdint>
 #include <cstdlib>
 #include <mutex>
 #include <new>
+
+#if defined(__linux__)
+#include <sys/mman.h>
+#endif
 
 namespace {
 
@@ -26,6 +31,20 @@ constexpr std::size_t largest_request = std::size_t{1} << 39;
 std::size_t size_class(std::size_t bytes) {
   const std::size_t step = bytes > page ? page : frame_alignment;
   return bytes == 0 ? step : (bytes + step - 1) / step * step;
+}
+
+// A fresh frame, else null. Rows are walked from end to end, and where pages are small the walk waits for their
+// addresses at every 4096 bytes: the system is asked for large ones where whole ones fit.
+void* new_frame(std::size_t bytes) {
+  void* const frame = std::aligned_alloc(frame_alignment, bytes);
+#if defined(__linux__) && defined(MADV_HUGEPAGE)
+  constexpr std::uintptr_t large_page = std::uintptr_t{2} << 20;
+  const auto start = reinterpret_cast<std::uintptr_t>(frame);
+  const std::uintptr_t first = (start + large_page - 1) & ~(large_page - 1), end = (start + bytes) & ~(large_page - 1);
+  // Advice: a refusal changes nothing.
+  if (frame != nullptr && first < end) madvise(reinterpret_cast<void*>(first), end - first, MADV_HUGEPAGE);
+#endif
+  return frame;
 }
 
 class FramePool {
@@ -103,10 +122,10 @@ void* RS_AllocateFrameQuiet(std::size_t bytes) {
   if (!HB_AllocationMayProceed() || bytes > largest_request) return nullptr;
   const std::size_t rounded = size_class(bytes);
   void* frame = pool.take(rounded);
-  if (frame == nullptr) frame = std::aligned_alloc(frame_alignment, rounded);
+  if (frame == nullptr) frame = new_frame(rounded);
   if (frame == nullptr) {
     pool.purge();  // frames of other sizes may be what is in the way
-    frame = std::aligned_alloc(frame_alignment, rounded);
+    frame = new_frame(rounded);
   }
   if (frame != nullptr) HB_CountAllocated(bytes);
   return frame;
