@@ -3,9 +3,9 @@
 
 #undef HWY_TARGET_INCLUDE
 #define HWY_TARGET_INCLUDE "copy/lane_columns.cc"
-#include <hwy/cache_control.h>
 #include <hwy/foreach_target.h>
 
+#include "simd/lane_stream-inl.h"
 #include "simd/lanes-inl.h"
 
 #if ZR_HAS_LANES
@@ -49,21 +49,11 @@ i32 pick_columns(i32 n, const i32* columns, i32 width, const char* src, char* ds
   return k;
 }
 
-void stream_bytes(std::size_t bytes, const char* src, char* dst) {
-  const Tag<u8> d;
-  constexpr std::size_t size = hn::MaxLanes(Tag<u8>());
-  const std::size_t ahead = (0 - reinterpret_cast<std::size_t>(dst)) % size;
-  std::size_t i = bytes < ahead ? bytes : ahead;
-  std::memcpy(dst, src, i);
-  const u8* const from = reinterpret_cast<const u8*>(src);
-  u8* const to = reinterpret_cast<u8*>(dst);
-  for (; bytes - i >= size; i += size) hn::Stream(hn::LoadU(d, from + i), d, to + i);
-  std::memcpy(dst + i, src + i, bytes - i);
-}
+void stream(std::size_t bytes, const char* src, char* dst) { stream_bytes(bytes, src, dst); }
 void finish_streams() { hwy::FlushStream(); }
 
 const LaneColumns* columns() {
-  static constexpr LaneColumns all = {&pick_columns<u32>, &pick_columns<u64>, &stream_bytes, &finish_streams};
+  static constexpr LaneColumns all = {&pick_columns<u32>, &pick_columns<u64>, &stream, &finish_streams};
   return &all;
 }
 

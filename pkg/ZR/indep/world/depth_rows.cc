@@ -17,6 +17,7 @@
 #include <hwy/highway.h>
 
 #include "simd/lane_depth-inl.h"
+#include "simd/lane_stream-inl.h"
 
 HWY_BEFORE_NAMESPACE();
 namespace zr {
@@ -230,6 +231,34 @@ void narrow(i32 n, const ZR_PixelFloat* src, To* dst) {
   narrow_clamped(n, src, dst);
 }
 
+// Blocks are made in the nearest cache, and begin on lines of the destination.
+template <class To, class From>
+void convert_past_caches(i32 n, const From* src, To* dst) {
+#if ZR_HAS_LANES
+  constexpr std::size_t line = 64;
+  constexpr i32 block = 128;
+  const std::size_t ahead = (0 - reinterpret_cast<std::uintptr_t>(dst)) % line;
+  if (ahead % sizeof(To) == 0) {
+    const i32 first = std::min(n, static_cast<i32>(ahead / sizeof(To)));
+    if (first > 0) convert(first, src, dst, false);
+    alignas(line) To made[block];
+    for (i32 i = first; i < n; i += block) {
+      const i32 count = std::min(n - i, block);
+      convert(count, src + i, made, false);
+      stream_bytes(static_cast<std::size_t>(count) * sizeof(To), made, dst + i);
+    }
+    return;
+  }
+#endif
+  convert(n, src, dst, false);
+}
+
+template void convert_past_caches(i32, const ZR_Pixel8*, ZR_Pixel16*);
+template void convert_past_caches(i32, const ZR_Pixel8*, ZR_PixelFloat*);
+template void convert_past_caches(i32, const ZR_Pixel16*, ZR_Pixel8*);
+template void convert_past_caches(i32, const ZR_Pixel16*, ZR_PixelFloat*);
+template void convert_past_caches(i32, const ZR_PixelFloat*, ZR_Pixel8*);
+template void convert_past_caches(i32, const ZR_PixelFloat*, ZR_Pixel16*);
 template void convert(i32, const ZR_Pixel8*, ZR_Pixel16*, bool);
 template void convert(i32, const ZR_Pixel8*, ZR_PixelFloat*, bool);
 template void convert(i32, const ZR_Pixel16*, ZR_Pixel8*, bool);
@@ -254,6 +283,14 @@ void convert_row(i32 n, const From* src, To* dst, bool dither) {
   HWY_STATIC_DISPATCH(convert)(n, src, dst, dither);
 }
 
+template <class To, class From>
+void stream_row(i32 n, const From* src, To* dst) {
+  ZR_RETURN_BEST(convert_past_caches(n, src, dst));
+  HWY_STATIC_DISPATCH(convert)(n, src, dst, false);
+}
+
+void finish_streamed_rows() { hwy::FlushStream(); }
+
 template <class To>
 void narrow_row(i32 n, const ZR_PixelFloat* src, To* dst) {
   ZR_RETURN_BEST(narrow(n, src, dst));
@@ -262,6 +299,12 @@ void narrow_row(i32 n, const ZR_PixelFloat* src, To* dst) {
 
 template void narrow_row(i32, const ZR_PixelFloat*, ZR_Pixel8*);
 template void narrow_row(i32, const ZR_PixelFloat*, ZR_Pixel16*);
+template void stream_row(i32, const ZR_Pixel8*, ZR_Pixel16*);
+template void stream_row(i32, const ZR_Pixel8*, ZR_PixelFloat*);
+template void stream_row(i32, const ZR_Pixel16*, ZR_Pixel8*);
+template void stream_row(i32, const ZR_Pixel16*, ZR_PixelFloat*);
+template void stream_row(i32, const ZR_PixelFloat*, ZR_Pixel8*);
+template void stream_row(i32, const ZR_PixelFloat*, ZR_Pixel16*);
 template void convert_row(i32, const ZR_Pixel8*, ZR_Pixel16*, bool);
 template void convert_row(i32, const ZR_Pixel8*, ZR_PixelFloat*, bool);
 template void convert_row(i32, const ZR_Pixel16*, ZR_Pixel8*, bool);

@@ -11,6 +11,13 @@ namespace zr {
 template <class To, class From>
 void convert_row(i32 n, const From* src, To* dst, bool dither);
 
+// The same without dither, past the caches where the processor can: for rows of worlds that do not fit there, as
+// they would push out what is still to be read. finish_streamed_rows() after the last one, on the same thread, shows
+// them to the others.
+template <class To, class From>
+void stream_row(i32 n, const From* src, To* dst);
+void finish_streamed_rows();
+
 // Float to an integer depth as scaled copies do it: the scalar rule, and alpha clamped like the colours.
 template <class To>
 void narrow_row(i32 n, const ZR_PixelFloat* src, To* dst);

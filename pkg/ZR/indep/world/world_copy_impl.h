@@ -61,6 +61,10 @@ void move_rows(const ZR_LayerDef& src, const ZR_LayerDef& dst, const CopyArea& a
     std::memmove(dst_row<T>(dst, area, row), src_row<T>(src, area, row), bytes);
 }
 
+// From here on, both worlds together, a conversion gains by storing past the caches even where its result is read
+// right after. Measured with caches of 2 MB a core.
+constexpr i64 past_caches = i64{32} << 20;
+
 template <class To, class From>
 void copy_rows(const ZR_LayerDef& src, const ZR_LayerDef& dst, const CopyArea& area, bool dither, i32 first,
                i32 count) {
@@ -70,11 +74,18 @@ void copy_rows(const ZR_LayerDef& src, const ZR_LayerDef& dst, const CopyArea& a
     const auto convert = [&](i32 y) {
       convert_row(area.columns(), src_row<From>(src, area, first + y), dst_row<To>(dst, area, first + y), dither);
     };
+    constexpr i64 bytes = sizeof(To) + sizeof(From);
     // Dither goes on from row to row.
     if (dither && std::is_same_v<To, ZR_Pixel8>)
       for (i32 y = 0; y < count; ++y) convert(y);
+    else if (area.columns() * bytes * area.rows() < past_caches)
+      each_row(0, count, area.columns(), bytes, convert);
     else
-      each_row(0, count, area.columns(), sizeof(To) + sizeof(From), convert);
+      each_band(0, count, area.columns(), bytes, [&](i32 top, i32 bottom) {
+        for (i32 y = top; y < bottom; ++y)
+          stream_row(area.columns(), src_row<From>(src, area, first + y), dst_row<To>(dst, area, first + y));
+        finish_streamed_rows();
+      });
   }
 }
 
