@@ -220,6 +220,10 @@ TYPED_TEST(LaneRows, Depths) {
           const T* const from = between ? reinterpret_cast<const T*>(reinterpret_cast<const f32*>(s) + 1) : s;
           zr::convert_row(between ? n - 1 : n, from, d, dither);
         });
+      this->template compare<Out>("past the caches", [](i32 n, T* s, T*, Out* d) {
+        const T* const from = between ? reinterpret_cast<const T*>(reinterpret_cast<const f32*>(s) + 1) : s;
+        zr::stream_row(between ? n - 1 : n, from, d);
+      });
       if constexpr (of_floats)
         this->template compare<Out>("clamped", [](i32 n, T* s, T*, Out* d) { zr::narrow_row(n, s, d); });
       this->template compare<Out>("linear floats",

@@ -50,7 +50,7 @@ Rect random_rect(Random& random, i32 width, i32 height) {
     case 2: return {true, {}};
     case 3: return {false, {0, 0, width, height}};
     case 4: return {false, {-width, -far - 1, 2 * width, far}};
-    case 5: return {false, {0, -far - 1, width, pick(random, -far, height)}};
+    case 5: return {false, {0, -far - 1, width, pick(random, -9, height)}};
     case 6: return {false, {pick(random, -9, 9), height - 7, width, pick(random, -9, 9)}};
     case 7:
     case 8:
