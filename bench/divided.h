@@ -1,9 +1,11 @@
-// What a host does with ZR_BENCH_THREADS above 1: composites, transforms, copies and blends go in bands over the
+// What a host does with ZR_BENCH_THREADS above 1: composites, transforms, copies, blends and
+// convolutions go in bands over the
 // Hostkit's threads, work on single lines is dealt out by ZR_IterateGeneric. With one thread the calls are the
 // library's own.
 #pragma once
 
 #include <ZR/copy_bits.h>
+#include <ZR/filter.h>
 #include <ZR/hostkit.h>
 #include <ZR/zr.h>
 
@@ -17,6 +19,7 @@ inline int threads_wanted() {
 }
 
 inline const auto transfer_rect = threads_wanted() == 1 ? ZR_TransferRect : ZRHost_TransferRect;
+inline const auto convolve = threads_wanted() == 1 ? ZR_Convolve : ZRHost_Convolve;
 inline const auto transform_world = threads_wanted() == 1 ? ZR_TransformWorld : ZRHost_TransformWorld;
 
 // The divided form of a copy or a blend.

@@ -3,6 +3,7 @@
 
 #include <ZR/blur.h>
 
+#include "divided.h"
 #include "peer_check.h"
 
 namespace bench {
@@ -44,7 +45,7 @@ struct Kernel {
   template <class T>
   void operator()(ZR_WorldX<T>& src, const std::vector<i32>& kernel, ZR_WorldX<T>& dst) const {
     const i32* const k = kernel.data();
-    ZR_Convolve(nullptr, &src, nullptr, ZR_ConvolveFlag_Normalised, size, k, k, k, k, &dst);
+    convolve(nullptr, &src, nullptr, ZR_ConvolveFlag_Normalised, size, k, k, k, k, &dst);
   }
 };
 inline constexpr Kernel kernel_3{"convolve-3x3", 3}, kernel_5{"convolve-5x5", 5}, kernel_15{"convolve-15x15", 15};

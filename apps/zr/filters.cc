@@ -2,6 +2,7 @@
 #include "filters.h"
 
 #include <ZR/blur.h>
+#include <ZR/hostkit.h>
 #include <ZR/world.h>
 
 #include <atomic>
@@ -72,8 +73,8 @@ OwnedWorld convolved(OwnedWorld& picture, const Convolution& convolution, const 
   if (!convolution.clamp) flags |= ZR_ConvolveFlag_NoClamp;
   const i32* const taps = kernel.taps.data();
   OwnedWorld result(picture.width(), picture.height(), picture.depth());
-  check(ZR_Convolve(&kStopOnInterrupt, picture.layer(), nullptr, flags, kernel.size, taps, taps, taps, taps,
-                    result.layer()),
+  check(ZRHost_Convolve(&kStopOnInterrupt, picture.layer(), nullptr, flags, kernel.size, taps, taps, taps, taps,
+                        result.layer()),
         where);
   return result;
 }

@@ -47,6 +47,10 @@ enum {
 ZR_API i32 ZR_Convolve(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const GX_LRect* rect, u32 flags, i32 size,
                        const i32* a_kernel, const i32* r_kernel, const i32* g_kernel, const i32* b_kernel,
                        ZR_LayerDef* dst);
+/* Of ZR_Convolve the destination rows first_row..end_row-1, with the bytes that the whole call gives them; asks nobody,
+ * and judges its arguments even where there are no such rows. Calls for different rows may run together. */
+ZR_API i32 ZR_ConvolveRows(ZR_LayerDef* src, u32 flags, i32 size, const i32* a_kernel, const i32* r_kernel,
+                           const i32* g_kernel, const i32* b_kernel, ZR_LayerDef* dst, i32 first_row, i32 end_row);
 
 /* Names kept for holders of old tables: nothing is read or done, the result is 5. */
 ZR_API i32 ZR_FastBlur_Straight(const ZR_ProgressInfo* progress, ZR_LayerDef* src, f64 radius, ZR_LayerDef* dst);

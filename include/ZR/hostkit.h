@@ -102,3 +102,12 @@ i32 ZRHost_Blend(const ZR_ProgressInfo* progress, ZR_LayerDef* src1, ZR_LayerDef
 i32 ZRHost_Blend_Premul(const ZR_ProgressInfo* progress, ZR_LayerDef* src1, ZR_LayerDef* src2, i32 ratio,
                         ZR_LayerDef* dst);
 }
+
+// The convolution of <ZR/filter.h> likewise. The progress function is asked on the calling thread, before the first row
+// and before each band that this thread takes, with the rows that are done; its answer ends the call as it ends the
+// undivided one. Undivided run: few pixels, worlds that share memory, a call from inside an iterate callback.
+extern "C" {
+i32 ZRHost_Convolve(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const GX_LRect* rect, u32 flags, i32 size,
+                    const i32* a_kernel, const i32* r_kernel, const i32* g_kernel, const i32* b_kernel,
+                    ZR_LayerDef* dst);
+}

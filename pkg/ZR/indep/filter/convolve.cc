@@ -161,11 +161,16 @@ class LaneTaps {
   LaneConvolution<T> work_ = {};
 };
 
-// Rows of a destination from the first on: where the host is asked after each, those that follow stay as they were.
+struct RowRange {
+  i32 first = 0, end = std::numeric_limits<i32>::max();
+};
+
+// Rows of a destination one after the other: where the host is asked after each, those that follow stay as they were.
 template <class T>
 class RowsInTurn {
  public:
-  RowsInTurn(const Convolution<T>& c, const ZR_LayerDef& dst, bool one_by_one) : dst_(dst), one_by_one_(one_by_one) {
+  RowsInTurn(const Convolution<T>& c, const ZR_LayerDef& dst, const RowRange& rows, bool one_by_one)
+      : dst_(dst), range_(rows), one_by_one_(one_by_one) {
     if constexpr (banded) bands_.emplace(c, dst, one_by_one);
     if (!banded || !*bands_) rows_.emplace(c);
   }
@@ -177,14 +182,15 @@ class RowsInTurn {
     if constexpr (banded) {
       if (one_by_one_)
         bands_->make_next(y);
-      else if (y == 0)
-        bands_->make_all();
+      else if (y == range_.first)
+        bands_->make_rows(range_.first, range_.end);
     }
   }
 
  private:
   static constexpr bool banded = std::is_same_v<T, ZR_PixelFloat>;
   const ZR_LayerDef& dst_;
+  RowRange range_;
   bool one_by_one_;
   std::optional<FloatBands> bands_;
   std::optional<LaneTaps<T>> rows_;
@@ -192,7 +198,7 @@ class RowsInTurn {
 
 template <class T>
 i32 convolve(const ZR_ProgressInfo* progress, const ZR_LayerDef* src, u32 flags, i32 size, const i32* a, const i32* r,
-             const i32* g, const i32* b, ZR_LayerDef* dst) {
+             const i32* g, const i32* b, ZR_LayerDef* dst, RowRange range) {
   if (src->data == nullptr || dst->data == nullptr || a == nullptr || r == nullptr || g == nullptr || b == nullptr ||
       size < 1 || size % 2 == 0)
     return ZR_ReportBadCallbackParam(ZR_Site_Convolve);
@@ -212,9 +218,11 @@ i32 convolve(const ZR_ProgressInfo* progress, const ZR_LayerDef* src, u32 flags,
     return failed_verification(ZR_Site_Convolve, "sums of a kernel of ZR_Convolve do not fit 64 bits");
 
   const bool polled = progress != nullptr && progress->progress != nullptr;
-  RowsInTurn<T> rows(c, *dst, polled);
+  range = {std::max(range.first, 0), std::min(range.end, dst->height)};
+  if (range.first >= range.end) return ZR_Err_None;
+  RowsInTurn<T> rows(c, *dst, range, polled);
   i64 work = 0;
-  for (i32 y = 0; y < dst->height; ++y) {
+  for (i32 y = range.first; y < range.end; ++y) {
     rows.make(y);
     work += static_cast<i64>(c.width) * c.height * dst->width;
     if (!polled || work < taps_before_poll) continue;
@@ -251,7 +259,7 @@ i32 ZRp_Convolve(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const GX_LRe
                  const i32* r, const i32* g, const i32* b, ZR_LayerDef* dst) {
   return zr::guarded([&]() -> i32 {
     if (src == nullptr || dst == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_Convolve);
-    return zr::convolve<T>(progress, src, flags, size, a, r, g, b, dst);
+    return zr::convolve<T>(progress, src, flags, size, a, r, g, b, dst, {});
   });
 }
 template ZR_API i32 ZRp_Convolve<ZR_Pixel8>(const ZR_ProgressInfo*, ZR_LayerDef*, const GX_LRect*, u32, i32, const i32*,
@@ -261,15 +269,31 @@ template ZR_API i32 ZRp_Convolve<ZR_Pixel16>(const ZR_ProgressInfo*, ZR_LayerDef
 template ZR_API i32 ZRp_Convolve<ZR_PixelFloat>(const ZR_ProgressInfo*, ZR_LayerDef*, const GX_LRect*, u32, i32,
                                                 const i32*, const i32*, const i32*, const i32*, ZR_LayerDef*);
 
-i32 ZR_Convolve(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const GX_LRect* rect, u32 flags, i32 size,
-                const i32* a_kernel, const i32* r_kernel, const i32* g_kernel, const i32* b_kernel, ZR_LayerDef* dst) {
-  return zr::guarded([&]() -> i32 {
+namespace zr {
+namespace {
+
+i32 convolve_any_depth(const ZR_ProgressInfo* progress, ZR_LayerDef* src, u32 flags, i32 size, const i32* a,
+                       const i32* r, const i32* g, const i32* b, ZR_LayerDef* dst, RowRange rows) {
+  return guarded([&]() -> i32 {
     if (src == nullptr || dst == nullptr) return ZR_ReportBadCallbackParam(ZR_Site_Convolve);
     const i32 depth = ZRp_WorldDepth(src);
     if (depth != ZRp_WorldDepth(dst))
-      return zr::failed_verification(ZR_Site_Convolve, "ZR_Convolve requires source and dst worlds to be same depth");
-    return zr::on_depth(depth, zr::unknown_depth_text, [&]<class T>() -> i32 {
-      return ZRp_Convolve<T>(progress, src, rect, flags, size, a_kernel, r_kernel, g_kernel, b_kernel, dst);
-    });
+      return failed_verification(ZR_Site_Convolve, "ZR_Convolve requires source and dst worlds to be same depth");
+    return on_depth(depth, unknown_depth_text,
+                    [&]<class T>() { return convolve<T>(progress, src, flags, size, a, r, g, b, dst, rows); });
   });
+}
+
+}  // namespace
+}  // namespace zr
+
+i32 ZR_Convolve(const ZR_ProgressInfo* progress, ZR_LayerDef* src, const GX_LRect*, u32 flags, i32 size,
+                const i32* a_kernel, const i32* r_kernel, const i32* g_kernel, const i32* b_kernel, ZR_LayerDef* dst) {
+  return zr::convolve_any_depth(progress, src, flags, size, a_kernel, r_kernel, g_kernel, b_kernel, dst, {});
+}
+
+i32 ZR_ConvolveRows(ZR_LayerDef* src, u32 flags, i32 size, const i32* a_kernel, const i32* r_kernel,
+                    const i32* g_kernel, const i32* b_kernel, ZR_LayerDef* dst, i32 first_row, i32 end_row) {
+  return zr::convolve_any_depth(nullptr, src, flags, size, a_kernel, r_kernel, g_kernel, b_kernel, dst,
+                                {first_row, end_row});
 }

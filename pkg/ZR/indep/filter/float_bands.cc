@@ -309,10 +309,10 @@ FloatBands::FloatBands(const Convolution<ZR_PixelFloat>& c, const ZR_LayerDef& d
 }
 FloatBands::~FloatBands() { HB_FreePtr(memory_); }
 
-void FloatBands::make_all() {
+void FloatBands::make_rows(i32 first, i32 end) {
   band_.dst_row_bytes = dst_.row_bytes;
   band_.streams = row_bytes() * dst_.height >= streamed_bytes;
-  make(0, dst_.height, static_cast<char*>(dst_.data));
+  make(first, end, row(first));
 }
 void FloatBands::make_next(i32 y) {
   if (dst_.width <= 0) return;

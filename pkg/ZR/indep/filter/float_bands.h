@@ -101,8 +101,8 @@ class FloatBands {
   FloatBands(const FloatBands&) = delete;
   FloatBands& operator=(const FloatBands&) = delete;
   explicit operator bool() const { return memory_ != nullptr; }
-  // All rows of the destination.
-  void make_all();
+  // Rows first..end-1 of the destination.
+  void make_rows(i32 first, i32 end);
   // Row y alone, those before having been made; rows that follow are made with it, and kept.
   void make_next(i32 y);
 
