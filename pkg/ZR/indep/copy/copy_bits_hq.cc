@@ -108,7 +108,7 @@ struct SampledCopy {
           copies = inner.copy(part, params);
           if (copies) copied = row + part.rows;
         }
-        RowSum<T> alphas = 0;
+        RowSum<T> alphas{};
         done = row < copied ? range.end
                             : range.first + inner.row({range.end - range.first, from, at_y, x.step, 0}, params, &alphas,
                                                       pixels + range.first);

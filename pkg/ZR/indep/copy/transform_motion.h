@@ -125,7 +125,7 @@ class DraftMotionRow final : public RowSampler<T> {
       : src_(src), params_(params), walk_(walk), count_(count), lanes_(nearest_rows_of<T>(src)) {}
 
   i32 sample(T* row, RowSum<T>* sum) override {
-    RowSum<T> total = 0;
+    RowSum<T> total{};
     const auto each = [&](i32 first, i32 end) {
       for (i32 i = first; i < end; ++i) {
         row[i] = pixel(walk_.line(i, 32768));
@@ -193,7 +193,7 @@ class BestMotionRow final : public RowSampler<T> {
     error_ = ZR_Err_None;
     if (weights_ != nullptr) compute_weights();
     const bool area = takes_area(params_);
-    RowSum<T> total = 0;
+    RowSum<T> total{};
     const auto each = [&](i32 first, i32 end) {
       for (i32 i = first; i < end; ++i) {
         const SampleLine line = walk_.line(i, 0);
@@ -293,14 +293,14 @@ class RowSums {
   // `alphas` is their sum.
   void add(const T* row, RowSum<T> alphas) {
     if constexpr (!std::is_same_v<T, ZR_PixelFloat>)
-      if (alphas == 0) return;
+      if (all_clear<T>(alphas)) return;
     if (lanes_ != nullptr)
       lanes_->add(count_, row, sums_);
     else
       for (i32 i = 0; i < count_; ++i) single_sums()[i].add(row[i]);
   }
   void mean(T* row, RowSum<T>* sum) const {
-    RowSum<T> total = 0;
+    RowSum<T> total{};
     if (lanes_ != nullptr) {
       lanes_->mean(count_, samples_, sums_, &total, row);
     } else {
@@ -346,7 +346,7 @@ class AreaMotionRow final : public RowSampler<T> {
       const GX_LPoint first = line.from_first(k);
       SourceWalk placed = walk_.first;
       placed.x = first.x, placed.y = first.y;
-      RowSum<T> alphas = 0;
+      RowSum<T> alphas{};
       note(sample_best_row<T>(samplers_, params_, placed, count_, nullptr, row, &alphas), &error);
       sums_.add(row, alphas);
     }
@@ -396,7 +396,7 @@ class ComplexMotionRow final : public RowSampler<T> {
     for (i32 k = 0; k < matrices_; ++k) {
       const Placed& placed = placed_[k];
       if (!placed.regular) continue;  // a transparent sample adds nothing
-      RowSum<T> alphas = 0;
+      RowSum<T> alphas{};
       note(sample_best_row<T>(samplers_, placed.params, placed.walk, count_, nullptr, row, &alphas), &error);
       sums_.add(row, alphas);
     }

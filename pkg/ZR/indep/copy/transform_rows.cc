@@ -73,9 +73,13 @@ template <class T>
 i32 finish_row(const ZR_ProgressInfo* progress, i32 count, const ZR_BlendModeDescriptor<T>& plan, const T* row,
                RowSum<T> sum, const T* mask, Channel<T>* alpha_row, T* out) {
   constexpr Wide<T> white = Depth<T>::white;
-  if (sum == 0 && !draws_transparent(plan.mode.mode)) return ZR_Err_None;
-  const bool opaque = sum == static_cast<RowSum<T>>(count) * static_cast<RowSum<T>>(white);
-  if (opaque && plan.mode.mode == XferInFront && mask == nullptr && plan.mode.keep_alpha == 0 &&
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+    if (sum.unsettled()) {
+      sum = {};
+      for (i32 i = 0; i < count; ++i) sum += row[i].alpha;
+    }
+  if (all_clear<T>(sum) && !draws_transparent(plan.mode.mode)) return ZR_Err_None;
+  if (all_opaque<T>(sum, count) && plan.mode.mode == XferInFront && mask == nullptr && plan.mode.keep_alpha == 0 &&
       plan.mode.opacity == static_cast<Channel<T>>(white)) {
     std::memmove(out, row, static_cast<std::size_t>(count) * sizeof(T));
     return ZR_Err_None;
@@ -171,7 +175,7 @@ i32 draw_layer(const ZR_ProgressInfo* progress, i32 quality, i32 field, const ZR
       if (i >= first && (y & 1) != skipped_parity) {
         plan.mode.seed = static_cast<i32>(seed);
         const T* const mask_pixels = mask != nullptr ? mask_row<T>(*mask, bounds.left, y, width, mask_cells) : nullptr;
-        RowSum<T> sum = 0;
+        RowSum<T> sum{};
         i32 error = sampler->sample(row, &sum);
         if (error == 0)
           error = finish_row<T>(progress, width, plan, row, sum, mask_pixels, alpha_row, dst->At(bounds.left, y));

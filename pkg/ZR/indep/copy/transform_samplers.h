@@ -46,7 +46,7 @@ class DraftRow final : public RowSampler<T> {
       : src_(src), params_(params), walk_(walk), count_(count), lanes_(nearest_rows_of<T>(src)) {}
 
   i32 sample(T* row, RowSum<T>* sum) override {
-    RowSum<T> total = 0;
+    RowSum<T> total{};
     const auto add = [&](i32 first, i32 end) {
       for (i32 i = first; i < end; ++i) total += row[i].alpha;
     };
@@ -118,7 +118,7 @@ template <class T>
 i32 sample_best_row(const RowFunctions<T>& samplers, const ZR_SampPB& params, const SourceWalk& walk, i32 count,
                     MovedRows* moved, T* row, RowSum<T>* sum) {
   i32 error = ZR_Err_None;
-  RowSum<T> total = 0;
+  RowSum<T> total{};
   const auto x_at = [&](i32 i) { return wrap_add(walk.x, wrap_mul(i, walk.step_x)); };
   const auto y_at = [&](i32 i) { return wrap_add(walk.y, wrap_mul(i, walk.step_y)); };
   const auto each = [&](SampleFunc<T>* sampler, i32 first, i32 end) {
@@ -150,6 +150,7 @@ i32 sample_best_row(const RowFunctions<T>& samplers, const ZR_SampPB& params, co
     i32 first = 0, end = count;
     while (first < end && !all_in(first++)) continue;
     while (end > first && !all_in(--end)) continue;
+    const i32 inner_first = first, inner_end = end;
     if (first < end && walk.step_x == 0x10000 && walk.step_y == 0) {
       if constexpr (std::is_same_v<T, ZR_Pixel8>)
         if (moved != nullptr && moved->suits(end - first)) {
@@ -163,6 +164,13 @@ i32 sample_best_row(const RowFunctions<T>& samplers, const ZR_SampPB& params, co
       if (samplers.inner != nullptr && first < end)
         first += samplers.inner(run(first, end), params, &total, row + first);
       each(samplers.no_clipping, first, end);
+      if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+        if (total.unsettled()) {
+          total = {};
+          for (i32 i = 0; i < inner_first; ++i) total += row[i].alpha;
+          for (i32 i = count; i-- > inner_end;) total += row[i].alpha;
+          for (i32 i = inner_first; i < inner_end; ++i) total += row[i].alpha;
+        }
     }
   }
   *sum = total;

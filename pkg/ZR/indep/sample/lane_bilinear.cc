@@ -146,38 +146,45 @@ HWY_INLINE Raw<ZR_PixelFloat> float_mix(const Raw<ZR_PixelFloat> (&p)[4], const 
            colour(in_order<2>(a, p)), colour(in_order<3>(a, p))}};
 }
 
-// Float pixels as they lie in memory, a fourth as many as there are lanes: weights are spread over a pixel's lanes.
-HWY_INLINE Floats mix_together(const Floats (&p)[4], const LaneWeights<Floats>& weights, Bools<f32> first) {
-  const auto mixed = [&](const Floats(&w)[4])
-                         HWY_ATTR { return ((w[0] * p[0] + w[1] * p[1]) + w[2] * p[2]) + w[3] * p[3]; };
-  const Bools<f32> same = p[0] == p[1] && p[0] == p[2] && p[0] == p[3];
-  if (all(same || !first)) return pick(first, p[0], mixed(weights.w));
-  Floats alpha[4], a[4];
-  for (i32 i = 0; i < 4; ++i) alpha[i] = hn::Broadcast<0>(p[i].v);
-  const Bools<f32> equal = (alpha[0] == alpha[1] && alpha[0] == alpha[2]) && alpha[0] == alpha[3];
-  for (i32 i = 0; i < 4; ++i) a[i] = weights.w[i] * pick(equal, 1.0f, alpha[i]);
-  const Floats sum = ((a[0] + a[1]) + a[2]) + a[3];
-  const Bools<f32> clear = !equal && sum == 0.0f;
-  const Floats limited = pick(equal || sum > 1.0f, 1.0f, sum), inverse = 1.0f / limited;
-  return pick(clear, 0.0f, pick(first, pick(equal, alpha[0], limited), inverse * mixed(a)));
+// The pixels of a vector of floats are loaded and stored as they lie in memory, a fourth of them at a time. In between
+// lane 4 * b + k holds the pixel b of part k.
+HWY_INLINE Ints together_order() {
+  const Ints lane = hn::Iota(Tag<i32>(), 0);
+  return masked(lane, 3) * Together::pixels + shifted_right<2>(lane);
+}
+HWY_INLINE Ints put_together(const Raw<ZR_PixelFloat>& p, ZR_PixelFloat* dst) {
+  Ints parts[4];
+  transpose_blocks(p.w, parts);
+  for (i32 k = 0; k < 4; ++k) hn::StoreU(parts[k].v, Tag<i32>(), reinterpret_cast<i32*>(dst + k * Together::pixels));
+  return p.w[0];
 }
 
-// The neighbours of such pixels of a vector of positions, at `offsets` from the upper left ones.
+// Neighbours of positions anywhere.
 class TogetherAnywhere {
  public:
-  HWY_INLINE TogetherAnywhere(const SampleRun& run, const ZR_LayerDef& src) : at_(run, src) {}
-  HWY_INLINE void next() { at_.next(); }
-  HWY_INLINE LaneWeights<Floats> load(i32 part, Floats (&p)[4]) const {
-    for (i32 i = 0; i < 4; ++i) p[i] = as_floats(at_.together(part, i & 1, i >> 1));
-    const Tag<i32> d;
-    const Ints pixel = shifted_right<2>(Ints(hn::Iota(d, 0))) + part * Together::pixels;
-    const auto spread = [&](Ints v)
-                            HWY_ATTR { return Ints(hn::TableLookupLanes(v.v, hn::IndicesFromVec(d, pixel.v))); };
-    return {spread(at_.fraction_x()), spread(at_.fraction_y())};
+  HWY_INLINE TogetherAnywhere(const SampleRun& run, const ZR_LayerDef& src) : at_(run, src) {
+    const Ints place = together_order();
+    x_ = Ints(run.x) + place * run.step_x, y_ = Ints(run.y) + place * run.step_y;
+    stride_x_ = wrap_mul(run.step_x, lane_count()), stride_y_ = wrap_mul(run.step_y, lane_count());
+  }
+  HWY_INLINE void next() {
+    at_.next();
+    x_ = x_ + Ints(stride_x_), y_ = y_ + Ints(stride_y_);
+  }
+  HWY_INLINE Ints fraction_x() const { return masked(x_, 65535); }
+  HWY_INLINE Ints fraction_y() const { return masked(y_, 65535); }
+  HWY_INLINE void row(i32 dy, Raw<ZR_PixelFloat> (&p)[2]) const {
+    for (i32 i = 0; i < 2; ++i) {
+      Ints parts[4];
+      for (i32 k = 0; k < 4; ++k) parts[k] = at_.together(k, i, dy);
+      transpose_blocks(parts, p[i].w);
+    }
   }
 
  private:
   Scattered<ZR_PixelFloat> at_;
+  Ints x_, y_;
+  i32 stride_x_, stride_y_;
 };
 
 // The same for positions along a row of the source, not more than a pixel apart: a vector of pixels holds the left
@@ -193,20 +200,25 @@ class TogetherAlong {
         x_(run.x),
         y_(run.y) {}
   HWY_INLINE void next() { x_ += step_ * lane_count(); }
-  HWY_INLINE LaneWeights<Floats> load(i32 part, Floats (&p)[4]) const {
+  HWY_INLINE Ints fraction_x() const { return masked(Ints(x_) + together_order() * step_, 65535); }
+  HWY_INLINE Ints fraction_y() const { return y_ & 0xffff; }
+  HWY_INLINE void row(i32 dy, Raw<ZR_PixelFloat> (&p)[2]) const {
     const Tag<i32> d;
-    const i32 start = x_ + part * Together::pixels * step_, first = start >> 16;
-    const Ints lane = hn::Iota(d, 0), x = Ints(start) + shifted_right<2>(lane) * step_;
-    const Ints place = shifted_left<2>(shifted_right<16>(x) - first) + masked(lane, 3);
-    const auto indices = hn::IndicesFromVec(d, place.v);
-    for (i32 i = 0; i < 4; ++i) {
-      const char* const at = row_ + (i >> 1) * static_cast<std::ptrdiff_t>(row_bytes_) +
-                             static_cast<std::ptrdiff_t>(first + (i & 1)) * i32{sizeof(ZR_PixelFloat)};
-      p[i] = as_floats(whole_window(first)
-                           ? Ints(hn::TableLookupLanes(hn::LoadU(d, reinterpret_cast<const i32*>(at)), indices))
-                           : single_pixels(at, start, first));
+    const Ints lane = hn::Iota(d, 0), steps = shifted_right<2>(lane) * step_;
+    const char* const line = row_ + dy * static_cast<std::ptrdiff_t>(row_bytes_);
+    Ints parts[2][4];
+    for (i32 k = 0; k < 4; ++k) {
+      const i32 start = x_ + k * Together::pixels * step_, first = start >> 16;
+      const Ints place = shifted_left<2>(shifted_right<16>(steps + (start & 0xffff))) + masked(lane, 3);
+      const auto indices = hn::IndicesFromVec(d, place.v);
+      for (i32 i = 0; i < 2; ++i) {
+        const char* const at = line + static_cast<std::ptrdiff_t>(first + i) * i32{sizeof(ZR_PixelFloat)};
+        parts[i][k] = whole_window(first)
+                          ? Ints(hn::TableLookupLanes(hn::LoadU(d, reinterpret_cast<const i32*>(at)), indices))
+                          : single_pixels(at, start, first);
+      }
     }
-    return {masked(x, 65535), Ints(y_ & 0xffff)};
+    for (i32 i = 0; i < 2; ++i) transpose_blocks(parts[i], p[i].w);
   }
 
  private:
@@ -223,21 +235,14 @@ class TogetherAlong {
 };
 
 template <class Neighbours>
-i32 float_vectors(const SampleRun& run, const ZR_SampPB& params, f64* sum, ZR_PixelFloat* dst) {
-  const Tag<f32> d;
-  const Ints place = hn::Iota(Tag<i32>(), 0);
-  const Bools<f32> first = {hn::RebindMask(d, (masked(place, 3) == 0).mask)};
+i32 float_vectors(const SampleRun& run, const ZR_SampPB& params, FloatAlphas* sum, ZR_PixelFloat* dst) {
   return sample_vectors<ZR_PixelFloat, Neighbours>(
       run, *params.src, sum, dst, [&](const Neighbours& at, ZR_PixelFloat* out) HWY_ATTR {
-        Bools<f32> one = Floats(0.0f) == Floats(0.0f);
-        for (i32 part = 0; part < 4; ++part) {
-          Floats p[4];
-          const LaneWeights<Floats> weights = at.load(part, p);
-          const Floats mixed = mix_together(p, weights, first);
-          hn::StoreU(mixed.v, d, reinterpret_cast<f32*>(out + part * Together::pixels));
-          one = one && (mixed == 1.0f || !first);
-        }
-        return as_ints(pick(one, 1.0f, 0.0f));  // enough to tell whether all are 1
+        Raw<ZR_PixelFloat> upper[2], lower[2];
+        at.row(0, upper);
+        at.row(1, lower);
+        const Raw<ZR_PixelFloat> p[4] = {upper[0], upper[1], lower[0], lower[1]};
+        return put_together(float_mix(p, LaneWeights<Floats>(at.fraction_x(), at.fraction_y())), out);
       });
 }
 

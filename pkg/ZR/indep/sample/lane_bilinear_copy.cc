@@ -133,7 +133,7 @@ class BetweenRows {
   }
   // A vector by the sampler's own row.
   HWY_INLINE void sample(i32 first, i32 j) const {
-    RowSum<T> alphas = 0;
+    RowSum<T> alphas{};
     sampler_(part_.run(first, lane_count(), j), params_, &alphas, part_.row(j) + first);
   }
 

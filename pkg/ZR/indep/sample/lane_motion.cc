@@ -41,6 +41,23 @@ HWY_INLINE Raw<T> pixels_at(const ZR_LayerDef& src, Ints x, Ints y) {
   return p;
 }
 
+// The same of floats, copied as they lie in memory. Returns their alphas in some order.
+HWY_INLINE Ints copy_together(const ZR_LayerDef& src, Ints x, Ints y, ZR_PixelFloat* dst) {
+  const HalfInts half;
+  const hn::Rebind<i64, Tag<f64>> wide;
+  constexpr i32 part = lane_count() / 4;
+  const Ints offset = shifted_right<16>(y) * src.row_bytes + shifted_right<16>(x) * i32{sizeof(ZR_PixelFloat)};
+  alignas(64) i64 offsets[lane_count()];
+  hn::Store(hn::PromoteTo(wide, hn::LowerHalf(half, offset.v)), wide, offsets);
+  hn::Store(hn::PromoteTo(wide, hn::UpperHalf(half, offset.v)), wide, offsets + lane_count() / 2);
+  Ints v[4];
+  for (i32 k = 0; k < 4; ++k) {
+    v[k] = load_pixels(Tag<i32>(), static_cast<const char*>(src.data), offsets + k * part);
+    hn::StoreU(v[k].v, Tag<i32>(), reinterpret_cast<i32*>(dst + k * part));
+  }
+  return alphas_together(v);
+}
+
 template <class T>
 i32 nearest_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
   constexpr i32 lanes = lane_count();
@@ -50,7 +67,10 @@ i32 nearest_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* su
   AlphaSums<T, RowSum<T>> alphas(sum);
   i32 i = 0;
   for (; run.count - i >= lanes; i += lanes) {
-    alphas.add(put(pixels_at<T>(src, x, y), dst + i), dst + i);
+    if constexpr (std::is_same_v<T, ZR_PixelFloat>)
+      alphas.add(copy_together(src, x, y, dst + i), dst + i);
+    else
+      alphas.add(put(pixels_at<T>(src, x, y), dst + i), dst + i);
     x = x + Ints(wrap_mul(run.step_x, lanes)), y = y + Ints(wrap_mul(run.step_y, lanes));
   }
   alphas.flush();

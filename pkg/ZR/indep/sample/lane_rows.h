@@ -5,6 +5,7 @@
 #include <ZR/sample.h>
 
 #include "sample/motion_line.h"
+#include "sample/row_sum.h"
 #include "world/slot_table.h"
 
 namespace zr {
@@ -13,10 +14,6 @@ namespace zr {
 struct SampleRun {
   i32 count, x, y, step_x, step_y;
 };
-
-// Wide enough for any row: 0 means wholly transparent, count times white wholly opaque.
-template <class T>
-using RowSum = std::conditional_t<std::is_same_v<T, ZR_PixelFloat>, f64, u64>;
 
 // Fills dst and adds the alphas to *sum as far as whole vectors go; returns how many pixels that are.
 template <class T>

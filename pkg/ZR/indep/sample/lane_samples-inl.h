@@ -155,6 +155,14 @@ HWY_INLINE hn::Vec<D> load_pixels(D d, const char* base, const i64* offsets) {
     return hn::Combine(d, load_pixels(half, base, offsets + hn::MaxLanes(half) / 4), load_pixels(half, base, offsets));
   }
 }
+// The alphas of four vectors of float pixels as they lie in memory, those of vector k in lane k of each four.
+HWY_INLINE Ints alphas_together(const Ints (&v)[4]) {
+  const Tag<i32> d;
+  const hn::RepartitionToWide<Tag<i32>> pairs;
+  const auto low = hn::BitCast(pairs, hn::InterleaveLower(d, v[0].v, v[1].v));
+  const auto high = hn::BitCast(pairs, hn::InterleaveLower(d, v[2].v, v[3].v));
+  return hn::BitCast(d, hn::InterleaveLower(pairs, low, high));
+}
 
 // The two words of 8 bytes at base + offset for each lane; offsets of the lower and the upper half.
 template <class Offsets>
@@ -373,7 +381,7 @@ class Adjacent {
 
 // ---------------------------------------------------------------------------------------- rows
 
-// Alphas of vectors of pixels. Those of floats are added one by one: the order is part of the sum.
+// Alphas of vectors of pixels. A sum of floats is added one by one, as the order is part of it.
 template <class T, class Sum>
 class AlphaSums {
  public:
@@ -382,7 +390,7 @@ class AlphaSums {
     if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
       Sum total = *total_;
       // Ones can be added together where all their sums are exact: a few bits of room and a short fraction.
-      constexpr Sum grid = std::is_same_v<Sum, f32> ? Sum{0x1.8p15f} : Sum{0x1.8p22};
+      constexpr Sum grid = 0x1.8p15f;
       if (all(as_floats(alphas) == 1.0f) && (total + grid) - grid == total && total < grid / 4) {
         total += static_cast<Sum>(lane_count());
       } else {
@@ -410,6 +418,31 @@ class AlphaSums {
   Sum* total_;
   Ints lanes_;
   i32 vectors_ = 0;
+};
+template <>
+class AlphaSums<ZR_PixelFloat, FloatAlphas> {
+  using Words = hn::Rebind<u32, Tag<i32>>;
+
+ public:
+  explicit HWY_INLINE AlphaSums(FloatAlphas* total)
+      : total_(total), least_(hn::Set(Words(), ~u32{0})), most_(hn::Zero(Words())) {}
+  // In any order.
+  HWY_INLINE void add(Ints alphas, const ZR_PixelFloat*) {
+    const auto bits = hn::BitCast(Words(), alphas.v);
+    least_ = hn::Min(least_, bits), most_ = hn::Max(most_, bits);
+    pixels_ += lane_count();
+  }
+  HWY_INLINE void flush() {
+    if (pixels_ == 0) return;
+    total_->add_lanes(hn::GetLane(hn::MinOfLanes(Words(), least_)), hn::GetLane(hn::MaxOfLanes(Words(), most_)),
+                      pixels_);
+    pixels_ = 0;
+  }
+
+ private:
+  FloatAlphas* total_;
+  hn::Vec<Words> least_, most_;
+  i32 pixels_ = 0;
 };
 
 // Scattered pixels of four floats fill a vector of four lanes each by itself: there single pixels are as fast or
