@@ -35,6 +35,10 @@ const Work works[] = {
      [](Size s) {
        return std::vector{placement(0, 1, s.width, s.height), placement(0, 1, s.width, s.height, 24.3, 9)};
      }},
+    {"transform-motion-moved-bicubic", 2,
+     [](Size s) {
+       return std::vector{placement(0, 1, s.width, s.height), placement(0, 1, s.width, s.height, 24.3, 9)};
+     }},
     {"transform-motion-reduced", 1,
      [](Size s) {
        return std::vector{placement(0, reduced, s.width, s.height), placement(0, reduced, s.width, s.height, 24.3, 9)};

@@ -59,7 +59,8 @@ struct Own<ZR_Pixel8> {
                    *bicubic = &ZR_SubpixelNoClipBicubic8, *clipping = &ZR_SubpixelSample_Straight;
   static constexpr SamplePlusFunc<ZR_Pixel8>*bilinear_flag = &ZR_SubpixelSamplePlus_Straight,
                    *bicubic_flag = &ZR_SubpixelSpanSampleAllInBicubic8;
-  static constexpr SampleTranslateFunc<ZR_Pixel8>* translate = &ZR_SubpixelSampleTranslateNoClip_Straight;
+  static constexpr SampleTranslateFunc<ZR_Pixel8>*bilinear_translate = &ZR_SubpixelSampleTranslateNoClip_Straight,
+                   *bicubic_translate = &ZR_SubpixelSampleTranslateNoClipBicubic8;
 };
 template <>
 struct Own<ZR_Pixel16> {
@@ -67,7 +68,8 @@ struct Own<ZR_Pixel16> {
                    *bicubic = &ZR_SubpixelNoClipBicubic16, *clipping = &ZR_SubpixelSample_Straight16;
   static constexpr SamplePlusFunc<ZR_Pixel16>*bilinear_flag = &ZR_SubpixelSamplePlus_Straight16,
                    *bicubic_flag = &ZR_SubpixelSpanSampleAllInBicubic16;
-  static constexpr SampleTranslateFunc<ZR_Pixel16>* translate = &ZR_SubpixelSampleTranslateNoClip_Straight16;
+  static constexpr SampleTranslateFunc<ZR_Pixel16>*bilinear_translate = &ZR_SubpixelSampleTranslateNoClip_Straight16,
+                   *bicubic_translate = &ZR_SubpixelSampleTranslateNoClipBicubic16;
 };
 template <>
 struct Own<ZR_PixelFloat> {
@@ -75,7 +77,9 @@ struct Own<ZR_PixelFloat> {
                    *bicubic = &ZR_SubpixelNoClipBicubicFloat, *clipping = &ZR_SubpixelBilinearFloat;
   static constexpr SamplePlusFunc<ZR_PixelFloat>*bilinear_flag = &ZR_SubpixelSpanSampleAllInBilinearFloat,
                    *bicubic_flag = &ZR_SubpixelSpanSampleAllInBicubicFloat;
-  static constexpr SampleTranslateFunc<ZR_PixelFloat>* translate = &ZR_SubpixelSampleTranslateNoClipBilinearFloat;
+  static constexpr SampleTranslateFunc<ZR_PixelFloat>*bilinear_translate =
+                       &ZR_SubpixelSampleTranslateNoClipBilinearFloat,
+                   *bicubic_translate = &ZR_SubpixelSampleTranslateNoClipBicubicFloat;
 };
 
 }  // namespace
@@ -106,14 +110,15 @@ template <class T>
 MotionRows<T> motion_rows(const SampleFunctions<T>& samplers) {
   MotionRows<T> rows;
   const LaneRows<T>* lanes = nullptr;
+  SampleTranslateFunc<T>* translate = nullptr;
   if (samplers.no_clipping == Own<T>::bilinear && samplers.inside_flag == Own<T>::bilinear_flag)
-    lanes = lane_bilinear_rows<T>(), rows.before = 0, rows.behind = 1;
+    lanes = lane_bilinear_rows<T>(), translate = Own<T>::bilinear_translate, rows.before = 0, rows.behind = 1;
   else if (samplers.no_clipping == Own<T>::bicubic && samplers.inside_flag == Own<T>::bicubic_flag)
-    lanes = lane_bicubic_rows<T>(), rows.before = rows.behind = 2;
+    lanes = lane_bicubic_rows<T>(), translate = Own<T>::bicubic_translate, rows.before = rows.behind = 2;
   if (lanes == nullptr) return rows;
   rows.each = lanes->motion;
-  const bool own_weights = samplers.translate == Own<T>::translate &&
-                           slot<ZR_Slot_sample_compute_weight>() == &ZR_SubpixelSampleComputeWeight;
+  const bool own_weights =
+      samplers.translate == translate && slot<ZR_Slot_sample_compute_weight>() == &ZR_SubpixelSampleComputeWeight;
   if (own_weights) rows.weighted = lanes->weighted_motion;
   return rows;
 }

@@ -7,6 +7,7 @@
 
 #include "simd/lanes-inl.h"
 #if ZR_HAS_LANES
+#include "sample/lane_four-inl.h"
 #include "sample/lane_motion-inl.h"
 
 HWY_BEFORE_NAMESPACE();
@@ -24,9 +25,6 @@ struct LaneCubicWeights {
   }
 };
 
-struct FloatPixels {
-  Floats c[4];
-};
 HWY_INLINE Floats in_order(const Floats (&w)[4], const FloatPixels (&p)[4], i32 k) {
   return ((w[0] * p[0].c[k] + w[1] * p[1].c[k]) + w[2] * p[2].c[k]) + w[3] * p[3].c[k];
 }
@@ -99,10 +97,45 @@ i32 bicubic_motion(const MotionRun& run, const ZR_SampPB& params, RowSum<T>* sum
   });
 }
 
+// By the given weights, cut to the channels' low bits.
+template <class T, class Neighbours>
+HWY_INLINE Raw<T> four_neighbours_at(const Neighbours& at, const LaneWeights<Floats>& weights) {
+  Raw<T> upper[2], lower[2];
+  at.row(0, 0, upper);
+  at.row(0, 1, lower);
+  const FloatPixels mixed = mix_in_order<T>({upper[0], upper[1], lower[0], lower[1]}, weights);
+  if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
+    return as_raw(mixed);
+  } else {
+    const auto channel = [](Floats c) HWY_ATTR {
+      const Floats rounded = c + 0.5f;  // what needs more than 31 bits counts as 2^31, whose low bits are 0
+      return masked(fitting_int(pick(rounded < 0x1p31f, rounded, 0.0f)), std::numeric_limits<Channel<T>>::max());
+    };
+    return packed<T>(channel(mixed.c[0]), channel(mixed.c[1]), channel(mixed.c[2]), channel(mixed.c[3]));
+  }
+}
+
+// The first and the last sample are convolved, those between them are of four neighbours.
+template <class T>
+i32 bicubic_weighted_motion(const MotionRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
+  const LaneCubicWeights across[2] = {LaneCubicWeights(Ints(run.first.x & 0xffff)),
+                                      LaneCubicWeights(Ints(run.last.x & 0xffff))};
+  const LaneCubicWeights down[2] = {LaneCubicWeights(Ints(run.first.y & 0xffff)),
+                                    LaneCubicWeights(Ints(run.last.y & 0xffff))};
+  const SampleLine line(run.first.x, run.first.y, run.last.x, run.last.y, run.samples);
+  const i32 last = run.samples - 1;
+  return weighted_vectors<T>(
+      run, line, last, *params.src, sum,
+      dst, [&](const Adjacent<T>& at, i32 k) HWY_ATTR __attribute__((always_inline)) {
+        if (k == 0 || k == last) return convolved_at<T>(at, across[k != 0], down[k != 0]);
+        return four_neighbours_at<T>(at, LaneWeights<Floats>(run.weights[k]));
+      });
+}
+
 template <class T>
 const LaneRows<T>* bicubic_rows() {
   static constexpr LaneRows<T> rows = [] {
-    LaneRows<T> r = {nullptr, &bicubic_vectors<T, Adjacent<T>, AlphaSum<T>>, nullptr, nullptr};
+    LaneRows<T> r = {nullptr, &bicubic_vectors<T, Adjacent<T>, AlphaSum<T>>, nullptr, &bicubic_weighted_motion<T>};
     if constexpr (gains_from_lanes<T>) {
       r.no_clip = &bicubic_vectors<T, Scattered<T>, RowSum<T>>;
       r.motion = &bicubic_motion<T>;

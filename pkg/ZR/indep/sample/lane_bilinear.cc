@@ -7,42 +7,18 @@
 
 #include "simd/lanes-inl.h"
 #if ZR_HAS_LANES
+#include "sample/lane_four-inl.h"
 #include "sample/lane_motion-inl.h"
 
 HWY_BEFORE_NAMESPACE();
 namespace zr {
 namespace HWY_NAMESPACE {
 
-template <class Real>
-struct LaneWeights {
-  Real w[4];
-
-  HWY_INLINE LaneWeights(Ints fraction_x, Ints fraction_y) {
-    const Real unit(0x1p-16f), fx = to_real<Real>(fraction_x) * unit, fy = to_real<Real>(fraction_y) * unit;
-    w[3] = fx * fy;
-    w[1] = fx - w[3];
-    w[2] = fy - w[3];
-    w[0] = Real(1.0f) - w[1] - w[2] - w[3];
-  }
-  // Of the caller.
-  explicit HWY_INLINE LaneWeights(const f64* numbers) {
-    using Number = std::conditional_t<std::is_same_v<Real, Floats>, f32, f64>;
-    for (i32 i = 0; i < 4; ++i) w[i] = Real(static_cast<Number>(numbers[i]));
-  }
-};
-
 template <int k, class Real, class T>
 HWY_INLINE Real in_pairs(const Real (&w)[4], const Raw<T> (&p)[4]) {
   return (w[0] * real_channel_of<Real, k>(p[0]) + w[1] * real_channel_of<Real, k>(p[1])) +
          (w[2] * real_channel_of<Real, k>(p[2]) + w[3] * real_channel_of<Real, k>(p[3]));
 }
-template <int k, class T>
-HWY_INLINE Floats in_order(const Floats (&w)[4], const Raw<T> (&p)[4]) {
-  return ((w[0] * real_channel_of<Floats, k>(p[0]) + w[1] * real_channel_of<Floats, k>(p[1])) +
-          w[2] * real_channel_of<Floats, k>(p[2])) +
-         w[3] * real_channel_of<Floats, k>(p[3]);
-}
-
 // Weights are within a rounding of 0..1, so that all results fit their channels. `takes_first`: lanes that copy the
 // upper left neighbour whatever it holds.
 template <class T, class Real>
@@ -127,23 +103,6 @@ i32 sixteenth_vectors(const SampleRun& run, const ZR_SampPB& params, Sum* sum, Z
                                                    mixed = integer_mix<ZR_Pixel8>(p, phase, Ints(0) != Ints(0));
                                                  return put(mixed, out);
                                                });
-}
-
-HWY_INLINE Raw<ZR_PixelFloat> float_mix(const Raw<ZR_PixelFloat> (&p)[4], const LaneWeights<Floats>& weights) {
-  Floats alpha[4];
-  for (i32 i = 0; i < 4; ++i) alpha[i] = as_floats(p[i].w[0]);
-  const Bools<f32> equal = (alpha[0] == alpha[1] && alpha[0] == alpha[2]) && alpha[0] == alpha[3];
-  if (all(equal))
-    return {{p[0].w[0], as_ints(in_order<1>(weights.w, p)), as_ints(in_order<2>(weights.w, p)),
-             as_ints(in_order<3>(weights.w, p))}};
-  Floats a[4];
-  for (i32 i = 0; i < 4; ++i) a[i] = weights.w[i] * pick(equal, 1.0f, alpha[i]);
-  const Floats sum = ((a[0] + a[1]) + a[2]) + a[3];
-  const Bools<f32> clear = !equal && sum == 0.0f;
-  const Floats limited = pick(equal || sum > 1.0f, 1.0f, sum), inverse = 1.0f / limited;
-  const auto colour = [&](Floats c) HWY_ATTR { return as_ints(pick(clear, 0.0f, inverse * c)); };
-  return {{as_ints(pick(clear, 0.0f, pick(equal, alpha[0], limited))), colour(in_order<1>(a, p)),
-           colour(in_order<2>(a, p)), colour(in_order<3>(a, p))}};
 }
 
 // The pixels of a vector of floats are loaded and stored as they lie in memory, a fourth of them at a time. In between
@@ -242,7 +201,7 @@ i32 float_vectors(const SampleRun& run, const ZR_SampPB& params, FloatAlphas* su
         at.row(0, upper);
         at.row(1, lower);
         const Raw<ZR_PixelFloat> p[4] = {upper[0], upper[1], lower[0], lower[1]};
-        return put_together(float_mix(p, LaneWeights<Floats>(at.fraction_x(), at.fraction_y())), out);
+        return put_together(as_raw(mix_in_order(p, LaneWeights<Floats>(at.fraction_x(), at.fraction_y()))), out);
       });
 }
 
@@ -256,7 +215,7 @@ HWY_INLINE Raw<T> mixed_at(const Neighbours& at, const LaneWeights<RealOf<T>>& w
   at.row(0, 1, lower);
   const Raw<T> p[4] = {upper[0], upper[1], lower[0], lower[1]};
   if constexpr (std::is_same_v<T, ZR_PixelFloat>)
-    return float_mix(p, weights);
+    return as_raw(mix_in_order(p, weights));
   else
     return integer_mix<T>(p, weights, takes_first);
 }
@@ -305,29 +264,18 @@ i32 bilinear_motion(const MotionRun& run, const ZR_SampPB& params, RowSum<T>* su
   });
 }
 
-// Every sample has one phase for all pixels, and its neighbours lie side by side.
 template <class T>
 i32 bilinear_weighted_motion(const MotionRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
-  constexpr i32 lanes = lane_count();
-  const i32 n = run.samples;
-  const SampleLine line(run.first.x, run.first.y, run.last.x, run.last.y, n);
-  const InnerSamples inner = copies_whole<T> ? inner_samples(line) : InnerSamples{1, n - 1};
-  AlphaSums<T, RowSum<T>> alphas(sum);
-  i32 i = 0;
-  for (; run.first.count - i >= lanes; i += lanes) {
-    MotionSums<T> sums;
-    for (i32 k = 0; k < n; ++k) {
-      const GX_LPoint p = k < inner.end ? line.from_first(k) : line.from_last(n - 1 - k);
-      const Adjacent<T> at({lanes, p.x + i * 0x10000, p.y, 0x10000, 0}, *params.src);
-      using Weights = LaneWeights<RealOf<T>>;
-      const bool walked = k >= inner.first && k < inner.end;
-      const Weights weights = walked ? Weights(run.weights[k]) : Weights(at.fraction_x(), at.fraction_y());
-      sums.add(mixed_at<T>(at, weights, at.whole()));
-    }
-    alphas.add(put(sums.mean(n), dst + i), dst + i);
-  }
-  alphas.flush();
-  return i;
+  using Weights = LaneWeights<RealOf<T>>;
+  const SampleLine line(run.first.x, run.first.y, run.last.x, run.last.y, run.samples);
+  const InnerSamples inner = copies_whole<T> ? inner_samples(line) : InnerSamples{1, run.samples - 1};
+  return weighted_vectors<T>(
+      run, line, inner.end, *params.src, sum,
+      dst, [&](const Adjacent<T>& at, i32 k) HWY_ATTR __attribute__((always_inline)) {
+        const bool walked = k >= inner.first && k < inner.end;
+        const Weights weights = walked ? Weights(run.weights[k]) : Weights(at.fraction_x(), at.fraction_y());
+        return mixed_at<T>(at, weights, at.whole());
+      });
 }
 
 template <class T>

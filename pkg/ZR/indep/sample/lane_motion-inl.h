@@ -200,6 +200,28 @@ HWY_INLINE i32 motion_vectors(const MotionRun& run, RowSum<T>* sum, T* dst, Samp
   return i;
 }
 
+// The same for runs with weights: every sample has one phase for all pixels, and its neighbours lie side by side.
+// sample(neighbours, k) gives the pixels of sample k; it has to be inlined, lest neighbours go by way of memory. From
+// `late` on samples are counted from the last one.
+template <class T, class Sample>
+HWY_INLINE i32 weighted_vectors(const MotionRun& run, const SampleLine& line, i32 late, const ZR_LayerDef& src,
+                                RowSum<T>* sum, T* dst, Sample sample) {
+  constexpr i32 lanes = lane_count();
+  const i32 n = run.samples;
+  AlphaSums<T, RowSum<T>> alphas(sum);
+  i32 i = 0;
+  for (; run.first.count - i >= lanes; i += lanes) {
+    MotionSums<T> sums;
+    for (i32 k = 0; k < n; ++k) {
+      const GX_LPoint p = k < late ? line.from_first(k) : line.from_last(n - 1 - k);
+      sums.add(sample(Adjacent<T>({lanes, p.x + i * 0x10000, p.y, 0x10000, 0}, src), k));
+    }
+    alphas.add(put(sums.mean(n), dst + i), dst + i);
+  }
+  alphas.flush();
+  return i;
+}
+
 }  // namespace HWY_NAMESPACE
 }  // namespace zr
 HWY_AFTER_NAMESPACE();
