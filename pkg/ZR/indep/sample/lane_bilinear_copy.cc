@@ -3,6 +3,8 @@
 // rounded result is the same; the few other vectors are left to the sampler's own rows.
 #include "sample/lane_copies.h"
 
+#include <bit>
+
 #undef HWY_TARGET_INCLUDE
 #define HWY_TARGET_INCLUDE "sample/lane_bilinear_copy.cc"
 #include <hwy/foreach_target.h>
@@ -27,7 +29,7 @@ struct Doubt {
 };
 template <>
 struct Doubt<ZR_Pixel16> {
-  static constexpr f32 of_sums = 0x1p-24f, of_quotients = 0x1p-24f, over_alpha = 0.0f;
+  static constexpr f32 of_sums = 0x1p-24f;
 };
 
 // Vectors of the destination that are worked on together: two rows of numbers stay in the first cache.
@@ -74,23 +76,34 @@ class BetweenRows {
         write_clear(first, vectors, j, dst);
         continue;
       }
+      u32 unsure = 0;
       const Real below(static_cast<f32>(y & 65535) * 0x1p-16f), beside = Real(1.0f) - below;
       if (upper.alphas == Alphas::white && lower.alphas == Alphas::white) {
         fill<Row::colours>(first, vectors, &upper);
         fill<Row::colours>(first, vectors, &lower);
         for (i32 i = 0; i < vectors; ++i)
-          if (!write_opaque(i, upper, lower, beside, below, dst + i * lane_count()))
-            sample(first + i * lane_count(), j);
+          unsure |= u32{!write_opaque(i, upper, lower, beside, below, dst + i * lane_count())} << i;
       } else {
         fill<Row::weighted>(first, vectors, &upper);
         fill<Row::weighted>(first, vectors, &lower);
         for (i32 i = 0; i < vectors; ++i)
-          if (!write_any(i, upper, lower, beside, below, dst + i * lane_count())) sample(first + i * lane_count(), j);
+          unsure |= u32{!write_any(i, upper, lower, beside, below, dst + i * lane_count())} << i;
       }
+      left_[left_rows_] = {j, unsure};
+      left_rows_ += unsure != 0 ? 1 : 0;
+      if (left_rows_ == most_left) sample_left(first);
     }
+    sample_left(first);
   }
 
  private:
+  // Vectors that are left to the sampler wait for each other: a branch at each of them is foretold wrongly.
+  HWY_INLINE void sample_left(i32 first) {
+    for (i32 k = 0; k < left_rows_; ++k)
+      for (u32 vectors = left_[k].vectors; vectors != 0; vectors &= vectors - 1)
+        sample(first + std::countr_zero(vectors) * lane_count(), left_[k].row);
+    left_rows_ = 0;
+  }
   HWY_INLINE SampleRun run_at(i32 first, i32 vectors, i32 y) const {
     return {vectors * lane_count(), part_.x + first * part_.step_x, y << 16, part_.step_x, 0};
   }
@@ -169,20 +182,35 @@ class BetweenRows {
     const auto between = [&](i32 c)
                              HWY_ATTR { return mul_add(upper.channel[c][i], beside, lower.channel[c][i] * below); };
     const Real alpha = between(0), inverse = inverse_of(alpha);
-    Rounding<T> rounding;
-    Real doubt(Doubt<T>::of_quotients);
-    if constexpr (Doubt<T>::over_alpha != 0) doubt = mul_add(inverse, Doubt<T>::over_alpha, doubt);
-    const auto colour = [&](i32 c) HWY_ATTR { return rounding.nearest(between(c), inverse, doubt); };
-    const Ints whole = rounding.nearest(alpha, 1.0f, Doubt<T>::of_sums);
-    store(packed<T>(whole, colour(1), colour(2), colour(3)), dst);
     // Nothing is known of colours where there is next to no alpha.
-    return none(rounding.unsure() || whole == 0);
+    if constexpr (std::is_same_v<T, ZR_Pixel8>) {
+      const FixedRounding rounding(mul_add(inverse, Doubt<T>::over_alpha, Doubt<T>::of_quotients));
+      const Floats by = inverse * 65536.0f;
+      const FixedPixels p = {rounding.nearest(alpha, 65536.0f), rounding.nearest(between(1), by),
+                             rounding.nearest(between(2), by), rounding.nearest(between(3), by)};
+      store(p.whole(), dst);
+      return none(rounding.unsure(p) || p.alpha < 65536);
+    } else {
+      DoubleRounding rounding;
+      const auto colour = [&](i32 c) HWY_ATTR { return rounding.nearest(between(c), inverse, 0.0); };
+      const Ints whole = rounding.nearest(alpha, 1.0, 0.0);
+      store(packed<T>(whole, colour(1), colour(2), colour(3)), dst);
+      return none(rounding.unsure() || whole == 0);
+    }
   }
 
   const CopyPart<T>& part_;
   const ZR_SampPB& params_;
   LaneRowFunc<T>* sampler_;
   f32 doubt_of_sums_ = Doubt<T>::of_sums;
+  struct Left {
+    i32 row;
+    u32 vectors;  // a bit for each of them
+  };
+  static constexpr i32 most_left = 64;
+  static_assert(stretch <= 32);
+  Left left_[most_left];
+  i32 left_rows_ = 0;
   Real right_[stretch];  // the right neighbour's weight
   Row rows_[2];
 };

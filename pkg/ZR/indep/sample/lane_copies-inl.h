@@ -64,6 +64,41 @@ class FloatRounding {
  private:
   Ints differences_;
 };
+
+// 8-bit pixels in 65536ths of a step.
+class FixedPixels {
+  using Halves = hn::Repartition<u16, Tag<i32>>;
+  static HWY_INLINE hn::Vec<Halves> half(Ints v) { return hn::BitCast(Halves(), v.v); }
+
+ public:
+  Ints alpha, red, green, blue;
+
+  // The whole steps.
+  HWY_INLINE Raw<ZR_Pixel8> whole() const {
+    const auto outer = hn::OddEven(half(green), half(shifted_right<16>(alpha)));
+    const auto inner = hn::OddEven(half(blue), half(shifted_right<16>(red)));
+    return {{Ints(hn::BitCast(Tag<i32>(), hn::Or(outer, hn::ShiftLeft<8>(inner))))}};
+  }
+  HWY_INLINE Ints least_fraction() const {
+    const auto least = hn::Min(hn::Min(half(alpha), half(red)), hn::Min(half(green), half(blue)));
+    return masked(Ints(hn::BitCast(Tag<i32>(), least)), 65535);
+  }
+};
+// The same for four channels under one doubt: what lies two doubts or more above a step is above it for certain, and
+// below the next. Numbers below 256 steps are rounded to a 65536th at most, which is added.
+class FixedRounding {
+ public:
+  explicit HWY_INLINE FixedRounding(Floats doubt) : units_(mul_add(doubt, 65536.0f, 1.0f)), half_(units_ + 32768.0f) {}
+  // Of v * by / 65536.
+  HWY_INLINE Ints nearest(Floats v, Floats by) const { return fitting_int(mul_add(v, by, half_)); }
+  HWY_INLINE Bools<i32> unsure(const FixedPixels& p) const {
+    return !(p.least_fraction() > fitting_int(units_ + units_));
+  }
+
+ private:
+  Floats units_, half_;
+};
+
 class DoubleRounding {
  public:
   HWY_INLINE DoubleRounding() : most_(0.0) {}
