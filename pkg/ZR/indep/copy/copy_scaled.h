@@ -44,8 +44,7 @@ struct OverflowTexts {
 };
 
 // Copies `rows` of the destination. emit(n, source columns, source row, destination pixels, apart) writes n pixels; the
-// source row is that of column 0.
-// Unless source and destination are apart it writes one pixel after the other.
+// source row is that of column 0. Unless source and destination are apart it writes one pixel after the other.
 template <class EmitRow>
 i32 copy_scaled(const CopyPlane& src, const CopySide& from, const CopyPlane& dst, const CopySide& to,
                 const CopyRows& rows, const OverflowTexts& texts, EmitRow&& emit) {

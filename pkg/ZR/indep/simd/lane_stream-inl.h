@@ -1,9 +1,9 @@
 // Stores past the caches, for the lanes of one instruction set. Included once for each.
-#if defined(ZR_LANE_STREAM_INL_H) == defined(HWY_TARGET_TOGGLE)
-#ifdef ZR_LANE_STREAM_INL_H
-#undef ZR_LANE_STREAM_INL_H
+#if defined(ZR_SIMD_LANE_STREAM_INL_H) == defined(HWY_TARGET_TOGGLE)
+#ifdef ZR_SIMD_LANE_STREAM_INL_H
+#undef ZR_SIMD_LANE_STREAM_INL_H
 #else
-#define ZR_LANE_STREAM_INL_H
+#define ZR_SIMD_LANE_STREAM_INL_H
 #endif
 
 #include <hwy/cache_control.h>
