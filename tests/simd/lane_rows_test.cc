@@ -21,6 +21,7 @@
 #include "world/alpha_rows.h"
 #include "world/depth_rows.h"
 #include "world/premul_rows.h"
+#include "world/random.h"
 
 namespace {
 
@@ -117,6 +118,36 @@ TYPED_TEST(LaneRows, WholeRows) {
       if (this->HasFatalFailure()) return;
     }
   }
+}
+
+// Lots drawn by whole vectors, from seeds around the modulus of their generator and where 32 bits end.
+TYPED_TEST(LaneRows, LotsFromAnySeed) {
+  using T = TypeParam;
+  constexpr i32 n = 2000;
+  std::vector<T> src(n), dst, expected;
+  for (T& pixel : src) {
+    const f32 alpha = static_cast<f32>(this->random_() % 1000) / 1000.0f;
+    pixel = {part_of_white<T>(0.01f + 0.98f * alpha), 1, 0, 0};
+  }
+  src[n / 2].alpha = 0;
+  ZR_BlendingMode<T> record{};
+  record.mode = XferDissolve;
+  record.opacity = part_of_white<T>(1);
+  for (const u32 around : {0u, zr::seed_modulus, 2 * zr::seed_modulus, zr::seed_step * 100 + zr::seed_high_factor})
+    for (u32 seed = around - 20; seed != around + 20; ++seed) {
+      record.seed = static_cast<i32>(seed);
+      for (int level = 0; level < 4 && Instructions::has(level); ++level) {
+        const Instructions instructions(level);
+        ZR_InnerBlendingFunc<T> row = nullptr;
+        ASSERT_EQ((ZR_GetInnerBlendingFunc<T, false, false>(XferDissolve, &row)), 0);
+        dst.assign(n, T{});
+        ASSERT_EQ(row(n, &record, nullptr, src.data(), nullptr, dst.data()), 0);
+        if (level == 0) expected = dst;
+        for (std::size_t i = 0; i < n; ++i)
+          ASSERT_TRUE(same_pixel(dst[i], expected[i]))
+              << "seed " << seed << " by " << Instructions::names[level] << ", pixel " << i;
+      }
+    }
 }
 
 // Quotients of all bytes, and of many deeper channels, where vectors estimate them.

@@ -1,4 +1,4 @@
-// Dissolving on lanes. Lots are drawn one after the other, as each leaves the seed of the next; the rest is not.
+// Dissolving on lanes.
 #if defined(ZR_COMPOSITE_LANE_DISSOLVE_INL_H) == defined(HWY_TARGET_TOGGLE)
 #ifdef ZR_COMPOSITE_LANE_DISSOLVE_INL_H
 #undef ZR_COMPOSITE_LANE_DISSOLVE_INL_H
@@ -6,10 +6,10 @@
 #define ZR_COMPOSITE_LANE_DISSOLVE_INL_H
 #endif
 
+#include "composite/lane_lots-inl.h"
 #include "composite/mode_kinds-inl.h"
 #include "composite/row_overlap.h"
 #include "simd/lane_row-inl.h"
-#include "world/random.h"
 
 HWY_BEFORE_NAMESPACE();
 namespace zr {
@@ -24,16 +24,6 @@ HWY_INLINE auto dissolves(Ints lot, Number<T> A) {
     return masked(lot, 255) <= A;
   else
     return lot < A;
-}
-
-// Lots for the lanes whose bits are set. The seed steps on with every lane.
-HWY_INLINE Ints drawn_lots(u32 bits, i32 count, u32& seed) {
-  HWY_ALIGN i32 lots[lane_count()] = {};
-  u32 next = seed;
-  for (i32 i = 0; i < count; ++i, ++next)
-    if ((bits >> i & 1) != 0) lots[i] = random_number(next = next_seed(next));
-  seed = next;
-  return hn::Load(Tag<i32>(), lots);
 }
 
 template <class N>
@@ -55,17 +45,17 @@ i32 dissolve_row(i32 n, const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingT
         n, mode, tables, src, mask, dst);
   const Wide opacity = mode->opacity;
   const bool keep_alpha = mode->keep_alpha != 0;
-  u32 seed = static_cast<u32>(mode->seed);
-  each_block<Apart>(n, src, mask, dst, [&](const T* from, const T* cover, T* to, i32 count) HWY_ATTR {
+  Lots lots(mode->seed);
+  each_block<Apart>(n, src, mask, dst, [&](const T* from, const T* cover, T* to, i32 count) ZR_FORMULA {
     const Px<M> s = Apart::load<M>(from);
     const Wide A =
         cover != nullptr ? M::covered(s.alpha, opacity, Apart::load<M>(cover).alpha) : M::mul(s.alpha, opacity);
     const auto whole = A >= M::white, partial = A > 0 && A < M::white;
     auto wins = whole;
     if (none(partial))
-      seed += static_cast<u32>(count);
+      lots.skip(count);
     else
-      wins = whole || (partial && dissolves<T>(drawn_lots(bits_of_lanes(partial), count, seed), A));
+      wins = whole || (partial && dissolves<T>(lots.drawn(bits_of_lanes(partial), count), A));
     if (none(wins)) return;
     if (!keep_alpha && all(wins)) {
       Apart::store<M>(with_alpha<M>(s, M::white), to);

@@ -5,11 +5,14 @@
 
 namespace zr {
 
-// Not the textbook generator: the high part is added, and the sum wraps at 32 bits. What plug-ins render from a seed
-// depends on it. Seeds follow each other as fast as this is: one quotient, with both products beside it.
+// Not the textbook generator: the high part is added. What plug-ins render from a seed depends on it.
+inline constexpr u32 seed_step = 44488, seed_factor = 48271, seed_high_factor = 3399;
+// A seed is followed by seed_factor times itself modulo this, or by as much more.
+inline constexpr u32 seed_modulus = seed_step * seed_factor - seed_high_factor;
+
+// Seeds follow each other as fast as this is: one quotient, with both products beside it.
 constexpr u32 next_seed(u32 seed) {
-  constexpr u32 step = 44488, factor = 48271, high_factor = 3399;
-  const u32 next = seed * factor - seed / step * (step * factor - high_factor);
+  const u32 next = seed * seed_factor - seed / seed_step * seed_modulus;
   if (next == 0) [[unlikely]]
     return 0x7fffffffu;
   return next;
