@@ -105,7 +105,7 @@ i32 lane_row(i32 n, const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingTable
   const Source<M> source = {mode->opacity, mode->opacity == M::white};
   const bool keep_alpha = (Mode::kind == ModeKind::copy || Mode::kind == ModeKind::over) &&
                           Mode::row_class == RowClass::plain && mode->keep_alpha != 0;
-  each_block<typename Lanes<Mode, T>::Pack>(n, src, mask, dst, [&](const T* s, const T* m, T* d, i32 count) HWY_ATTR {
+  each_block<typename Lanes<Mode, T>::Pack>(n, src, mask, dst, [&](const T* s, const T* m, T* d, i32 count) ZR_FORMULA {
     if (!blend_lanes<Mode>(source, keep_alpha, s, m, d)) single(count, mode, tables, s, m, d);
   });
   return 0;
@@ -232,7 +232,7 @@ i32 whole_row(i32 n, const ZR_BlendingMode<T>* mode, const ZR_LinearBlendingTabl
   using M = typename Lanes<Mode, T>::Math;
   if (mode->opacity > M::white) return single_whole_row<T, Mode>(n, mode, src, mask, dst);
   const Source<M> source = {mode->opacity, mode->opacity == M::white};
-  each_block<typename Lanes<Mode, T>::Pack>(n, src, mask, dst, [&](const T* s, const T* m, T* d, i32 count) HWY_ATTR {
+  each_block<typename Lanes<Mode, T>::Pack>(n, src, mask, dst, [&](const T* s, const T* m, T* d, i32 count) ZR_FORMULA {
     if (!blend_whole<Mode>(source, s, m, d)) single_whole_row<T, Mode>(count, mode, s, m, d);
   });
   return 0;
