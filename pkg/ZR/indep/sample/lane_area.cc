@@ -12,7 +12,7 @@
 #if ZR_HAS_LANES
 #include "sample/lane_box_axis-inl.h"
 #include "sample/lane_box_columns-inl.h"
-#include "sample/lane_copies-inl.h"
+#include "sample/lane_squares-inl.h"
 
 HWY_BEFORE_NAMESPACE();
 namespace zr {
@@ -79,136 +79,6 @@ struct BoxSums {
   }
 };
 
-// Two rows of neighbouring pairs: each destination pixel is the mean of a square of four whole pixels.
-template <class T>
-class Pairs {
- public:
-  static constexpr bool one_phase = true;
-
-  // Whether the boxes of a run are such squares, and all rows lie inside.
-  static bool fit(const SampleRun& run, const ZR_SampPB& params) {
-    constexpr i32 two_pixels = 0x20000;
-    const auto whole = [](i32 middle) { return (middle & 65535) == 32768; };
-    const i32 top = run.y >> 16;
-    return run.step_x == two_pixels && params.x_radius == two_pixels / 2 && params.y_radius == two_pixels / 2 &&
-           whole(run.x) && whole(run.y) && top >= 0 && top + 1 < std::min(params.src->height, 32767);
-  }
-  HWY_INLINE Pairs(const SampleRun& run, const ZR_LayerDef& src)
-      : at_(static_cast<const char*>(src.data) + static_cast<std::ptrdiff_t>(run.y >> 16) * src.row_bytes +
-            static_cast<std::ptrdiff_t>(run.x >> 16) * i32{sizeof(T)}),
-        row_bytes_(src.row_bytes) {}
-  HWY_INLINE void next() { at_ += 2 * lane_count() * i32{sizeof(T)}; }
-
-  HWY_INLINE const f32* row(i32 y) const { return reinterpret_cast<const f32*>(at_ + y * std::ptrdiff_t{row_bytes_}); }
-  // The four pixels of each square in reading order.
-  HWY_INLINE void load(Raw<T> (&square)[4]) const {
-    load_row(at_, square[0], square[1]);
-    load_row(at_ + row_bytes_, square[2], square[3]);
-  }
-
- private:
-  static HWY_INLINE void load_row(const char* from, Raw<T>& left, Raw<T>& right) {
-    const Tag<i32> d;
-    const Raw<T> low = load_pixels<T>(from), high = load_pixels<T>(from + lane_count() * i32{sizeof(T)});
-    for (i32 i = 0; i < Raw<T>::words; ++i) {
-      left.w[i] = hn::ConcatEven(d, high.w[i].v, low.w[i].v);
-      right.w[i] = hn::ConcatOdd(d, high.w[i].v, low.w[i].v);
-    }
-  }
-  const char* at_;
-  i32 row_bytes_;
-};
-
-// Means of squares of opaque pixels: what the quotient of sums comes to. 255 * s / 1020, rounded by doubles, is
-// s / 4 rounded half up for all sums of four bytes; with a white of 32768 both quotients are exact.
-template <class T>
-HWY_INLINE Raw<T> opaque_means(const Raw<T> (&square)[4]) {
-  const auto mean = [&](auto k) HWY_ATTR {
-    constexpr int c = decltype(k)::value;
-    const Ints rounded = shifted_right<2>((channel_of<c>(square[0]) + channel_of<c>(square[1])) +
-                                          (channel_of<c>(square[2]) + channel_of<c>(square[3])) + 2);
-    return pick(rounded > i32{Depth<T>::white}, i32{Depth<T>::white}, rounded);
-  };
-  return packed<T>(mean(std::integral_constant<int, 0>()), mean(std::integral_constant<int, 1>()),
-                   mean(std::integral_constant<int, 2>()), mean(std::integral_constant<int, 3>()));
-}
-
-// A vector of every other float pixel.
-template <class D>
-HWY_INLINE hn::Vec<D> load_every_other(D d, const f32* from) {
-  if constexpr (hn::MaxLanes(D()) == 4) {
-    return hn::LoadU(d, from);
-  } else {
-    const hn::Half<D> half;
-    return hn::Combine(d, load_every_other(half, from + 2 * hn::MaxLanes(half)), load_every_other(half, from));
-  }
-}
-// The same means of float pixels, whose channels stay side by side. False, with dst written in part, where a pixel
-// is not opaque.
-HWY_INLINE bool opaque_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* dst) {
-  constexpr i32 pixels = lane_count() / 4;
-  const Tag<f32> d;
-  const auto is_alpha = hn::Eq(hn::And(hn::Iota(Tag<i32>(), 0), hn::Set(Tag<i32>(), 3)), hn::Zero(Tag<i32>()));
-  const auto colours = hn::Not(hn::RebindMask(d, is_alpha));
-  for (i32 i = 0; i < lane_count(); i += pixels) {
-    Doubles total = 0.0;
-    auto opaque = colours;  // is not asked of colours
-    bool all_opaque = true;
-    for (i32 k = 0; k < 4; ++k) {
-      const Floats v = load_every_other(d, at.row(k / 2) + (2 * i + k % 2) * 4);
-      all_opaque = all_opaque && hn::AllTrue(d, hn::Or(opaque, hn::Eq(v.v, hn::Set(d, 1.0f))));
-      total = total + to_double(v);
-    }
-    if (!all_opaque) return false;
-    hn::StoreU(narrowed(total * 0.25).v, d, reinterpret_cast<f32*>(dst + i));
-  }
-  return true;
-}
-
-// The sums of products of both halves of each lane, of which none needs more than 16 bits.
-using Words = hn::Repartition<i16, Tag<i32>>;
-HWY_INLINE Ints pair_products(hn::Vec<Words> a, hn::Vec<Words> b) {
-  const Tag<i32> d;
-#if HWY_ARCH_X86
-  auto others = hn::Zero(d);
-  return hn::ReorderWidenMulAccumulate(d, a, b, hn::Zero(d), others);
-#else
-  const Ints products = hn::BitCast(d, hn::Mul(a, b));
-  return masked(products, 65535) + shifted_right_unsigned<16>(products);
-#endif
-}
-
-// Means of four 8-bit pixels whose alphas differ. Sums of channels lie side by side as single numbers, exact ones; the
-// quotients are off by less than 6u of 255 from what doubles give. False, with dst written in part, where that may
-// tell.
-HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel8>& at, ZR_Pixel8* dst) {
-  constexpr i32 pixels = lane_count() / 4;
-  const Words words;
-  const hn::Repartition<u8, Words> bytes;
-  // Channels of a pair of pixels together, and their alphas to each; 1 to alpha itself.
-  alignas(16) static constexpr u8 pair[16] = {0, 1, 8, 9, 2, 3, 10, 11, 4, 5, 12, 13, 6, 7, 14, 15};
-  alignas(16) static constexpr u8 alphas[16] = {128, 128, 128, 128, 0, 1, 8, 9, 0, 1, 8, 9, 0, 1, 8, 9};
-  alignas(16) static constexpr i16 one[8] = {1, 1, 0, 0, 0, 0, 0, 0};
-  alignas(16) static constexpr f32 quarter[4] = {0.25f, 0, 0, 0}, doubt[4] = {0, 0x1p-13f, 0x1p-13f, 0x1p-13f};
-  const Tag<f32> numbers;
-  const auto is_alpha = hn::Gt(hn::LoadDup128(numbers, quarter), hn::Zero(numbers));
-  const auto sums_of = [&](i32 row, i32 i) HWY_ATTR {
-    const u8* const from = reinterpret_cast<const u8*>(at.row(row)) + 8 * i;
-    const auto v = hn::BitCast(bytes, hn::PromoteTo(words, hn::LoadU(hn::Rebind<u8, Words>(), from)));
-    const auto factors = hn::TableLookupBytesOr0(v, hn::LoadDup128(bytes, alphas));
-    const auto channels = hn::TableLookupBytes(v, hn::LoadDup128(bytes, pair));
-    return pair_products(hn::BitCast(words, channels), hn::Or(hn::BitCast(words, factors), hn::LoadDup128(words, one)));
-  };
-  FloatRounding rounding;
-  for (i32 i = 0; i < lane_count(); i += pixels) {
-    const Floats sums = to_float(sums_of(0, i) + sums_of(1, i));
-    const Floats inverse = inverse_of(at_least(hn::Broadcast<0>(sums.v), 0.5f));
-    const Floats by = hn::IfThenElse(is_alpha, hn::LoadDup128(numbers, quarter), inverse.v);
-    store_channels(rounding.nearest(sums, by, hn::LoadDup128(numbers, doubt)), dst + i);
-  }
-  return none(rounding.unsure());
-}
-
 template <class T>
 HWY_INLINE Ints alpha_bits(const Raw<T>& p) {
   if constexpr (std::is_same_v<T, ZR_PixelFloat>)
@@ -234,8 +104,10 @@ i32 square_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum
       const Bools<i32> opaque = any == i32{Depth<T>::white} && every == i32{Depth<T>::white};
       if (all(opaque || clear)) return put(pick(opaque, opaque_means(square), Raw<T>{}), out);
     }
-    if constexpr (std::is_same_v<T, ZR_Pixel8>)
-      if (weighted_means(at, out)) return channel_of<0>(load_pixels<T>(out));
+    if constexpr (!std::is_same_v<T, ZR_PixelFloat>) {
+      Ints means;
+      if (weighted_means(at, out, &means)) return means;
+    }
     BoxSums<T> sums;
     for (const Raw<T>& p : square) sums.add(p, [](Doubles v) HWY_ATTR { return v; });
     return put(sums.mean(1.0), out);

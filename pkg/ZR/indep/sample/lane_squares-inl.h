@@ -1,0 +1,274 @@
+// Means of squares of four whole pixels, as copies at half the size take them: channels stay side by side as pixels
+// hold them, and a pixel's sum of alphas is inverted once.
+#if defined(ZR_SAMPLE_LANE_SQUARES_INL_H) == defined(HWY_TARGET_TOGGLE)
+#ifdef ZR_SAMPLE_LANE_SQUARES_INL_H
+#undef ZR_SAMPLE_LANE_SQUARES_INL_H
+#else
+#define ZR_SAMPLE_LANE_SQUARES_INL_H
+#endif
+
+#include "sample/lane_copies-inl.h"
+
+HWY_BEFORE_NAMESPACE();
+namespace zr {
+namespace HWY_NAMESPACE {
+
+// Two rows of neighbouring pairs: each destination pixel is the mean of a square of four whole pixels.
+template <class T>
+class Pairs {
+ public:
+  static constexpr bool one_phase = true;
+
+  // Whether the boxes of a run are such squares, and all rows lie inside.
+  static bool fit(const SampleRun& run, const ZR_SampPB& params) {
+    constexpr i32 two_pixels = 0x20000;
+    const auto whole = [](i32 middle) { return (middle & 65535) == 32768; };
+    const i32 top = run.y >> 16;
+    return run.step_x == two_pixels && params.x_radius == two_pixels / 2 && params.y_radius == two_pixels / 2 &&
+           whole(run.x) && whole(run.y) && top >= 0 && top + 1 < std::min(params.src->height, 32767);
+  }
+  HWY_INLINE Pairs(const SampleRun& run, const ZR_LayerDef& src)
+      : at_(static_cast<const char*>(src.data) + static_cast<std::ptrdiff_t>(run.y >> 16) * src.row_bytes +
+            static_cast<std::ptrdiff_t>(run.x >> 16) * i32{sizeof(T)}),
+        row_bytes_(src.row_bytes) {}
+  HWY_INLINE void next() { at_ += 2 * lane_count() * i32{sizeof(T)}; }
+
+  HWY_INLINE const T* row(i32 y) const { return reinterpret_cast<const T*>(at_ + y * std::ptrdiff_t{row_bytes_}); }
+  // The four pixels of each square in reading order.
+  HWY_INLINE void load(Raw<T> (&square)[4]) const {
+    load_row(at_, square[0], square[1]);
+    load_row(at_ + row_bytes_, square[2], square[3]);
+  }
+
+ private:
+  static HWY_INLINE void load_row(const char* from, Raw<T>& left, Raw<T>& right) {
+    const Tag<i32> d;
+    const Raw<T> low = load_pixels<T>(from), high = load_pixels<T>(from + lane_count() * i32{sizeof(T)});
+    for (i32 i = 0; i < Raw<T>::words; ++i) {
+      left.w[i] = hn::ConcatEven(d, high.w[i].v, low.w[i].v);
+      right.w[i] = hn::ConcatOdd(d, high.w[i].v, low.w[i].v);
+    }
+  }
+  const char* at_;
+  i32 row_bytes_;
+};
+
+// ------------------------------------------------------------------------------------------- opaque
+
+// Means of squares of opaque pixels: what the quotient of sums comes to. 255 * s / 1020, rounded by doubles, is
+// s / 4 rounded half up for all sums of four bytes; with a white of 32768 both quotients are exact.
+template <class T>
+HWY_INLINE Raw<T> opaque_means(const Raw<T> (&square)[4]) {
+  const auto mean = [&](auto k) HWY_ATTR {
+    constexpr int c = decltype(k)::value;
+    const Ints rounded = shifted_right<2>((channel_of<c>(square[0]) + channel_of<c>(square[1])) +
+                                          (channel_of<c>(square[2]) + channel_of<c>(square[3])) + 2);
+    return pick(rounded > i32{Depth<T>::white}, i32{Depth<T>::white}, rounded);
+  };
+  return packed<T>(mean(std::integral_constant<int, 0>()), mean(std::integral_constant<int, 1>()),
+                   mean(std::integral_constant<int, 2>()), mean(std::integral_constant<int, 3>()));
+}
+
+// A vector of every other float pixel.
+template <class D>
+HWY_INLINE hn::Vec<D> load_every_other(D d, const f32* from) {
+  if constexpr (hn::MaxLanes(D()) == 4) {
+    return hn::LoadU(d, from);
+  } else {
+    const hn::Half<D> half;
+    return hn::Combine(d, load_every_other(half, from + 2 * hn::MaxLanes(half)), load_every_other(half, from));
+  }
+}
+// The same means of float pixels. False, with dst written in part, where a pixel is not opaque.
+HWY_INLINE bool opaque_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* dst) {
+  constexpr i32 pixels = lane_count() / 4;
+  const Tag<f32> d;
+  const auto is_alpha = hn::Eq(hn::And(hn::Iota(Tag<i32>(), 0), hn::Set(Tag<i32>(), 3)), hn::Zero(Tag<i32>()));
+  const auto colours = hn::Not(hn::RebindMask(d, is_alpha));
+  for (i32 i = 0; i < lane_count(); i += pixels) {
+    Doubles total = 0.0;
+    auto opaque = colours;  // is not asked of colours
+    bool all_opaque = true;
+    for (i32 k = 0; k < 4; ++k) {
+      const Floats v = load_every_other(d, reinterpret_cast<const f32*>(at.row(k / 2) + 2 * i + k % 2));
+      all_opaque = all_opaque && hn::AllTrue(d, hn::Or(opaque, hn::Eq(v.v, hn::Set(d, 1.0f))));
+      total = total + to_double(v);
+    }
+    if (!all_opaque) return false;
+    hn::StoreU(narrowed(total * 0.25).v, d, reinterpret_cast<f32*>(dst + i));
+  }
+  return true;
+}
+
+// ----------------------------------------------------------------------------------------- weighted
+
+// weighted_means(): squares of pixels whose alphas differ. False, with dst written in part, where what is rounded
+// otherwise than single numbers are may tell.
+
+using Words = hn::Repartition<i16, Tag<i32>>;
+using Bytes = hn::Repartition<u8, Tag<i32>>;
+
+// The sums of products of both halves of each lane.
+HWY_INLINE Ints pair_products(hn::Vec<Words> a, hn::Vec<Words> b) {
+  const Tag<i32> d;
+#if HWY_ARCH_X86
+  auto others = hn::Zero(d);
+  return hn::ReorderWidenMulAccumulate(d, a, b, hn::Zero(d), others);
+#else
+  const Ints m = hn::BitCast(d, a), n = hn::BitCast(d, b);
+  const auto lower = [](Ints v) HWY_ATTR { return shifted_right<16>(shifted_left<16>(v)); };
+  return lower(m) * lower(n) + shifted_right<16>(m) * shifted_right<16>(n);
+#endif
+}
+
+// 8 bits. Sums are exact; quotients n / d with d up to 1020 are halves or at least 1/2040 away from them, and off by
+// less than 4u * 255 + 2^-16 < 2^-13. They are held above 256, where 15 bits of fraction lie below their eight.
+class Quotients8 {
+ public:
+  HWY_INLINE Quotients8() : least_(hn::Set(Tag<u16>(), u16{0xffff})) {}
+  // Above 16 bits of each lane: sums * by, rounded half up, in the lower byte.
+  HWY_INLINE Ints rounded(Floats sums, Floats by, Floats half) {
+    const Ints bits = as_ints(mul_add(sums, by, half)), doubled = bits + bits;
+    least_ = hn::Min(least_, hn::BitCast(Tag<u16>(), doubled.v));
+    return doubled;
+  }
+  HWY_INLINE bool unsure() const {
+    return !hn::AllFalse(Tag<u16>(), hn::Lt(least_, hn::Set(Tag<u16>(), static_cast<u16>(doubt * 0x1p17f))));
+  }
+  static constexpr f32 doubt = 0x1p-13f, colour_half = 256.5f + doubt, alpha_half = 256.5f + 0.125f;  // never unsure
+
+ private:
+  hn::Vec<Tag<u16>> least_;  // fraction, and what is above it, which is never small
+};
+HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel8>& at, ZR_Pixel8* dst, Ints* alphas) {
+  constexpr i32 pixels = lane_count() / 2;
+  const Words words;
+  const Bytes bytes;
+  const Tag<i32> ints;
+  const Tag<f32> numbers;
+  // A channel of both pixels of a pair together, alpha and green in even bytes and red and blue in odd ones.
+  alignas(16) static constexpr u8 channels[16] = {0, 1, 4, 5, 2, 3, 6, 7, 8, 9, 12, 13, 10, 11, 14, 15};
+  alignas(16) static constexpr u8 weights[16] = {0, 128, 4, 128, 0, 128, 4, 128, 8, 128, 12, 128, 8, 128, 12, 128};
+  alignas(16) static constexpr f32 halves[4] = {Quotients8::alpha_half, Quotients8::colour_half, Quotients8::alpha_half,
+                                                Quotients8::colour_half};
+  const auto add = [&](i32 row, i32 i, Ints& even, Ints& odd) HWY_ATTR {
+    const auto v = hn::LoadU(bytes, reinterpret_cast<const u8*>(at.row(row) + 2 * i));
+    const Ints weight = hn::BitCast(ints, hn::TableLookupBytesOr0(v, hn::LoadDup128(bytes, weights)));
+    const auto channel = hn::BitCast(words, hn::TableLookupBytes(v, hn::LoadDup128(bytes, channels)));
+    const hn::Rebind<u16, Words> unsigned_words;
+    const Ints even_weight = hn::OddEven(weight.v, hn::Set(ints, 0x10001));
+    even = even + pair_products(hn::And(channel, hn::Set(words, i16{255})), hn::BitCast(words, even_weight.v));
+    odd = odd + pair_products(hn::BitCast(words, hn::ShiftRight<8>(hn::BitCast(unsigned_words, channel))),
+                              hn::BitCast(words, weight.v));
+  };
+  Floats even[2], odd[2];
+  for (i32 k = 0; k < 2; ++k) {
+    Ints e(0), o(0);
+    add(0, k * pixels, e, o);
+    add(1, k * pixels, e, o);
+    even[k] = to_float(e), odd[k] = to_float(o);
+  }
+  const Floats inverse = inverse_of(at_least(hn::OddEven(hn::DupEven(even[1].v), even[0].v), 0.5f));
+  const Floats by[2] = {hn::DupEven(inverse.v), hn::DupOdd(inverse.v)};
+  Quotients8 quotients;
+  Ints total(0);
+  for (i32 k = 0; k < 2; ++k) {
+    const Floats even_by = hn::OddEven(by[k].v, hn::Set(numbers, 0.25f));
+    const Ints front = quotients.rounded(even[k], even_by, hn::LoadDup128(numbers, halves));
+    const Ints back = quotients.rounded(odd[k], by[k], Quotients8::colour_half);
+    const Tag<u16> d;
+    const auto both = hn::OddEven(hn::BitCast(d, back.v), hn::BitCast(d, shifted_right_unsigned<16>(front).v));
+    const hn::Rebind<u8, Tag<u16>> narrow;
+    hn::StoreU(hn::TruncateTo(narrow, both), narrow, reinterpret_cast<u8*>(dst + k * pixels));
+    alignas(16) static constexpr i32 alpha[4] = {255, 0, 255, 0};
+    total = total + (Ints(hn::BitCast(ints, both)) & hn::LoadDup128(ints, alpha));
+  }
+  *alphas = total;
+  return !quotients.unsure();
+}
+
+// 16 bits. Sums of alpha * (colour - 16384) lie within 2^31, and all is exact modulo 2^32. What single precision makes
+// of a quotient is off by less than 6 * 2^-10 of a unit; made a little small, it is the rounded one or one less, and
+// the remainder tells which of them.
+class Quotients16 {
+ public:
+  static constexpr f32 doubt = 0x1p-7f;
+  HWY_INLINE Quotients16() : least_(hn::Set(Unsigned(), ~u32{0})), most_(hn::Zero(Tag<u16>())) {}
+  HWY_INLINE void look_at(hn::Vec<Words> channels) { most_ = hn::Max(most_, hn::BitCast(Tag<u16>(), channels)); }
+  // Colours; what lies in the first lane of four is left alone.
+  HWY_INLINE Ints mended(Ints estimate, Ints sums) {
+    const Tag<i32> d;
+    const Unsigned u;
+    alignas(16) static constexpr i32 colours[4] = {0, -1, -1, -1};
+    const Ints total = hn::Broadcast<0>(sums.v);
+    const Ints above = sums + shifted_right<1>(total) - (estimate - 16384) * total, less = above - total;
+    const auto remainder = hn::Min(hn::BitCast(u, above.v), hn::BitCast(u, less.v));
+    // A tie leaves nothing.
+    least_ = hn::Min(least_, remainder);
+    const Ints one_more = hn::VecFromMask(d, (less >= 0).mask);
+    return estimate - (one_more & hn::LoadDup128(d, colours));
+  }
+  HWY_INLINE bool unsure() const {
+    return !hn::AllTrue(Unsigned(), hn::Gt(least_, hn::Zero(Unsigned()))) ||
+           !hn::AllFalse(Tag<u16>(), hn::Gt(most_, hn::Set(Tag<u16>(), u16{32768})));
+  }
+
+ private:
+  using Unsigned = hn::Rebind<u32, Tag<i32>>;
+  hn::Vec<Unsigned> least_;
+  hn::Vec<Tag<u16>> most_;
+};
+HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel16>& at, ZR_Pixel16* dst, Ints* alphas) {
+  constexpr i32 pixels = lane_count() / 4;
+  const Words words;
+  const Bytes bytes;
+  const Tag<i32> ints;
+  const Tag<f32> numbers;
+  alignas(16) static constexpr i16 middle[8] = {0, 16384, 16384, 16384, 0, 16384, 16384, 16384};
+  // A channel of both pixels of a pair together, and their alphas to each; -1 to alpha itself, as all is negative.
+  alignas(16) static constexpr u8 channels[16] = {0, 1, 8, 9, 2, 3, 10, 11, 4, 5, 12, 13, 6, 7, 14, 15};
+  alignas(16) static constexpr u8 weights[16] = {128, 128, 128, 128, 0, 1, 8, 9, 0, 1, 8, 9, 0, 1, 8, 9};
+  alignas(16) static constexpr i16 minus_one[8] = {-1, -1, 0, 0, 0, 0, 0, 0};
+  constexpr f32 colour_half = 16384.5f - Quotients16::doubt;
+  alignas(16) static constexpr f32 quarter[4] = {0.25f, 0, 0, 0};
+  alignas(16) static constexpr f32 halves[4] = {0.5f, colour_half, colour_half, colour_half};
+  Quotients16 quotients;
+  const auto sums_of = [&](i32 row, i32 i) HWY_ATTR {
+    const auto v = hn::LoadU(words, reinterpret_cast<const i16*>(at.row(row) + 2 * i));
+    quotients.look_at(v);
+    const auto turned = hn::BitCast(bytes, hn::Sub(hn::LoadDup128(words, middle), v));
+    const auto channel = hn::BitCast(words, hn::TableLookupBytes(turned, hn::LoadDup128(bytes, channels)));
+    const auto weight = hn::BitCast(words, hn::TableLookupBytesOr0(turned, hn::LoadDup128(bytes, weights)));
+    return pair_products(channel, hn::Or(weight, hn::LoadDup128(words, minus_one)));
+  };
+  Ints sums[4];
+  Floats real[4];
+  for (i32 k = 0; k < 4; ++k) {
+    sums[k] = sums_of(0, k * pixels) + sums_of(1, k * pixels);
+    real[k] = to_float(sums[k]);
+  }
+  const hn::Repartition<u64, Tag<f32>> both;
+  const auto totals_of = [&](Floats a, Floats b)
+                             HWY_ATTR { return hn::BitCast(both, hn::InterleaveLower(numbers, a.v, b.v)); };
+  const Floats totals = hn::BitCast(
+      numbers, hn::InterleaveLower(both, totals_of(real[0], real[1]), totals_of(real[2], real[3])));
+  // Squares of white fit no sum, and those of any opaque pixels have ties enough.
+  if (!none(totals >= 4 * 32768.0f)) return false;
+  const Floats inverse = inverse_of(at_least(totals, 0.5f));
+  const Floats by[4] = {hn::Broadcast<0>(inverse.v), hn::Broadcast<1>(inverse.v), hn::Broadcast<2>(inverse.v),
+                        hn::Broadcast<3>(inverse.v)};
+  const auto is_alpha = hn::Gt(hn::LoadDup128(numbers, quarter), hn::Zero(numbers));
+  for (i32 k = 0; k < 4; ++k) {
+    const Floats factor = hn::IfThenElse(is_alpha, hn::LoadDup128(numbers, quarter), by[k].v);
+    const Ints estimate = fitting_int(mul_add(real[k], factor, hn::LoadDup128(numbers, halves)));
+    store_channels(quotients.mended(estimate, sums[k]), dst + k * pixels);
+  }
+  *alphas = channel_of<0>(load_pixels<ZR_Pixel16>(dst));
+  return !quotients.unsure();
+}
+
+}  // namespace HWY_NAMESPACE
+}  // namespace zr
+HWY_AFTER_NAMESPACE();
+
+#endif
