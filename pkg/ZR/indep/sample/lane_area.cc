@@ -80,37 +80,28 @@ struct BoxSums {
 };
 
 template <class T>
-HWY_INLINE Ints alpha_bits(const Raw<T>& p) {
-  if constexpr (std::is_same_v<T, ZR_PixelFloat>)
-    return p.w[0];
-  else
-    return channel_of<0>(p);
-}
-
-template <class T>
 i32 square_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
   return sample_vectors<T, Pairs<T>>(run, *params.src, sum, dst, [&](const Pairs<T>& at, T* out) HWY_ATTR {
-    if constexpr (std::is_same_v<T, ZR_PixelFloat>)
-      if (opaque_means(at, out)) return Ints(std::bit_cast<i32>(1.0f));
-    Raw<T> square[4];
-    at.load(square);
-    const Ints alphas[] = {alpha_bits(square[0]), alpha_bits(square[1]), alpha_bits(square[2]), alpha_bits(square[3])};
-    const Ints any = (alphas[0] | alphas[1]) | (alphas[2] | alphas[3]);
-    const Bools<i32> clear = any == 0;
     if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
-      if (all(clear)) return put(Raw<T>{}, out);
+      if (opaque_means(at, out)) return Ints(std::bit_cast<i32>(1.0f));
+      if (is_clear(at)) return put(Raw<T>{}, out);
+      weighted_means(at, out);
+      return Ints(0);  // some of them are not opaque
     } else {
-      const Ints every = (alphas[0] & alphas[1]) & (alphas[2] & alphas[3]);
-      const Bools<i32> opaque = any == i32{Depth<T>::white} && every == i32{Depth<T>::white};
-      if (all(opaque || clear)) return put(pick(opaque, opaque_means(square), Raw<T>{}), out);
-    }
-    if constexpr (!std::is_same_v<T, ZR_PixelFloat>) {
+      const Alphas alphas = at.alphas();
+      if (alphas == Alphas::clear) return put(Raw<T>{}, out);
+      if (alphas == Alphas::white) {
+        opaque_means(at, out);
+        return Ints(Depth<T>::white);
+      }
       Ints means;
       if (weighted_means(at, out, &means)) return means;
+      Raw<T> square[4];
+      at.load(square);
+      BoxSums<T> sums;
+      for (const Raw<T>& p : square) sums.add(p, [](Doubles v) HWY_ATTR { return v; });
+      return put(sums.mean(1.0), out);
     }
-    BoxSums<T> sums;
-    for (const Raw<T>& p : square) sums.add(p, [](Doubles v) HWY_ATTR { return v; });
-    return put(sums.mean(1.0), out);
   });
 }
 

@@ -13,6 +13,9 @@ HWY_BEFORE_NAMESPACE();
 namespace zr {
 namespace HWY_NAMESPACE {
 
+using Words = hn::Repartition<i16, Tag<i32>>;
+using Bytes = hn::Repartition<u8, Tag<i32>>;
+
 // Two rows of neighbouring pairs: each destination pixel is the mean of a square of four whole pixels.
 template <class T>
 class Pairs {
@@ -34,6 +37,11 @@ class Pairs {
   HWY_INLINE void next() { at_ += 2 * lane_count() * i32{sizeof(T)}; }
 
   HWY_INLINE const T* row(i32 y) const { return reinterpret_cast<const T*>(at_ + y * std::ptrdiff_t{row_bytes_}); }
+  // Of integer pixels.
+  HWY_INLINE Alphas alphas() const {
+    const Alphas top = alphas_of(row(0), 2 * lane_count());
+    return top == Alphas::any || alphas_of(row(1), 2 * lane_count()) == top ? top : Alphas::any;
+  }
   // The four pixels of each square in reading order.
   HWY_INLINE void load(Raw<T> (&square)[4]) const {
     load_row(at_, square[0], square[1]);
@@ -55,31 +63,63 @@ class Pairs {
 
 // ------------------------------------------------------------------------------------------- opaque
 
-// Means of squares of opaque pixels: what the quotient of sums comes to. 255 * s / 1020, rounded by doubles, is
-// s / 4 rounded half up for all sums of four bytes; with a white of 32768 both quotients are exact.
-template <class T>
-HWY_INLINE Raw<T> opaque_means(const Raw<T> (&square)[4]) {
+// opaque_means(): squares of opaque pixels.
+
+// What the quotient of sums comes to: 255 * s / 1020, rounded by doubles, is s / 4 rounded half up for all sums of four
+// bytes.
+HWY_INLINE void opaque_means(const Pairs<ZR_Pixel8>& at, ZR_Pixel8* dst) {
+  constexpr i32 pixels = lane_count() / 2;
+  const Bytes bytes;
+  const hn::Repartition<u16, Bytes> words;
+  // A channel of both pixels of a pair together.
+  alignas(16) static constexpr u8 channels[16] = {0, 4, 1, 5, 2, 6, 3, 7, 8, 12, 9, 13, 10, 14, 11, 15};
+  const auto sums_of = [&](i32 row, i32 i) HWY_ATTR {
+    const auto v = hn::LoadU(bytes, reinterpret_cast<const u8*>(at.row(row) + 2 * i));
+    const auto pairs = hn::BitCast(words, hn::TableLookupBytes(v, hn::LoadDup128(bytes, channels)));
+    return hn::Add(hn::And(pairs, hn::Set(words, u16{255})), hn::ShiftRight<8>(pairs));
+  };
+  for (i32 i = 0; i < lane_count(); i += pixels) {
+    const auto sums = hn::Add(hn::Add(sums_of(0, i), sums_of(1, i)), hn::Set(words, u16{2}));
+    const hn::Rebind<u8, decltype(words)> narrow;
+    hn::StoreU(hn::TruncateTo(narrow, hn::ShiftRight<2>(sums)), narrow, reinterpret_cast<u8*>(dst + i));
+  }
+}
+
+// With a white of 32768 both quotients are exact. Colours may be above it, and are limited.
+HWY_INLINE void opaque_means(const Pairs<ZR_Pixel16>& at, ZR_Pixel16* dst) {
+  Raw<ZR_Pixel16> square[4];
+  at.load(square);
   const auto mean = [&](auto k) HWY_ATTR {
     constexpr int c = decltype(k)::value;
     const Ints rounded = shifted_right<2>((channel_of<c>(square[0]) + channel_of<c>(square[1])) +
                                           (channel_of<c>(square[2]) + channel_of<c>(square[3])) + 2);
-    return pick(rounded > i32{Depth<T>::white}, i32{Depth<T>::white}, rounded);
+    return Ints(hn::Min(rounded.v, Ints(32768).v));
   };
-  return packed<T>(mean(std::integral_constant<int, 0>()), mean(std::integral_constant<int, 1>()),
-                   mean(std::integral_constant<int, 2>()), mean(std::integral_constant<int, 3>()));
+  store(packed<ZR_Pixel16>(32768, mean(std::integral_constant<int, 1>()), mean(std::integral_constant<int, 2>()),
+                           mean(std::integral_constant<int, 3>())),
+        dst);
 }
 
 // A vector of every other float pixel.
 template <class D>
 HWY_INLINE hn::Vec<D> load_every_other(D d, const f32* from) {
-  if constexpr (hn::MaxLanes(D()) == 4) {
+  if constexpr (hn::MaxLanes(D()) <= 4) {
     return hn::LoadU(d, from);
   } else {
     const hn::Half<D> half;
     return hn::Combine(d, load_every_other(half, from + 2 * hn::MaxLanes(half)), load_every_other(half, from));
   }
 }
-// The same means of float pixels. False, with dst written in part, where a pixel is not opaque.
+HWY_INLINE bool is_clear(const Pairs<ZR_PixelFloat>& at) {
+  const Tag<i32> d;
+  alignas(16) static constexpr i32 alpha[4] = {-1, 0, 0, 0};
+  for (i32 i = 0; i < 16; ++i) {
+    const Ints v = hn::LoadU(d, reinterpret_cast<const i32*>(at.row(i / 8)) + i % 8 * lane_count());
+    if (!all((v & hn::LoadDup128(d, alpha)) == 0)) return false;
+  }
+  return true;
+}
+// False, with dst written in part, where a pixel is not opaque.
 HWY_INLINE bool opaque_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* dst) {
   constexpr i32 pixels = lane_count() / 4;
   const Tag<f32> d;
@@ -104,9 +144,6 @@ HWY_INLINE bool opaque_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* dst)
 
 // weighted_means(): squares of pixels whose alphas differ. False, with dst written in part, where what is rounded
 // otherwise than single numbers are may tell.
-
-using Words = hn::Repartition<i16, Tag<i32>>;
-using Bytes = hn::Repartition<u8, Tag<i32>>;
 
 // The sums of products of both halves of each lane.
 HWY_INLINE Ints pair_products(hn::Vec<Words> a, hn::Vec<Words> b) {
@@ -188,7 +225,7 @@ HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel8>& at, ZR_Pixel8* dst, Ints*
 }
 
 // 16 bits. Sums of alpha * (colour - 16384) lie within 2^31, and all is exact modulo 2^32. What single precision makes
-// of a quotient is off by less than 6 * 2^-10 of a unit; made a little small, it is the rounded one or one less, and
+// of a quotient is off by less than 6 * 2^-10 of a unit; made a little great, it is the rounded one or one more, and
 // the remainder tells which of them.
 class Quotients16 {
  public:
@@ -197,16 +234,13 @@ class Quotients16 {
   HWY_INLINE void look_at(hn::Vec<Words> channels) { most_ = hn::Max(most_, hn::BitCast(Tag<u16>(), channels)); }
   // Colours; what lies in the first lane of four is left alone.
   HWY_INLINE Ints mended(Ints estimate, Ints sums) {
-    const Tag<i32> d;
     const Unsigned u;
     alignas(16) static constexpr i32 colours[4] = {0, -1, -1, -1};
     const Ints total = hn::Broadcast<0>(sums.v);
-    const Ints above = sums + shifted_right<1>(total) - (estimate - 16384) * total, less = above - total;
-    const auto remainder = hn::Min(hn::BitCast(u, above.v), hn::BitCast(u, less.v));
-    // A tie leaves nothing.
-    least_ = hn::Min(least_, remainder);
-    const Ints one_more = hn::VecFromMask(d, (less >= 0).mask);
-    return estimate - (one_more & hn::LoadDup128(d, colours));
+    const Ints above = sums + shifted_right<1>(total) - (estimate - 16384) * total, below = above + total;
+    // Where the estimate is one more, `above` is negative. A tie leaves no remainder.
+    least_ = hn::Min(least_, hn::Min(hn::BitCast(u, above.v), hn::BitCast(u, below.v)));
+    return estimate + (shifted_right<31>(above) & hn::LoadDup128(Tag<i32>(), colours));
   }
   HWY_INLINE bool unsure() const {
     return !hn::AllTrue(Unsigned(), hn::Gt(least_, hn::Zero(Unsigned()))) ||
@@ -229,7 +263,7 @@ HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel16>& at, ZR_Pixel16* dst, Int
   alignas(16) static constexpr u8 channels[16] = {0, 1, 8, 9, 2, 3, 10, 11, 4, 5, 12, 13, 6, 7, 14, 15};
   alignas(16) static constexpr u8 weights[16] = {128, 128, 128, 128, 0, 1, 8, 9, 0, 1, 8, 9, 0, 1, 8, 9};
   alignas(16) static constexpr i16 minus_one[8] = {-1, -1, 0, 0, 0, 0, 0, 0};
-  constexpr f32 colour_half = 16384.5f - Quotients16::doubt;
+  constexpr f32 colour_half = 16384.5f + Quotients16::doubt;
   alignas(16) static constexpr f32 quarter[4] = {0.25f, 0, 0, 0};
   alignas(16) static constexpr f32 halves[4] = {0.5f, colour_half, colour_half, colour_half};
   Quotients16 quotients;
@@ -265,6 +299,41 @@ HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel16>& at, ZR_Pixel16* dst, Int
   }
   *alphas = channel_of<0>(load_pixels<ZR_Pixel16>(dst));
   return !quotients.unsure();
+}
+
+// The same of floats in the sampler's own double precision, of which products need no rounding: always sure.
+HWY_INLINE void weighted_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* dst) {
+  constexpr i32 pixels = lane_count() / 8;  // of a vector
+  const Tag<f64> d;
+  const hn::Rebind<i64, Tag<f64>> whole;
+  const HalfFloats half;
+  const auto place = hn::Iota(whole, 0), first = hn::And(place, hn::Set(whole, ~i64{3}));
+  const auto is_alpha = hn::RebindMask(d, hn::Eq(place, first));
+  // Number k of each four in the place of all.
+  const auto spread = [&](auto v, i64 k)
+                          HWY_ATTR { return hn::TableLookupLanes(v, hn::IndicesFromVec(d, hn::Add(first, hn::Set(whole, k)))); };
+  const auto zero = hn::Zero(d), one = hn::Set(d, 1.0), quarter = hn::Set(d, 0.25);
+  for (i32 i = 0; i < lane_count(); i += 4 * pixels) {
+    hn::Vec<Tag<f64>> sums[4];
+    for (i32 v = 0; v < 4; ++v) {
+      sums[v] = zero;
+      for (i32 k = 0; k < 4; ++k) {
+        const auto* const from = reinterpret_cast<const f32*>(at.row(k / 2) + 2 * (i + v * pixels) + k % 2);
+        const auto c = hn::PromoteTo(d, load_every_other(half, from));
+        sums[v] = hn::MulAdd(c, hn::IfThenElse(is_alpha, one, spread(c, 0)), sums[v]);
+      }
+    }
+    // Alphas of four vectors in one.
+    const auto front = hn::InterleaveLower(d, sums[0], sums[1]), back = hn::InterleaveLower(d, sums[2], sums[3]);
+    const auto totals = hn::OddEvenBlocks(hn::SwapAdjacentBlocks(back), front), inverse = hn::Div(one, totals);
+    const bool any_clear = !hn::AllFalse(d, hn::Eq(totals, zero));
+    for (i32 v = 0; v < 4; ++v) {
+      auto mean = hn::Mul(sums[v], hn::IfThenElse(is_alpha, quarter, spread(inverse, v)));
+      mean = hn::IfThenElse(hn::And(is_alpha, hn::Gt(mean, one)), one, mean);  // NaN stays
+      if (any_clear) mean = hn::IfThenZeroElse(hn::Eq(spread(sums[v], 0), zero), mean);
+      hn::StoreU(hn::DemoteTo(half, mean), half, reinterpret_cast<f32*>(dst + i + v * pixels));
+    }
+  }
 }
 
 }  // namespace HWY_NAMESPACE
