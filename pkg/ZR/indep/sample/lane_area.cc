@@ -82,26 +82,20 @@ struct BoxSums {
 template <class T>
 i32 square_vectors(const SampleRun& run, const ZR_SampPB& params, RowSum<T>* sum, T* dst) {
   return sample_vectors<T, Pairs<T>>(run, *params.src, sum, dst, [&](const Pairs<T>& at, T* out) HWY_ATTR {
-    if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
-      if (opaque_means(at, out)) return Ints(std::bit_cast<i32>(1.0f));
-      if (is_clear(at)) return put(Raw<T>{}, out);
-      weighted_means(at, out);
-      return Ints(0);  // some of them are not opaque
-    } else {
-      const Alphas alphas = at.alphas();
-      if (alphas == Alphas::clear) return put(Raw<T>{}, out);
-      if (alphas == Alphas::white) {
-        opaque_means(at, out);
-        return Ints(Depth<T>::white);
-      }
-      Ints means;
-      if (weighted_means(at, out, &means)) return means;
-      Raw<T> square[4];
-      at.load(square);
-      BoxSums<T> sums;
-      for (const Raw<T>& p : square) sums.add(p, [](Doubles v) HWY_ATTR { return v; });
-      return put(sums.mean(1.0), out);
+    at.fetch_ahead();
+    const Alphas alphas = at.alphas();
+    if (alphas == Alphas::clear) return put(Raw<T>{}, out);
+    if (alphas == Alphas::white) {
+      opaque_means(at, out);
+      return Ints(std::bit_cast<i32>(Depth<T>::white));
     }
+    Ints means;
+    if (weighted_means(at, out, &means)) return means;
+    Raw<T> square[4];
+    at.load(square);
+    BoxSums<T> sums;
+    for (const Raw<T>& p : square) sums.add(p, [](Doubles v) HWY_ATTR { return v; });
+    return put(sums.mean(1.0), out);
   });
 }
 

@@ -37,10 +37,27 @@ class Pairs {
   HWY_INLINE void next() { at_ += 2 * lane_count() * i32{sizeof(T)}; }
 
   HWY_INLINE const T* row(i32 y) const { return reinterpret_cast<const T*>(at_ + y * std::ptrdiff_t{row_bytes_}); }
-  // Of integer pixels.
+  // Processors that see the pattern stop at the end of a page of 4096 bytes.
+  HWY_INLINE void fetch_ahead() const {
+    for (i32 i = 0; i < 2; ++i)
+      HWY_NAMESPACE::fetch_ahead(reinterpret_cast<const char*>(row(i)) + 4096, 2 * lane_count() * i32{sizeof(T)});
+  }
   HWY_INLINE Alphas alphas() const {
-    const Alphas top = alphas_of(row(0), 2 * lane_count());
-    return top == Alphas::any || alphas_of(row(1), 2 * lane_count()) == top ? top : Alphas::any;
+    if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
+      const i32 first = std::bit_cast<i32>(row(0)->alpha);
+      if (first != 0 && first != std::bit_cast<i32>(1.0f)) return Alphas::any;
+      alignas(16) static constexpr i32 alpha[4] = {-1, 0, 0, 0};
+      Ints differs(0);
+      for (i32 i = 0; i < 16; ++i) {
+        const auto* const from = reinterpret_cast<const i32*>(row(i / 8)) + i % 8 * lane_count();
+        differs = differs | (Ints(hn::LoadU(Tag<i32>(), from)) ^ first);
+      }
+      if (!all((differs & hn::LoadDup128(Tag<i32>(), alpha)) == 0)) return Alphas::any;
+      return first == 0 ? Alphas::clear : Alphas::white;
+    } else {
+      const Alphas top = alphas_of(row(0), 2 * lane_count());
+      return top == Alphas::any || alphas_of(row(1), 2 * lane_count()) == top ? top : Alphas::any;
+    }
   }
   // The four pixels of each square in reading order.
   HWY_INLINE void load(Raw<T> (&square)[4]) const {
@@ -100,44 +117,38 @@ HWY_INLINE void opaque_means(const Pairs<ZR_Pixel16>& at, ZR_Pixel16* dst) {
         dst);
 }
 
-// A vector of every other float pixel.
-template <class D>
-HWY_INLINE hn::Vec<D> load_every_other(D d, const f32* from) {
-  if constexpr (hn::MaxLanes(D()) <= 4) {
-    return hn::LoadU(d, from);
-  } else {
-    const hn::Half<D> half;
-    return hn::Combine(d, load_every_other(half, from + 2 * hn::MaxLanes(half)), load_every_other(half, from));
-  }
-}
-HWY_INLINE bool is_clear(const Pairs<ZR_PixelFloat>& at) {
-  const Tag<i32> d;
-  alignas(16) static constexpr i32 alpha[4] = {-1, 0, 0, 0};
-  for (i32 i = 0; i < 16; ++i) {
-    const Ints v = hn::LoadU(d, reinterpret_cast<const i32*>(at.row(i / 8)) + i % 8 * lane_count());
-    if (!all((v & hn::LoadDup128(d, alpha)) == 0)) return false;
-  }
-  return true;
-}
-// False, with dst written in part, where a pixel is not opaque.
-HWY_INLINE bool opaque_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* dst) {
-  constexpr i32 pixels = lane_count() / 4;
-  const Tag<f32> d;
-  const auto is_alpha = hn::Eq(hn::And(hn::Iota(Tag<i32>(), 0), hn::Set(Tag<i32>(), 3)), hn::Zero(Tag<i32>()));
-  const auto colours = hn::Not(hn::RebindMask(d, is_alpha));
-  for (i32 i = 0; i < lane_count(); i += pixels) {
-    Doubles total = 0.0;
-    auto opaque = colours;  // is not asked of colours
-    bool all_opaque = true;
-    for (i32 k = 0; k < 4; ++k) {
-      const Floats v = load_every_other(d, reinterpret_cast<const f32*>(at.row(k / 2) + 2 * i + k % 2));
-      all_opaque = all_opaque && hn::AllTrue(d, hn::Or(opaque, hn::Eq(v.v, hn::Set(d, 1.0f))));
-      total = total + to_double(v);
+// Float channels in the sampler's own double precision. The four pixels of as many squares as fit a vector.
+struct DoubleSquares {
+  static constexpr i32 pixels = std::max(lane_count() / 8, 1);
+  hn::Vec<Tag<f64>> pixel[4];  // in reading order
+
+  HWY_INLINE DoubleSquares(const Pairs<ZR_PixelFloat>& at, i32 first) {
+    for (i32 row = 0; row < 2; ++row) {
+      const Tag<f64> d;
+      const HalfFloats half;
+      const auto* const from = reinterpret_cast<const f32*>(at.row(row) + 2 * first);
+      const auto low = hn::PromoteTo(d, hn::LoadU(half, from));
+      const auto high = hn::PromoteTo(d, hn::LoadU(half, from + 4 * pixels));
+      if constexpr (pixels == 1) {
+        pixel[2 * row] = low, pixel[2 * row + 1] = high;
+      } else {
+        pixel[2 * row] = hn::ConcatLowerLower(d, high, low), pixel[2 * row + 1] = hn::ConcatUpperUpper(d, high, low);
+      }
     }
-    if (!all_opaque) return false;
-    hn::StoreU(narrowed(total * 0.25).v, d, reinterpret_cast<f32*>(dst + i));
   }
-  return true;
+  static HWY_INLINE void store(hn::Vec<Tag<f64>> v, ZR_PixelFloat* dst) {
+    const HalfFloats half;
+    hn::StoreU(hn::DemoteTo(half, v), half, reinterpret_cast<f32*>(dst));
+  }
+};
+HWY_INLINE void opaque_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* dst) {
+  const Tag<f64> d;
+  for (i32 i = 0; i < lane_count(); i += DoubleSquares::pixels) {
+    const DoubleSquares square(at, i);
+    const auto* const p = square.pixel;
+    const auto total = hn::Add(hn::Add(hn::Add(p[0], p[1]), p[2]), p[3]);
+    DoubleSquares::store(hn::MulAdd(total, hn::Set(d, 0.25), hn::Zero(d)), dst + i);  // 0 for -0
+  }
 }
 
 // ----------------------------------------------------------------------------------------- weighted
@@ -301,39 +312,44 @@ HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel16>& at, ZR_Pixel16* dst, Int
   return !quotients.unsure();
 }
 
-// The same of floats in the sampler's own double precision, of which products need no rounding: always sure.
-HWY_INLINE void weighted_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* dst) {
-  constexpr i32 pixels = lane_count() / 8;  // of a vector
+// Floats: as the sampler does it, so that all is sure. Products of floats need no rounding.
+HWY_INLINE bool weighted_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* dst, Ints* alphas) {
+  constexpr i32 pixels = DoubleSquares::pixels;
   const Tag<f64> d;
   const hn::Rebind<i64, Tag<f64>> whole;
-  const HalfFloats half;
   const auto place = hn::Iota(whole, 0), first = hn::And(place, hn::Set(whole, ~i64{3}));
   const auto is_alpha = hn::RebindMask(d, hn::Eq(place, first));
   // Number k of each four in the place of all.
   const auto spread = [&](auto v, i64 k)
                           HWY_ATTR { return hn::TableLookupLanes(v, hn::IndicesFromVec(d, hn::Add(first, hn::Set(whole, k)))); };
   const auto zero = hn::Zero(d), one = hn::Set(d, 1.0), quarter = hn::Set(d, 0.25);
+  const auto limited = [&](auto v) HWY_ATTR { return hn::IfThenElse(hn::Gt(v, one), one, v); };  // NaN stays
+  Doubles means;
   for (i32 i = 0; i < lane_count(); i += 4 * pixels) {
     hn::Vec<Tag<f64>> sums[4];
     for (i32 v = 0; v < 4; ++v) {
+      const DoubleSquares square(at, i + v * pixels);
       sums[v] = zero;
-      for (i32 k = 0; k < 4; ++k) {
-        const auto* const from = reinterpret_cast<const f32*>(at.row(k / 2) + 2 * (i + v * pixels) + k % 2);
-        const auto c = hn::PromoteTo(d, load_every_other(half, from));
-        sums[v] = hn::MulAdd(c, hn::IfThenElse(is_alpha, one, spread(c, 0)), sums[v]);
-      }
+      for (const auto& p : square.pixel)
+        sums[v] = hn::MulAdd(p, hn::IfThenElse(is_alpha, one, spread(p, 0)), sums[v]);
     }
     // Alphas of four vectors in one.
     const auto front = hn::InterleaveLower(d, sums[0], sums[1]), back = hn::InterleaveLower(d, sums[2], sums[3]);
     const auto totals = hn::OddEvenBlocks(hn::SwapAdjacentBlocks(back), front), inverse = hn::Div(one, totals);
-    const bool any_clear = !hn::AllFalse(d, hn::Eq(totals, zero));
+    const auto alpha = hn::Mul(totals, quarter);
+    (i == 0 ? means.low : means.high) = limited(alpha);
+    const bool plain = hn::AllFalse(d, hn::Or(hn::Eq(totals, zero), hn::Gt(alpha, one)));
     for (i32 v = 0; v < 4; ++v) {
       auto mean = hn::Mul(sums[v], hn::IfThenElse(is_alpha, quarter, spread(inverse, v)));
-      mean = hn::IfThenElse(hn::And(is_alpha, hn::Gt(mean, one)), one, mean);  // NaN stays
-      if (any_clear) mean = hn::IfThenZeroElse(hn::Eq(spread(sums[v], 0), zero), mean);
-      hn::StoreU(hn::DemoteTo(half, mean), half, reinterpret_cast<f32*>(dst + i + v * pixels));
+      if (!plain) {
+        mean = hn::IfThenElse(is_alpha, limited(mean), mean);
+        mean = hn::IfThenZeroElse(hn::Eq(spread(sums[v], 0), zero), mean);
+      }
+      DoubleSquares::store(mean, dst + i + v * pixels);
     }
   }
+  *alphas = as_ints(narrowed(means));
+  return true;
 }
 
 }  // namespace HWY_NAMESPACE
