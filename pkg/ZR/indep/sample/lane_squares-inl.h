@@ -43,14 +43,15 @@ class Pairs {
       HWY_NAMESPACE::fetch_ahead(reinterpret_cast<const char*>(row(i)) + 4096, 2 * lane_count() * i32{sizeof(T)});
   }
   HWY_INLINE Alphas alphas() const {
+    const Channel<T> first = row(0)->alpha;
+    if (first != 0 && first != Depth<T>::white) return Alphas::any;  // most often enough
     if constexpr (std::is_same_v<T, ZR_PixelFloat>) {
-      const i32 first = std::bit_cast<i32>(row(0)->alpha);
-      if (first != 0 && first != std::bit_cast<i32>(1.0f)) return Alphas::any;
       alignas(16) static constexpr i32 alpha[4] = {-1, 0, 0, 0};
+      const i32 bits = std::bit_cast<i32>(first);
       Ints differs(0);
       for (i32 i = 0; i < 16; ++i) {
         const auto* const from = reinterpret_cast<const i32*>(row(i / 8)) + i % 8 * lane_count();
-        differs = differs | (Ints(hn::LoadU(Tag<i32>(), from)) ^ first);
+        differs = differs | (Ints(hn::LoadU(Tag<i32>(), from)) ^ bits);
       }
       if (!all((differs & hn::LoadDup128(Tag<i32>(), alpha)) == 0)) return Alphas::any;
       return first == 0 ? Alphas::clear : Alphas::white;
