@@ -189,6 +189,23 @@ class Quotients8 {
  private:
   hn::Vec<Tag<u16>> least_;  // fraction, and what is above it, which is never small
 };
+// The same means from sums of alpha and green and of red and blue, and sums of alphas of both vectors in turn, by the
+// sampler's own division.
+HWY_INLINE void divide_by_doubles(const Floats (&even)[2], const Floats (&odd)[2], Floats totals, ZR_Pixel8* dst) {
+  const Tag<f64> d;
+  const Doubles inverse = Doubles(1.0) / to_double(totals);
+  const Doubles by[2] = {
+      {hn::InterleaveLower(d, inverse.low, inverse.low), hn::InterleaveLower(d, inverse.high, inverse.high)},
+      {hn::InterleaveUpper(d, inverse.low, inverse.low), hn::InterleaveUpper(d, inverse.high, inverse.high)}};
+  for (i32 k = 0; k < 2; ++k) {
+    const auto quotient = [&](Floats v) HWY_ATTR { return fitting_int(to_double(v) * by[k] + 0.5); };
+    const Ints alpha = fitting_int(even[k] * 0.25f + 0.5f);
+    const Ints front = hn::OddEven(quotient(even[k]).v, alpha.v), both = front | shifted_left<8>(quotient(odd[k]));
+    const hn::Rebind<u16, Tag<i32>> narrow;
+    hn::StoreU(hn::TruncateTo(narrow, hn::BitCast(hn::Rebind<u32, Tag<i32>>(), both.v)), narrow,
+               reinterpret_cast<u16*>(dst + k * (lane_count() / 2)));
+  }
+}
 HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel8>& at, ZR_Pixel8* dst, Ints* alphas) {
   constexpr i32 pixels = lane_count() / 2;
   const Words words;
@@ -217,7 +234,7 @@ HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel8>& at, ZR_Pixel8* dst, Ints*
     add(1, k * pixels, e, o);
     even[k] = to_float(e), odd[k] = to_float(o);
   }
-  const Floats inverse = inverse_of(at_least(hn::OddEven(hn::DupEven(even[1].v), even[0].v), 0.5f));
+  const Floats totals = at_least(hn::OddEven(hn::DupEven(even[1].v), even[0].v), 0.5f), inverse = inverse_of(totals);
   const Floats by[2] = {hn::DupEven(inverse.v), hn::DupOdd(inverse.v)};
   Quotients8 quotients;
   Ints total(0);
@@ -233,7 +250,8 @@ HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel8>& at, ZR_Pixel8* dst, Ints*
     total = total + (Ints(hn::BitCast(ints, both)) & hn::LoadDup128(ints, alpha));
   }
   *alphas = total;
-  return !quotients.unsure();
+  if (quotients.unsure()) divide_by_doubles(even, odd, totals, dst);
+  return true;
 }
 
 // 16 bits. Sums of alpha * (colour - 16384) lie within 2^31, and all is exact modulo 2^32. What single precision makes
@@ -249,10 +267,10 @@ class Quotients16 {
     const Unsigned u;
     alignas(16) static constexpr i32 colours[4] = {0, -1, -1, -1};
     const Ints total = hn::Broadcast<0>(sums.v);
-    const Ints above = sums + shifted_right<1>(total) - (estimate - 16384) * total, below = above + total;
-    // Where the estimate is one more, `above` is negative. A tie leaves no remainder.
-    least_ = hn::Min(least_, hn::Min(hn::BitCast(u, above.v), hn::BitCast(u, below.v)));
-    return estimate + (shifted_right<31>(above) & hn::LoadDup128(Tag<i32>(), colours));
+    // Negative where the estimate is one more; 0 at a tie, of which the estimate is never too great.
+    const Ints remainder = sums + shifted_right<1>(total) - (estimate - 16384) * total;
+    least_ = hn::Min(least_, hn::BitCast(u, remainder.v));
+    return estimate + (shifted_right<31>(remainder) & hn::LoadDup128(Tag<i32>(), colours));
   }
   HWY_INLINE bool unsure() const {
     return !hn::AllTrue(Unsigned(), hn::Gt(least_, hn::Zero(Unsigned()))) ||
@@ -296,8 +314,8 @@ HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel16>& at, ZR_Pixel16* dst, Int
   const hn::Repartition<u64, Tag<f32>> both;
   const auto totals_of = [&](Floats a, Floats b)
                              HWY_ATTR { return hn::BitCast(both, hn::InterleaveLower(numbers, a.v, b.v)); };
-  const Floats totals = hn::BitCast(
-      numbers, hn::InterleaveLower(both, totals_of(real[0], real[1]), totals_of(real[2], real[3])));
+  const Floats totals =
+      hn::BitCast(numbers, hn::InterleaveLower(both, totals_of(real[0], real[1]), totals_of(real[2], real[3])));
   // Squares of white fit no sum, and those of any opaque pixels have ties enough.
   if (!none(totals >= 4 * 32768.0f)) return false;
   const Floats inverse = inverse_of(at_least(totals, 0.5f));
@@ -321,8 +339,9 @@ HWY_INLINE bool weighted_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* ds
   const auto place = hn::Iota(whole, 0), first = hn::And(place, hn::Set(whole, ~i64{3}));
   const auto is_alpha = hn::RebindMask(d, hn::Eq(place, first));
   // Number k of each four in the place of all.
-  const auto spread = [&](auto v, i64 k)
-                          HWY_ATTR { return hn::TableLookupLanes(v, hn::IndicesFromVec(d, hn::Add(first, hn::Set(whole, k)))); };
+  const auto spread = [&](auto v, i64 k) HWY_ATTR {
+    return hn::TableLookupLanes(v, hn::IndicesFromVec(d, hn::Add(first, hn::Set(whole, k))));
+  };
   const auto zero = hn::Zero(d), one = hn::Set(d, 1.0), quarter = hn::Set(d, 0.25);
   const auto limited = [&](auto v) HWY_ATTR { return hn::IfThenElse(hn::Gt(v, one), one, v); };  // NaN stays
   Doubles means;
@@ -331,8 +350,7 @@ HWY_INLINE bool weighted_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* ds
     for (i32 v = 0; v < 4; ++v) {
       const DoubleSquares square(at, i + v * pixels);
       sums[v] = zero;
-      for (const auto& p : square.pixel)
-        sums[v] = hn::MulAdd(p, hn::IfThenElse(is_alpha, one, spread(p, 0)), sums[v]);
+      for (const auto& p : square.pixel) sums[v] = hn::MulAdd(p, hn::IfThenElse(is_alpha, one, spread(p, 0)), sums[v]);
     }
     // Alphas of four vectors in one.
     const auto front = hn::InterleaveLower(d, sums[0], sums[1]), back = hn::InterleaveLower(d, sums[2], sums[3]);
