@@ -204,14 +204,13 @@ class BoxCopy {
     return all;
   }
   HWY_INLINE bool legal_channels(const T* row) const {
-    const hn::ScalableTag<u16> d;
-    constexpr i32 in_vector = static_cast<i32>(hn::MaxLanes(d)) / 4;
-    auto most = hn::Zero(d);
-    for (i32 i = 0;; i = std::min(i + in_vector, columns_ - in_vector)) {
-      most = hn::Max(most, hn::LoadU(d, reinterpret_cast<const u16*>(row + i)));
-      if (i + in_vector == columns_) break;
+    const Tag<u16> d;
+    auto most = hn::Zero(d), other = most;
+    for (i32 i = 0; i < columns_; i += lane_count()) {  // two vectors
+      const auto* const from = reinterpret_cast<const u16*>(row + i);
+      most = hn::Max(most, hn::LoadU(d, from)), other = hn::Max(other, hn::LoadU(d, from + 2 * lane_count()));
     }
-    return hn::AllFalse(d, hn::Gt(most, hn::Set(d, u16{32768})));
+    return hn::AllFalse(d, hn::Gt(hn::Max(most, other), hn::Set(d, u16{32768})));
   }
 
   template <bool weighted>
@@ -339,8 +338,7 @@ class BoxCopy {
         inverse = inverse_of(at_least(mul_add(first_of_four(sums), of_alpha, known), Number{0x1p-40f}));
       Rounding<T> rounding;
       store_channels(rounding.nearest(sums, inverse, doubt_), dst + at);
-      const Bools<i32> unsure = rounding.unsure();
-      if (!none(unsure)) sample(unsure, at, j);
+      if (!rounding.all_sure()) sample(rounding.unsure(), at, j);
       if (at + pixels == count_) break;
     }
   }

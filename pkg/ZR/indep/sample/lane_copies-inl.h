@@ -60,6 +60,7 @@ class FloatRounding {
     return least;
   }
   HWY_INLINE Bools<i32> unsure() const { return differences_ != 0; }
+  HWY_INLINE bool all_sure() const { return none(unsure()); }
 
  private:
   Ints differences_;
@@ -109,15 +110,18 @@ class DoubleRounding {
   }
   HWY_INLINE Bools<i32> unsure() const {
     const Tag<i32> d;
-    const auto limit = hn::Set(Tag<f64>(), 0.5 - 0x1p-24);
-    const auto words = [&](auto v) HWY_ATTR { return hn::BitCast(d, hn::VecFromMask(Tag<f64>(), hn::Gt(v, limit))); };
+    const auto words = [&](auto v) HWY_ATTR { return hn::BitCast(d, hn::VecFromMask(Tag<f64>(), too_far(v))); };
     return Ints(hn::ConcatEven(d, words(most_.high), words(most_.low))) != 0;
   }
+  HWY_INLINE bool all_sure() const { return hn::AllFalse(Tag<f64>(), too_far(hn::Max(most_.low, most_.high))); }
   // Of exact numbers of 32 bits of fraction, halves upward.
   static HWY_INLINE Ints half_up(Doubles v) { return low_words((v + 0x1p-34) + no_fraction); }
 
  private:
   static constexpr f64 no_fraction = 0x1p52;
+  static HWY_INLINE hn::Mask<Tag<f64>> too_far(hn::Vec<Tag<f64>> v) {
+    return hn::Gt(v, hn::Set(Tag<f64>(), 0.5 - 0x1p-24));
+  }
   static HWY_INLINE Ints low_words(Doubles v) {
     const Tag<i32> d;
     return hn::ConcatEven(d, hn::BitCast(d, v.high), hn::BitCast(d, v.low));
