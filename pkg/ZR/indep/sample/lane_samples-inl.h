@@ -6,8 +6,6 @@
 #define ZR_SAMPLE_LANE_SAMPLES_INL_H
 #endif
 
-#include <bit>
-
 #include "sample/lane_rows.h"
 #include "simd/lane_depth-inl.h"
 #include "simd/lane_doubles-inl.h"

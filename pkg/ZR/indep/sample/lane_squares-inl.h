@@ -37,7 +37,7 @@ class Pairs {
   HWY_INLINE void next() { at_ += 2 * lane_count() * i32{sizeof(T)}; }
 
   HWY_INLINE const T* row(i32 y) const { return reinterpret_cast<const T*>(at_ + y * std::ptrdiff_t{row_bytes_}); }
-  // Processors that see the pattern stop at the end of a page of 4096 bytes.
+  // A page of 4096 bytes ahead: processors that fetch by themselves stop at its end.
   HWY_INLINE void fetch_ahead() const {
     for (i32 i = 0; i < 2; ++i)
       HWY_NAMESPACE::fetch_ahead(reinterpret_cast<const char*>(row(i)) + 4096, 2 * lane_count() * i32{sizeof(T)});
@@ -154,8 +154,8 @@ HWY_INLINE void opaque_means(const Pairs<ZR_PixelFloat>& at, ZR_PixelFloat* dst)
 
 // ----------------------------------------------------------------------------------------- weighted
 
-// weighted_means(): squares of pixels whose alphas differ. False, with dst written in part, where what is rounded
-// otherwise than single numbers are may tell.
+// weighted_means(): squares of any pixels, and their alphas as sums take them. False, with anything written, where
+// what is rounded otherwise than single numbers are may tell.
 
 // The sums of products of both halves of each lane.
 HWY_INLINE Ints pair_products(hn::Vec<Words> a, hn::Vec<Words> b) {
@@ -175,7 +175,7 @@ HWY_INLINE Ints pair_products(hn::Vec<Words> a, hn::Vec<Words> b) {
 class Quotients8 {
  public:
   HWY_INLINE Quotients8() : least_(hn::Set(Tag<u16>(), u16{0xffff})) {}
-  // Above 16 bits of each lane: sums * by, rounded half up, in the lower byte.
+  // sums * by, rounded half up, in bits 16 to 23 of each lane.
   HWY_INLINE Ints rounded(Floats sums, Floats by, Floats half) {
     const Ints bits = as_ints(mul_add(sums, by, half)), doubled = bits + bits;
     least_ = hn::Min(least_, hn::BitCast(Tag<u16>(), doubled.v));
@@ -189,8 +189,8 @@ class Quotients8 {
  private:
   hn::Vec<Tag<u16>> least_;  // fraction, and what is above it, which is never small
 };
-// The same means from sums of alpha and green and of red and blue, and sums of alphas of both vectors in turn, by the
-// sampler's own division.
+// Where there are halves: by the sampler's own division. Sums of alpha and green, those of red and blue, and those of
+// alphas, of both vectors in turn.
 HWY_INLINE void divide_by_doubles(const Floats (&even)[2], const Floats (&odd)[2], Floats totals, ZR_Pixel8* dst) {
   const Tag<f64> d;
   const Doubles inverse = Doubles(1.0) / to_double(totals);
@@ -255,8 +255,8 @@ HWY_INLINE bool weighted_means(const Pairs<ZR_Pixel8>& at, ZR_Pixel8* dst, Ints*
 }
 
 // 16 bits. Sums of alpha * (colour - 16384) lie within 2^31, and all is exact modulo 2^32. What single precision makes
-// of a quotient is off by less than 6 * 2^-10 of a unit; made a little great, it is the rounded one or one more, and
-// the remainder tells which of them.
+// of a quotient is off by 7 * 2^-10 of a unit at most; made a little great, it is the rounded one or one more, and the
+// remainder tells which of them. Channels above white give anything, and are looked for.
 class Quotients16 {
  public:
   static constexpr f32 doubt = 0x1p-7f;
@@ -267,7 +267,7 @@ class Quotients16 {
     const Unsigned u;
     alignas(16) static constexpr i32 colours[4] = {0, -1, -1, -1};
     const Ints total = hn::Broadcast<0>(sums.v);
-    // Negative where the estimate is one more; 0 at a tie, of which the estimate is never too great.
+    // Negative where the estimate is one more; 0 at a tie, where it never is, and in clear squares.
     const Ints remainder = sums + shifted_right<1>(total) - (estimate - 16384) * total;
     least_ = hn::Min(least_, hn::BitCast(u, remainder.v));
     return estimate + (shifted_right<31>(remainder) & hn::LoadDup128(Tag<i32>(), colours));
