@@ -24,8 +24,7 @@ void expect_same(std::mt19937& random) {
   const i32 width = 60 + static_cast<i32>(random() % 200), height = 25000 / width + static_cast<i32>(random() % 300);
   const bool one_row = size > 9 || random() % 4 == 0;
   const u32 flags = (random() % 2 == 0 ? u32{ZR_ConvolveFlag_Normalised} : 0) +
-                    (random() % 2 == 0 ? u32{ZR_ConvolveFlag_Vertical} : 0) +
-                    (one_row ? u32{ZR_ConvolveFlag_1D} : 0);
+                    (random() % 2 == 0 ? u32{ZR_ConvolveFlag_Vertical} : 0) + (one_row ? u32{ZR_ConvolveFlag_1D} : 0);
   std::vector<i32> kernels[4];
   for (auto& kernel : kernels)
     for (i32 i = 0; i < (one_row ? size : size * size); ++i) kernel.push_back(static_cast<i32>(random() % 300) - 20);
