@@ -10,6 +10,7 @@
 #include "copy/copy_scaled.h"
 #include "sample/lane_copies.h"
 #include "sample/sample_functions.h"
+#include "simd/streamed.h"
 #include "world/guard.h"
 #include "world/slot_table.h"
 
@@ -80,6 +81,7 @@ struct SampledCopy {
     params.area = truncate_i32(x.step / 65536.0 * y.step);
     params.src = src;
     const ZR_WorldX<T> out(dst, false);
+    const bool large = i64{columns} * rows * static_cast<i64>(sizeof(T)) >= streamed_bytes;
     bool copies = inner.copy != nullptr;
     i32 copied = 0;  // rows below here have their inner pixels
     i32 at_y = y.start;
@@ -99,8 +101,8 @@ struct SampledCopy {
         if (copies && row >= copied) {
           // As far as the next poll and as the same columns go.
           const i32 last = std::min((row + 63) & ~63, rows - 1);
-          CopyPart<T> part = {range.end - range.first, 1, from, at_y, x.step, y.step, pixels + range.first,
-                              dst->row_bytes};
+          CopyPart<T> part = {range.end - range.first, 1,    from, at_y, x.step, y.step, pixels + range.first,
+                              dst->row_bytes,          large};
           for (i32 next = wrap_add(at_y, y.step); row + part.rows <= last; ++part.rows, next = wrap_add(next, y.step)) {
             const PixelRange other = inner_at(next);
             if (other.first != range.first || other.end != range.end) break;

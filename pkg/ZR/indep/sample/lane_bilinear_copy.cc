@@ -95,8 +95,28 @@ class BetweenRows {
     }
     sample_left(first);
   }
+  // The columns before those whose rows all begin on a cache line, and go past the caches; 0 where none do.
+  i32 columns_before_streams() {
+    constexpr std::uintptr_t line = 64;
+    const std::uintptr_t ahead = (0 - reinterpret_cast<std::uintptr_t>(part_.dst)) % line;
+    streams_ = part_.past_caches && part_.dst_row_bytes % std::ptrdiff_t{line} == 0 && ahead % sizeof(T) == 0;
+    return streams_ ? static_cast<i32>(ahead / sizeof(T)) : 0;
+  }
+  // A vector that shares columns with others.
+  HWY_INLINE void write_at_end(i32 first) {
+    streams_ = false;
+    write(first, 1);
+  }
 
  private:
+  HWY_INLINE void write_pixels(const Raw<T>& p, T* dst) const {
+    if (!streams_) return store(p, dst);
+    const Tag<i32> d;
+    alignas(64) T pixels[lane_count()];
+    store(p, pixels);
+    for (i32 i = 0; i < Raw<T>::words * lane_count(); i += lane_count())
+      hn::Stream(hn::Load(d, reinterpret_cast<const i32*>(pixels) + i), d, reinterpret_cast<i32*>(dst) + i);
+  }
   // Vectors that are left to the sampler wait for each other: a branch at each of them is foretold wrongly.
   HWY_INLINE void sample_left(i32 first) {
     for (i32 k = 0; k < left_rows_; ++k)
@@ -163,7 +183,7 @@ class BetweenRows {
         const Ints w = upper[0].w[k];
         differences = differences | ((w ^ upper[1].w[k]) | (w ^ lower[0].w[k]) | (w ^ lower[1].w[k]));
       }
-      store(pick(differences == 0, upper[0], Raw<T>{}), dst + i * lane_count());
+      write_pixels(pick(differences == 0, upper[0], Raw<T>{}), dst + i * lane_count());
     }
   }
   HWY_INLINE bool write_opaque(i32 i, const Row& upper, const Row& lower, Real beside, Real below, T* dst) const {
@@ -175,7 +195,7 @@ class BetweenRows {
       else
         return rounding.nearest(v, 1.0f, doubt_of_sums_);
     };
-    store(packed<T>(i32{Depth<T>::white}, colour(1), colour(2), colour(3)), dst);
+    write_pixels(packed<T>(i32{Depth<T>::white}, colour(1), colour(2), colour(3)), dst);
     return none(rounding.unsure());
   }
   HWY_INLINE bool write_any(i32 i, const Row& upper, const Row& lower, Real beside, Real below, T* dst) const {
@@ -188,13 +208,13 @@ class BetweenRows {
       const Floats by = inverse * 65536.0f;
       const FixedPixels p = {rounding.nearest(alpha, 65536.0f), rounding.nearest(between(1), by),
                              rounding.nearest(between(2), by), rounding.nearest(between(3), by)};
-      store(p.whole(), dst);
+      write_pixels(p.whole(), dst);
       return none(rounding.unsure(p) || p.alpha < 65536);
     } else {
       DoubleRounding rounding;
       const auto colour = [&](i32 c) HWY_ATTR { return rounding.nearest(between(c), inverse, 0.0); };
       const Ints whole = rounding.nearest(alpha, 1.0, 0.0);
-      store(packed<T>(whole, colour(1), colour(2), colour(3)), dst);
+      write_pixels(packed<T>(whole, colour(1), colour(2), colour(3)), dst);
       return none(rounding.unsure() || whole == 0);
     }
   }
@@ -202,6 +222,7 @@ class BetweenRows {
   const CopyPart<T>& part_;
   const ZR_SampPB& params_;
   LaneRowFunc<T>* sampler_;
+  bool streams_ = false;
   f32 doubt_of_sums_ = Doubt<T>::of_sums;
   struct Left {
     i32 row;
@@ -219,9 +240,11 @@ template <class T, class Neighbours>
 bool copy_between(const CopyPart<T>& part, const ZR_SampPB& params, LaneRowFunc<T>* sampler) {
   constexpr i32 lanes = lane_count();
   BetweenRows<T, Neighbours> rows(part, params, sampler);
-  const i32 vectors = part.columns / lanes;
-  for (i32 i = 0; i < vectors; i += stretch) rows.write(i * lanes, std::min(stretch, vectors - i));
-  if (vectors * lanes != part.columns) rows.write(part.columns - lanes, 1);  // overlaps the one before
+  const i32 before = rows.columns_before_streams(), vectors = (part.columns - before) / lanes;
+  for (i32 i = 0; i < vectors; i += stretch) rows.write(before + i * lanes, std::min(stretch, vectors - i));
+  hwy::FlushStream();
+  for (i32 i = 0; i < before; i += lanes) rows.write_at_end(std::min(i, part.columns - lanes));
+  if (before + vectors * lanes != part.columns) rows.write_at_end(part.columns - lanes);
   return true;
 }
 

@@ -14,6 +14,7 @@ struct CopyPart {
   i32 columns, rows, x, y, step_x, step_y;
   T* dst;
   std::ptrdiff_t dst_row_bytes;
+  bool past_caches;  // the whole copy does not stay there
 
   T* row(i32 j) const { return reinterpret_cast<T*>(reinterpret_cast<char*>(dst) + j * dst_row_bytes); }
   SampleRun run(i32 first, i32 count, i32 j) const { return {count, x + first * step_x, y + j * step_y, step_x, 0}; }
