@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cstring>
 #include <type_traits>
+#include <utility>
 
 #include "world/depth_rows.h"
 #include "world/guard.h"
@@ -61,6 +62,27 @@ void move_rows(const ZR_LayerDef& src, const ZR_LayerDef& dst, const CopyArea& a
     std::memmove(dst_row<T>(dst, area, row), src_row<T>(src, area, row), bytes);
 }
 
+// Whether no byte is in rows of both sides.
+template <class T>
+bool rows_are_apart(const ZR_LayerDef& src, const ZR_LayerDef& dst, const CopyArea& area, i32 first, i32 count) {
+  const auto range = [&](const T* top, i64 row_bytes) {
+    const auto begin = reinterpret_cast<std::intptr_t>(top), last = begin + (count - 1) * row_bytes;
+    return std::pair(std::min(begin, last), std::max(begin, last) + area.columns() * std::intptr_t{sizeof(T)});
+  };
+  const auto from = range(src_row<T>(src, area, first), src.row_bytes);
+  const auto to = range(dst_row<T>(dst, area, first), dst.row_bytes);
+  return from.second <= to.first || to.second <= from.first;
+}
+// Moves rows of one depth: in bands, or in their order where that matters.
+template <class T>
+void move_rows_divided(const ZR_LayerDef& src, const ZR_LayerDef& dst, const CopyArea& area, i32 first, i32 count) {
+  const auto move = [&](i32 top, i32 bottom) { move_rows<T>(src, dst, area, top, bottom - top); };
+  if (rows_are_apart<T>(src, dst, area, first, count))
+    each_band(first, first + count, area.columns(), 2 * sizeof(T), move);
+  else
+    move(first, first + count);
+}
+
 // From here on, both worlds together, a conversion gains by storing past the caches even where its result is read
 // right after. Measured with caches of 2 MB a core.
 constexpr i64 past_caches = i64{32} << 20;
@@ -69,7 +91,7 @@ template <class To, class From>
 void copy_rows(const ZR_LayerDef& src, const ZR_LayerDef& dst, const CopyArea& area, bool dither, i32 first,
                i32 count) {
   if constexpr (std::is_same_v<To, From>) {
-    move_rows<To>(src, dst, area, first, count);
+    move_rows_divided<To>(src, dst, area, first, count);
   } else {
     const auto convert = [&](i32 y) {
       convert_row(area.columns(), src_row<From>(src, area, first + y), dst_row<To>(dst, area, first + y), dither);
@@ -108,7 +130,7 @@ void ZR_WorldX<T>::CopyRect(const ZR_World* src, const GX_LRect& rect, i32 dst_x
   if (src->GetBitDepth() != GetBitDepth())
     zr::fail(zr::failed_verification(ZR_Site_CopyRect, "Src and dest bitdepths are different in ZR_World::CopyRect"));
   const zr::CopyArea area(*src, rect, dst_x, dst_y, *this);
-  if (!area.empty()) zr::move_rows<T>(*src, *this, area, 0, area.rows());
+  if (!area.empty()) zr::move_rows_divided<T>(*src, *this, area, 0, area.rows());
 }
 
 template <class T>
