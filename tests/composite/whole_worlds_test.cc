@@ -99,12 +99,6 @@ struct Asked {
   }
 };
 
-i32 backwards(i32 iterations, void* refcon, ZR_GenericFunc fn) {
-  i32 result = 0;
-  for (i32 i = iterations - 1; i >= 0 && result == 0; --i) result = fn(refcon, 0, i, iterations);
-  return result;
-}
-
 TYPED_TEST(Premultiply, RowsInAnyOrderAndOneAbort) {
   using T = TypeParam;
   TestWorld<T> src(200, 500), plain_done(200, 500), coloured_done(200, 500);
@@ -113,7 +107,7 @@ TYPED_TEST(Premultiply, RowsInAnyOrderAndOneAbort) {
   ASSERT_EQ(ZR_PremulRect_S(nullptr, 1, nullptr, plain_done), 0);
   ASSERT_EQ(ZR_PremulColorFloat(nullptr, src, &matte, 1, coloured_done), 0);
   for (const bool reversed : {false, true}) {
-    SlotOverride order(ZR_Slot_iterate_generic, reversed ? reinterpret_cast<void*>(&backwards)
+    SlotOverride order(ZR_Slot_iterate_generic, reversed ? reinterpret_cast<void*>(&iterate_backwards)
                                                          : reinterpret_cast<void*>(&ZR_IterateGeneric_Static));
     for (i32 answer : {0, 66}) {
       TestWorld<T> plain = src, coloured(200, 500);

@@ -53,3 +53,10 @@ class SlotOverride {
   ZR_SlotIndex slot_;
   ZR_SlotFunc before_;
 };
+
+// For slot 53: threads may take rows and bands in any order.
+inline i32 iterate_backwards(i32 iterations, void* refcon, ZR_GenericFunc fn) {
+  i32 result = 0;
+  for (i32 i = iterations - 1; i >= 0 && result == 0; --i) result = fn(refcon, 0, i, iterations);
+  return result;
+}

@@ -91,25 +91,31 @@ TYPED_TEST(Copies, EveryPositionIsClippedLikeTheModel) {
   EXPECT_GT(written, 40) << "the table must not consist of empty copies";
 }
 
-// Beyond the size from which conversions store past the caches; rows begin anywhere in a line.
-TYPED_TEST(Copies, LargeWorldsAreConvertedRowByRow) {
+// Beyond the size from which rows go in bands, and conversions past the caches; rows begin anywhere in a line.
+TYPED_TEST(Copies, LargeWorldsAreCopiedRowByRow) {
   using To = typename TypeParam::To;
   using From = typename TypeParam::From;
-  if constexpr (!std::is_same_v<To, From>) {
-    constexpr i32 width = 2999, height = (i32{34} << 20) / (width * static_cast<i32>(sizeof(To) + sizeof(From))),
-                  few = 7;
-    TestWorld<From> some(width, few), src(width, height);
-    some.randomise(9);
-    for (i32 y = 0; y < height; ++y) std::memcpy(&src.at(0, y), &some.at(0, y % few), width * sizeof(From));
-    TestWorld<To> dst(width + 1, height);
-    reference(dst)->CopyRectPossiblyDifferentBitdepth(reference(src).get(), {0, 0, width, height}, false, 1, 0,
-                                                      nullptr);
-    EXPECT_TRUE(dst.guards_intact());
-    std::vector<To> row(static_cast<size_t>(width));
-    for (i32 y = 0; y < height; ++y) {
+  constexpr i32 width = 2999, height = (i32{34} << 20) / (width * static_cast<i32>(sizeof(To) + sizeof(From))), few = 7;
+  TestWorld<From> some(width, few), src(width, height);
+  some.randomise(9);
+  for (i32 y = 0; y < height; ++y) std::memcpy(&src.at(0, y), &some.at(0, y % few), width * sizeof(From));
+  TestWorld<To> dst(width + 1, height);
+  const SlotOverride order(ZR_Slot_iterate_generic, reinterpret_cast<void*>(&iterate_backwards));
+  reference(dst)->CopyRectPossiblyDifferentBitdepth(reference(src).get(), {0, 0, width, height}, false, 1, 0, nullptr);
+  EXPECT_TRUE(dst.guards_intact());
+  const size_t row_bytes = static_cast<size_t>(width) * sizeof(To);
+  std::vector<To> row(static_cast<size_t>(width));
+  for (i32 y = 0; y < height; ++y) {
+    if constexpr (std::is_same_v<To, From>)
+      std::memcpy(row.data(), &src.at(0, y), row_bytes);
+    else
       zr::convert_row(width, &src.at(0, y), row.data(), false);
-      ASSERT_EQ(std::memcmp(&dst.at(1, y), row.data(), row.size() * sizeof(To)), 0) << y;
-    }
+    ASSERT_EQ(std::memcmp(&dst.at(1, y), row.data(), row_bytes), 0) << y;
+  }
+  if constexpr (std::is_same_v<To, From>) {  // onto itself, a few rows down: from the top on, rows are seen again
+    reference(dst)->CopyRect(reference(dst).get(), {0, 0, width + 1, height}, 0, few - 2);
+    for (i32 y = 0; y < height; ++y)
+      ASSERT_EQ(std::memcmp(&dst.at(1, y), &src.at(0, y % (few - 2)), row_bytes), 0) << y;
   }
 }
 
