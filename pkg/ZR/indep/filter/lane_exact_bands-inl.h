@@ -399,11 +399,11 @@ class ExactLanes {
     const auto terms = [](const auto& w, Numbers magic, const auto& sample, Numbers middle, Numbers* upper,
                           Numbers* lower) HWY_ATTR {
       for (i32 k = 0; k <= half; ++k) {
-        upper[k] = magic, lower[k] = hn::Zero(Tag<f32>());
+        upper[k] = magic;
         for (i32 t = 0; t < side; ++t) {
           const auto product = hn::Mul(t == half ? middle : sample(t), w[k][std::min(t, side - 1 - t)]);
-          const auto sum = hn::Add(upper[k], product);
-          lower[k] = hn::Add(lower[k], hn::Sub(product, hn::Sub(sum, upper[k])));
+          const auto sum = hn::Add(upper[k], product), rest = hn::Sub(product, hn::Sub(sum, upper[k]));
+          lower[k] = t == 0 ? rest : hn::Add(lower[k], rest);
           upper[k] = sum;
         }
         upper[k] = hn::Sub(upper[k], magic);
