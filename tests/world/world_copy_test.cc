@@ -112,6 +112,19 @@ TYPED_TEST(Copies, LargeWorldsAreCopiedRowByRow) {
       zr::convert_row(width, &src.at(0, y), row.data(), false);
     ASSERT_EQ(std::memcmp(&dst.at(1, y), row.data(), row_bytes), 0) << y;
   }
+  if constexpr (std::is_same_v<To, ZR_Pixel8> && !std::is_same_v<To, From>) {  // dither goes on from row to row
+    ZR_ResetDitherRandomIndex();
+    reference(dst)->CopyRectPossiblyDifferentBitdepth(reference(src).get(), {0, 0, width, height}, true, 1, 0, nullptr);
+    std::vector<To> behind(row);
+    zr::convert_row(width, &src.at(0, 0), behind.data(), true);
+    ZR_ResetDitherRandomIndex();
+    for (i32 y = 0; y < height; ++y) {
+      zr::convert_row(width, &src.at(0, y), row.data(), true);
+      ASSERT_EQ(std::memcmp(&dst.at(1, y), row.data(), row_bytes), 0) << y;
+    }
+    zr::convert_row(width, &src.at(0, 0), row.data(), true);
+    EXPECT_EQ(std::memcmp(behind.data(), row.data(), row_bytes), 0);
+  }
   if constexpr (std::is_same_v<To, From>) {  // onto itself, a few rows down: from the top on, rows are seen again
     reference(dst)->CopyRect(reference(dst).get(), {0, 0, width + 1, height}, 0, few - 2);
     for (i32 y = 0; y < height; ++y)

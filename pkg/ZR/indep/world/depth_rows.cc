@@ -49,8 +49,7 @@ void each_drawn(i32 count, const From* src, const Drawn* drawn, To* dst, Rule ru
 
 // Calls convert(count, words, first pixel) with the words of block after block; a whole block may be read of any.
 template <class Convert>
-HWY_INLINE void each_dithered_block(i32 n, Convert convert) {
-  DitherRow dither;
+HWY_INLINE void each_dithered_block(i32 n, DitherRow& dither, Convert convert) {
   u32 words[block_channels] = {};
   for (i32 first = 0; first < n; first += block_channels / 4) {
     const i32 count = 4 * std::min(n - first, block_channels / 4);
@@ -62,8 +61,8 @@ HWY_INLINE void each_dithered_block(i32 n, Convert convert) {
   }
 }
 
-inline void narrow_16_dithered(i32 n, const ZR_Pixel16* src, ZR_Pixel8* dst) {
-  each_dithered_block(n, [&](i32 count, const u32* words, i32 first) HWY_ATTR {
+inline void narrow_16_dithered(i32 n, const ZR_Pixel16* src, ZR_Pixel8* dst, DitherRow& dither) {
+  each_dithered_block(n, dither, [&](i32 count, const u32* words, i32 first) HWY_ATTR {
     each_drawn(count, src + first, words, dst + first, [](u16 v, u32 word) { return narrow_16_to_8_dither(v, word); });
   });
 }
@@ -145,8 +144,8 @@ HWY_INLINE Floats dither_offsets(const u32* drawn) {
   const Floats word = high * 65536.0f + to_float(masked(ordered, 65535));
   return word * 0x1p-40f - 0x1p-9f;
 }
-inline void narrow_float_dithered(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst, bool nearest) {
-  each_dithered_block(n, [&](i32 count, const u32* words, i32 first) HWY_ATTR {
+inline void narrow_float_dithered(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst, bool nearest, DitherRow& dither) {
+  each_dithered_block(n, dither, [&](i32 count, const u32* words, i32 first) HWY_ATTR {
     const auto dithered = [=](Floats c, i32 at) HWY_ATTR { return (c + dither_offsets(words + at)) * 255.0f; };
     if (nearest)
       narrow_lanes(count / 4, src + first, dst + first,
@@ -177,8 +176,8 @@ inline void narrow_nearest(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst) {
   each_channel(n, src, dst, [](f32 c, i32) { return narrow_float_to_8_nearest(c); });
 }
 
-inline void narrow_float_dithered(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst, bool nearest) {
-  each_dithered_block(n, [&](i32 count, const u32* words, i32 first) {
+inline void narrow_float_dithered(i32 n, const ZR_PixelFloat* src, ZR_Pixel8* dst, bool nearest, DitherRow& dither) {
+  each_dithered_block(n, dither, [&](i32 count, const u32* words, i32 first) {
     f32 offsets[block_channels];
     for (i32 k = 0; k < count; k += 4) {  // drawn for alpha, red, blue, green
       offsets[k] = dither_offset(words[k]);
@@ -201,7 +200,7 @@ inline bool takes_vector_rule(const ZR_PixelFloat* row) {
 }
 
 template <class To, class From>
-void convert(i32 n, const From* src, To* dst, bool dither) {
+void convert(i32 n, const From* src, To* dst, DitherRow* dither) {
   constexpr bool from8 = std::is_same_v<From, ZR_Pixel8>, from16 = std::is_same_v<From, ZR_Pixel16>;
   constexpr bool to8 = std::is_same_v<To, ZR_Pixel8>, to16 = std::is_same_v<To, ZR_Pixel16>;
   if constexpr (from8 && to16) {
@@ -209,16 +208,16 @@ void convert(i32 n, const From* src, To* dst, bool dither) {
   } else if constexpr (from8) {
     each_channel(n, src, dst, [](u8 v, i32) { return widen_8_to_float(v); });
   } else if constexpr (from16 && to8) {
-    if (dither)
-      narrow_16_dithered(n, src, dst);
+    if (dither != nullptr)
+      narrow_16_dithered(n, src, dst, *dither);
     else
       each_channel(n, src, dst, [](u16 v, i32) { return narrow_16_to_8(v); });
   } else if constexpr (from16) {
     each_channel(n, src, dst, [](u16 v, i32) { return widen_16_to_float(v); });
   } else if constexpr (to16) {
     narrow_scalar(n, src, dst);
-  } else if (dither) {
-    narrow_float_dithered(n, src, dst, takes_vector_rule(src));  // by either rule alpha is clamped too
+  } else if (dither != nullptr) {
+    narrow_float_dithered(n, src, dst, takes_vector_rule(src), *dither);  // by either rule alpha is clamped too
   } else if (takes_vector_rule(src)) {
     narrow_nearest(n, src, dst);
   } else {
@@ -240,17 +239,17 @@ void convert_past_caches(i32 n, const From* src, To* dst) {
   const std::size_t ahead = (0 - reinterpret_cast<std::uintptr_t>(dst)) % line;
   if (ahead % sizeof(To) == 0) {
     const i32 first = std::min(n, static_cast<i32>(ahead / sizeof(To)));
-    if (first > 0) convert(first, src, dst, false);
+    if (first > 0) convert(first, src, dst, nullptr);
     alignas(line) To made[block];
     for (i32 i = first; i < n; i += block) {
       const i32 count = std::min(n - i, block);
-      convert(count, src + i, made, false);
+      convert(count, src + i, made, nullptr);
       stream_bytes(static_cast<std::size_t>(count) * sizeof(To), made, dst + i);
     }
     return;
   }
 #endif
-  convert(n, src, dst, false);
+  convert(n, src, dst, nullptr);
 }
 
 template void convert_past_caches(i32, const ZR_Pixel8*, ZR_Pixel16*);
@@ -259,12 +258,12 @@ template void convert_past_caches(i32, const ZR_Pixel16*, ZR_Pixel8*);
 template void convert_past_caches(i32, const ZR_Pixel16*, ZR_PixelFloat*);
 template void convert_past_caches(i32, const ZR_PixelFloat*, ZR_Pixel8*);
 template void convert_past_caches(i32, const ZR_PixelFloat*, ZR_Pixel16*);
-template void convert(i32, const ZR_Pixel8*, ZR_Pixel16*, bool);
-template void convert(i32, const ZR_Pixel8*, ZR_PixelFloat*, bool);
-template void convert(i32, const ZR_Pixel16*, ZR_Pixel8*, bool);
-template void convert(i32, const ZR_Pixel16*, ZR_PixelFloat*, bool);
-template void convert(i32, const ZR_PixelFloat*, ZR_Pixel8*, bool);
-template void convert(i32, const ZR_PixelFloat*, ZR_Pixel16*, bool);
+template void convert(i32, const ZR_Pixel8*, ZR_Pixel16*, DitherRow*);
+template void convert(i32, const ZR_Pixel8*, ZR_PixelFloat*, DitherRow*);
+template void convert(i32, const ZR_Pixel16*, ZR_Pixel8*, DitherRow*);
+template void convert(i32, const ZR_Pixel16*, ZR_PixelFloat*, DitherRow*);
+template void convert(i32, const ZR_PixelFloat*, ZR_Pixel8*, DitherRow*);
+template void convert(i32, const ZR_PixelFloat*, ZR_Pixel16*, DitherRow*);
 template void narrow(i32, const ZR_PixelFloat*, ZR_Pixel8*);
 template void narrow(i32, const ZR_PixelFloat*, ZR_Pixel16*);
 
@@ -278,15 +277,21 @@ HWY_AFTER_NAMESPACE();
 namespace zr {
 
 template <class To, class From>
-void convert_row(i32 n, const From* src, To* dst, bool dither) {
+void convert_row(i32 n, const From* src, To* dst, DitherRow* dither) {
   ZR_RETURN_BEST(convert(n, src, dst, dither));
   HWY_STATIC_DISPATCH(convert)(n, src, dst, dither);
+}
+template <class To, class From>
+void convert_row(i32 n, const From* src, To* dst, bool dither) {
+  if (!dither) return convert_row(n, src, dst, static_cast<DitherRow*>(nullptr));
+  DitherRow words;
+  convert_row(n, src, dst, &words);
 }
 
 template <class To, class From>
 void stream_row(i32 n, const From* src, To* dst) {
   ZR_RETURN_BEST(convert_past_caches(n, src, dst));
-  HWY_STATIC_DISPATCH(convert)(n, src, dst, false);
+  HWY_STATIC_DISPATCH(convert)(n, src, dst, nullptr);
 }
 
 void finish_streamed_rows() { hwy::FlushStream(); }
@@ -311,6 +316,8 @@ template void convert_row(i32, const ZR_Pixel16*, ZR_Pixel8*, bool);
 template void convert_row(i32, const ZR_Pixel16*, ZR_PixelFloat*, bool);
 template void convert_row(i32, const ZR_PixelFloat*, ZR_Pixel8*, bool);
 template void convert_row(i32, const ZR_PixelFloat*, ZR_Pixel16*, bool);
+template void convert_row(i32, const ZR_Pixel16*, ZR_Pixel8*, DitherRow*);
+template void convert_row(i32, const ZR_PixelFloat*, ZR_Pixel8*, DitherRow*);
 
 }  // namespace zr
 #endif

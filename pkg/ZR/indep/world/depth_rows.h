@@ -5,11 +5,16 @@
 
 namespace zr {
 
+class DitherRow;
+
 // n pixels of src to another depth; the rows do not overlap. `dither` counts for rows to 8 bits only and
 // draws four words a pixel. A float row narrows to 8 bits by the vector rule where the processor record
 // says SSE2 and src is a multiple of 16, by the scalar rule elsewhere; one rule holds for the whole row.
 template <class To, class From>
 void convert_row(i32 n, const From* src, To* dst, bool dither);
+// Dithered with these words, to 8 bits; four for each pixel.
+template <class To, class From>
+void convert_row(i32 n, const From* src, To* dst, DitherRow* words);
 
 // The same without dither, past the caches where the processor can: for rows of worlds that do not fit there, as
 // they would push out what is still to be read. finish_streamed_rows() after the last one, on the same thread, shows

@@ -19,6 +19,11 @@ constinit DitherTable ZR_DitherTable = {};
 // The word last used. Relaxed: a torn address is the one race that would not be harmless.
 constinit std::atomic<const u32*> ZR_DitherCursor = nullptr;
 
+const u32* cursor_behind(i64 words) {
+  const i64 at = ZR_DitherCursor.load(std::memory_order_relaxed) - ZR_DitherTable.start;
+  return ZR_DitherTable.start + (at + words) % (ZR_DitherTable.end - ZR_DitherTable.start);
+}
+
 }  // namespace
 
 void prepare_dither() {
@@ -29,8 +34,12 @@ void prepare_dither() {
   ZR_ResetDitherRandomIndex();
 }
 
-DitherRow::DitherRow() : cursor_(ZR_DitherCursor.load(std::memory_order_relaxed)) {}
-DitherRow::~DitherRow() { ZR_DitherCursor.store(cursor_, std::memory_order_relaxed); }
+DitherRow::DitherRow() : cursor_(ZR_DitherCursor.load(std::memory_order_relaxed)), puts_back_(true) {}
+DitherRow::DitherRow(i64 words_before) : cursor_(cursor_behind(words_before)), puts_back_(false) {}
+DitherRow::~DitherRow() {
+  if (puts_back_) ZR_DitherCursor.store(cursor_, std::memory_order_relaxed);
+}
+void skip_dither_words(i64 count) { ZR_DitherCursor.store(cursor_behind(count), std::memory_order_relaxed); }
 
 void DitherRow::draw(std::size_t count, u32* words) {
   while (count > 0) {

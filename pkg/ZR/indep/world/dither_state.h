@@ -13,10 +13,13 @@ namespace zr {
 // Takes the table from its library and puts the cursor to its start.
 void prepare_dither();
 
-// The words of one row: takes the cursor when it is made and puts it back when it goes.
+// The words of rows: takes the cursor when it is made and puts it back when it goes.
 class DitherRow {
  public:
   DitherRow();
+  // From the word behind so many that are left to others, with the cursor as it is: skip_dither_words() moves that when
+  // all are drawn.
+  explicit DitherRow(i64 words_before);
   ~DitherRow();
   DitherRow(const DitherRow&) = delete;
   DitherRow& operator=(const DitherRow&) = delete;
@@ -29,6 +32,10 @@ class DitherRow {
 
  private:
   const u32* cursor_;
+  bool puts_back_;
 };
+
+// Moves the cursor on as drawing so many words does.
+void skip_dither_words(i64 count);
 
 }  // namespace zr

@@ -9,6 +9,7 @@
 #include <utility>
 
 #include "world/depth_rows.h"
+#include "world/dither_state.h"
 #include "world/guard.h"
 #include "world/row_bands.h"
 
@@ -93,19 +94,23 @@ void copy_rows(const ZR_LayerDef& src, const ZR_LayerDef& dst, const CopyArea& a
   if constexpr (std::is_same_v<To, From>) {
     move_rows_divided<To>(src, dst, area, first, count);
   } else {
-    const auto convert = [&](i32 y) {
-      convert_row(area.columns(), src_row<From>(src, area, first + y), dst_row<To>(dst, area, first + y), dither);
-    };
     constexpr i64 bytes = sizeof(To) + sizeof(From);
-    // Dither goes on from row to row.
-    if (dither && std::is_same_v<To, ZR_Pixel8>)
-      for (i32 y = 0; y < count; ++y) convert(y);
-    else if (area.columns() * bytes * area.rows() < past_caches)
-      each_row(0, count, area.columns(), bytes, convert);
+    const auto from = [&](i32 y) { return src_row<From>(src, area, first + y); };
+    const auto to = [&](i32 y) { return dst_row<To>(dst, area, first + y); };
+    if constexpr (std::is_same_v<To, ZR_Pixel8>)
+      if (dither) {  // goes on from row to row
+        const i64 row_words = 4 * i64{area.columns()};
+        each_band(0, count, area.columns(), bytes, [&](i32 top, i32 bottom) {
+          DitherRow words(top * row_words);
+          for (i32 y = top; y < bottom; ++y) convert_row(area.columns(), from(y), to(y), &words);
+        });
+        return skip_dither_words(count * row_words);
+      }
+    if (area.columns() * bytes * area.rows() < past_caches)
+      each_row(0, count, area.columns(), bytes, [&](i32 y) { convert_row(area.columns(), from(y), to(y), false); });
     else
       each_band(0, count, area.columns(), bytes, [&](i32 top, i32 bottom) {
-        for (i32 y = top; y < bottom; ++y)
-          stream_row(area.columns(), src_row<From>(src, area, first + y), dst_row<To>(dst, area, first + y));
+        for (i32 y = top; y < bottom; ++y) stream_row(area.columns(), from(y), to(y));
         finish_streamed_rows();
       });
   }
