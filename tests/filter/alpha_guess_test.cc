@@ -101,6 +101,39 @@ TEST_F(AlphaGuess, RunsAndMixturesAsTheStepsSayOnEveryProcessor) {
   EXPECT_GT(*std::min_element(codes, codes + 3), 0) << "all codes come up";
 }
 
+// Large worlds are scanned in bands, which threads take in any order. What counts may be in one pixel of any of them,
+// or only between two.
+TEST_F(AlphaGuess, BandsInAnyOrderAreOneScan) {
+  const SlotOverride order(ZR_Slot_iterate_generic, reinterpret_cast<void*>(&iterate_backwards));
+  std::mt19937 random(6);
+  i32 codes[3] = {};
+  constexpr i32 width = 700, height = 800, band_rows = 200;
+  for (i32 round = 0; round < 200; ++round) {
+    const auto level = [&](u32 most) { return static_cast<u8>(random() % (most + 1)); };
+    const u8 matte = round % 3 == 0 ? 0 : round % 3 == 1 ? 255 : 90;
+    const ZR_Pixel8 clear = {0, matte, matte, matte};
+    const u8 alpha = static_cast<u8>(round % 20 == 5 ? 0 : 1 + level(4)), least = std::min(alpha, matte);
+    Pixels pixels(size_t{width} * height, clear);
+    for (size_t i = 0; i < pixels.size(); ++i)
+      if (i / 64 % 3 == 1) pixels[i] = {alpha, least, least, least};
+    // From here on, or once, another colour or alpha; here is often where a band begins.
+    for (i32 k = level(3); k > 0; --k) {
+      const size_t first = random() % 3 == 0 ? random() % pixels.size() : size_t{width} * band_rows * (1 + level(2));
+      const size_t end = random() % 2 == 0 ? first + 1 : pixels.size();
+      const u8 more = level(6), fainter = level(1);
+      for (size_t i = first; i < end; ++i) {
+        ZR_Pixel8& p = pixels[i];
+        p.red = static_cast<u8>(p.red > 128 ? p.red - more : p.red + more);
+        if (p.alpha > 1) p.alpha = static_cast<u8>(p.alpha - fainter);
+      }
+    }
+    const Guess expected = model(pixels);
+    ++codes[expected.code];
+    ASSERT_EQ(guess(pixels, width), expected) << "round " << round;
+  }
+  EXPECT_GT(*std::min_element(codes, codes + 3), 0) << "all codes come up";
+}
+
 TEST_F(AlphaGuess, RastersMessagesAndBadInput) {
   const GX_Rect bounds = {0, 0, 3, 5};
   RS_World** raster = nullptr;

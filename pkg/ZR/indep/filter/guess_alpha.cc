@@ -2,6 +2,7 @@
 #include <ZR/alpha_guess.h>
 #include <ZR/depth.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 
@@ -32,6 +33,28 @@ class AlphaScan {
     }
   }
 
+  // What a pass over the rows behind these has noted.
+  void append(const AlphaScan& next) {
+    if (next.clear_ > 0) {
+      clear_colours_vary_ =
+          clear_colours_vary_ || next.clear_colours_vary_ || (clear_ > 0 && are_apart(next.first_clear_, last_clear_));
+      if (clear_ == 0) first_clear_ = next.first_clear_;
+      last_clear_ = next.last_clear_;
+    }
+    if (next.covered_ > 0) {
+      covered_colours_vary_ = covered_colours_vary_ || next.covered_colours_vary_ ||
+                              (covered_ > 0 && differ(next.first_covered_, last_covered_));
+      if (covered_ == 0) first_covered_ = next.first_covered_;
+      if (covered_ == 0 || next.faintest_.alpha < faintest_.alpha) faintest_ = next.faintest_;
+      last_covered_ = next.last_covered_;
+    }
+    colour_exceeds_alpha_ = colour_exceeds_alpha_ || next.colour_exceeds_alpha_;
+    clear_ += next.clear_, clear_white_ += next.clear_white_, clear_black_ += next.clear_black_;
+    covered_ += next.covered_;
+    for (i32 c = 0; c < 3; ++c)
+      for (i32 i = 0; i < 256; ++i) counts_[c][i] += next.counts_[c][i];
+  }
+
   // One of the codes; the matte is stored with ZR_AlphaGuess_Premultiplied.
   ZR_AlphaGuess decide(ZR_Pixel8* matte) const {
     if (covered_ == 0) return ZR_AlphaGuess_Unknown;
@@ -53,18 +76,21 @@ class AlphaScan {
   }
 
  private:
+  static bool are_apart(const ZR_Pixel8& a, const ZR_Pixel8& b) {
+    return apart(a.red, b.red) >= 3 || apart(a.green, b.green) >= 3 || apart(a.blue, b.blue) >= 3;
+  }
+  static bool differ(const ZR_Pixel8& a, const ZR_Pixel8& b) {
+    return a.red != b.red || a.green != b.green || a.blue != b.blue;
+  }
   void pixel(const ZR_Pixel8& p) {
     if (p.alpha == 0) {
-      if (!clear_colours_vary_ && clear_ > 0 &&
-          (apart(p.red, last_clear_.red) >= 3 || apart(p.green, last_clear_.green) >= 3 ||
-           apart(p.blue, last_clear_.blue) >= 3))
-        clear_colours_vary_ = true;
+      if (clear_ == 0) first_clear_ = last_clear_ = p;
+      if (!clear_colours_vary_ && are_apart(p, last_clear_)) clear_colours_vary_ = true;
       count_clear(p, 1);
       last_clear_ = p;
     } else {
-      if (!covered_colours_vary_ && covered_ > 0 &&
-          (p.red != last_covered_.red || p.green != last_covered_.green || p.blue != last_covered_.blue))
-        covered_colours_vary_ = true;
+      if (covered_ == 0) first_covered_ = last_covered_ = p;
+      if (!covered_colours_vary_ && differ(p, last_covered_)) covered_colours_vary_ = true;
       if (covered_ == 0 || p.alpha < faintest_.alpha) faintest_ = p;
       if (!colour_exceeds_alpha_ && (p.alpha < p.red || p.alpha < p.green || p.alpha < p.blue))
         colour_exceeds_alpha_ = true;
@@ -105,17 +131,41 @@ class AlphaScan {
 
   i32 counts_[3][256] = {};  // of the colours of transparent pixels
   i32 clear_ = 0, clear_white_ = 0, clear_black_ = 0, covered_ = 0;
-  ZR_Pixel8 last_clear_{}, last_covered_{};
+  ZR_Pixel8 first_clear_{}, last_clear_{}, first_covered_{}, last_covered_{};
   ZR_Pixel8 faintest_{};  // the first of the smallest alpha above 0
   bool clear_colours_vary_ = false, covered_colours_vary_ = false, colour_exceeds_alpha_ = false;
 };
 
-i32 guess(const ZR_WorldX<ZR_Pixel8>& world, i32* code, ZR_Pixel8* matte) {
-  AlphaScan scan;
+// Bands of rows are scanned each for itself.
+struct BandedScan {
+  static constexpr i32 most_bands = 16;
+  static constexpr i64 band_bytes = i64{1} << 19;
+
+  explicit BandedScan(const ZR_WorldX<ZR_Pixel8>& of)
+      : world(of),
+        bands(static_cast<i32>(std::clamp<i64>(i64{of.width} * of.height * i64{sizeof(ZR_Pixel8)} / band_bytes, 1,
+                                               std::clamp(of.height, 1, most_bands)))) {}
+  void scan(i32 band) {
+    const auto row_of = [&](i32 i) { return static_cast<i32>(i64{world.height} * i / bands); };
+    for (i32 y = row_of(band); y < row_of(band + 1); ++y) scans[band].row(world.Row(y), world.width, runs);
+  }
+
+  const ZR_WorldX<ZR_Pixel8>& world;
+  const i32 bands;
   const GuessRuns* const runs = lane_guess_runs();
-  for (i32 y = 0; y < world.height; ++y) scan.row(world.Row(y), world.width, runs);
+  AlphaScan scans[most_bands];
+};
+
+i32 guess(const ZR_WorldX<ZR_Pixel8>& world, i32* code, ZR_Pixel8* matte) {
+  BandedScan all(world);
+  const i32 error = ZR_IterateGeneric(all.bands, &all, [](void* refcon, i32, i32 band, i32) -> i32 {
+    static_cast<BandedScan*>(refcon)->scan(band);
+    return ZR_Err_None;
+  });
+  if (error != 0) return error;
+  for (i32 band = 1; band < all.bands; ++band) all.scans[0].append(all.scans[band]);
   *matte = {};
-  *code = scan.decide(matte);
+  *code = all.scans[0].decide(matte);
   return ZR_Err_None;
 }
 
