@@ -65,11 +65,13 @@ class Inverses {
  public:
   static constexpr i32 together = 4;
 
-  explicit HWY_INLINE Inverses(i32 y)
-      : below_(hn::Add(hn::Iota(Quad(), 1.0), hn::Set(Quad(), static_cast<f64>(y)))), column_(hn::Set(Quad(), 1.0)) {
+  HWY_INLINE Inverses(i32 y, i32 first_column)
+      : below_(hn::Add(hn::Iota(Quad(), 1.0), hn::Set(Quad(), static_cast<f64>(y)))),
+        column_(hn::Set(Quad(), first_column + 1.0)) {
     for (i32 x = 0; x < ahead; x += together) divide(x);
   }
-  // Those of columns x, a multiple of four, to x + 3: four numbers a column, and behind `bases` whole_base times them.
+  // Those of column x of these, a multiple of four, to x + 3: four numbers a column, and behind `bases` whole_base
+  // times them.
   HWY_INLINE const f64* next(i32 x) {
     divide((x + ahead) % size);
     return numbers_ + x % size * 4;
@@ -93,18 +95,19 @@ class Inverses {
   QuadV below_, column_;
 };
 
-// Calls sum(x, inverses, whether x is a multiple of four) for every column of a row.
+// Calls sum(x, inverses, whether x is a multiple of four) for every column of a block's row.
 template <class Sum>
-HWY_INLINE void each_column(i32 width, i32 y, Sum sum) {
+HWY_INLINE void each_column(const SumBlock& block, i32 y, Sum sum) {
   constexpr i32 together = Inverses::together;
-  Inverses inverses(y);
+  const i32 first = block.first_column, columns = block.end_column - first;
+  Inverses inverses(y, first);
   i32 x = 0;
-  for (; width - x >= together; x += together) {
+  for (; columns - x >= together; x += together) {
     const f64* const of = inverses.next(x);
-    for (i32 k = 0; k < together; ++k) sum(x + k, of + 4 * k, k == 0);
+    for (i32 k = 0; k < together; ++k) sum(first + x + k, of + 4 * k, k == 0);
   }
   const f64* of = inverses.next(x);
-  for (; x < width; ++x, of += 4) sum(x, of, false);
+  for (; x < columns; ++x, of += 4) sum(first + x, of, false);
 }
 
 template <class T>
@@ -115,18 +118,19 @@ HWY_INLINE const T* row_at(const ZR_World& world, i32 y) {
 
 // `rows` rows at once: the sums of one wait for those of the row above, which the processor works on meanwhile.
 template <i32 rows, class T, class Entry>
-HWY_INLINE void sum_rows(const ZR_World& world, i32 y, const f64* parts, f64* above, Entry* table) {
+HWY_INLINE void sum_rows(const ZR_World& world, const SumBlock& block, i32 y, const f64* parts, f64* above,
+                         f64* carried, Entry* table) {
   const Quad d;
-  const i32 width = world.width;
   const T* src[rows];
   Entry* out[rows];
   QuadV left[rows], corner[rows];
   for (i32 r = 0; r < rows; ++r) {
     src[r] = row_at<T>(world, y + r);
-    out[r] = table + static_cast<std::ptrdiff_t>(y + r) * width;
-    left[r] = corner[r] = hn::Zero(d);
+    out[r] = table + static_cast<std::ptrdiff_t>(y + r) * world.width;
+    left[r] = hn::LoadU(d, carried + r * carried_numbers);
+    corner[r] = hn::LoadU(d, carried + r * carried_numbers + 4);
   }
-  each_column(width, y, [&](i32 x, const f64* inverses, bool) HWY_ATTR {
+  each_column(block, y, [&](i32 x, const f64* inverses, bool) HWY_ATTR {
     f64* const cell = above + static_cast<std::size_t>(x) * 4;
     QuadV upper = hn::LoadU(d, cell);
     for (i32 r = 0; r < rows; ++r) {
@@ -137,6 +141,10 @@ HWY_INLINE void sum_rows(const ZR_World& world, i32 y, const f64* parts, f64* ab
     }
     hn::StoreU(upper, d, cell);
   });
+  for (i32 r = 0; r < rows; ++r) {
+    hn::StoreU(left[r], d, carried + r * carried_numbers);
+    hn::StoreU(corner[r], d, carried + r * carried_numbers + 4);
+  }
 }
 
 // Asks for what is written a little later: four streams are more than processors follow. Nothing is touched.
@@ -145,21 +153,21 @@ HWY_INLINE void write_ahead(const void* at) {
 }
 
 template <class Entry>
-HWY_INLINE void sum_opaque_rows(const ZR_World& world, i32 y, f64* above, Entry* table) {
+HWY_INLINE void sum_opaque_rows(const ZR_World& world, const SumBlock& block, i32 y, f64* above, f64* carried,
+                                Entry* table) {
   constexpr i32 rows = opaque_rows;
   const Quad d;
   const hn::FixedTag<u64, 4> whole;
   const QuadV base = hn::Set(d, whole_base);
-  const i32 width = world.width;
   const ZR_Pixel8* src[rows];
   Entry* out[rows];
   hn::Vec<decltype(whole)> row[rows];
   for (i32 r = 0; r < rows; ++r) {
     src[r] = row_at<ZR_Pixel8>(world, y + r);
-    out[r] = table + static_cast<std::ptrdiff_t>(y + r) * width;
-    row[r] = hn::Zero(whole);
+    out[r] = table + static_cast<std::ptrdiff_t>(y + r) * world.width;
+    row[r] = hn::BitCast(whole, hn::LoadU(d, carried + r * carried_numbers));
   }
-  each_column(width, y, [&](i32 x, const f64* inverses, bool begins_line) HWY_ATTR {
+  each_column(block, y, [&](i32 x, const f64* inverses, bool begins_line) HWY_ATTR {
     f64* const cell = above + static_cast<std::size_t>(x) * 4;
     auto sum = hn::BitCast(whole, hn::Add(hn::LoadU(d, cell), base));
     for (i32 r = 0; r < rows; ++r) {
@@ -173,6 +181,7 @@ HWY_INLINE void sum_opaque_rows(const ZR_World& world, i32 y, f64* above, Entry*
     }
     hn::StoreU(hn::Sub(hn::BitCast(d, sum), base), d, cell);
   });
+  for (i32 r = 0; r < rows; ++r) hn::StoreU(hn::BitCast(d, row[r]), d, carried + r * carried_numbers);
 }
 
 HWY_INLINE bool is_opaque(const ZR_Pixel8* row, i32 n) {
@@ -190,37 +199,45 @@ HWY_INLINE bool is_opaque(const ZR_Pixel8* row, i32 n) {
 }
 
 template <class T, class Entry>
-void sum_world(const ZR_World& world, f64* above, Entry* table) {
+void sum_block(const ZR_World& world, const SumBlock& block, f64* above, f64* carried, Entry* table) {
   f64 parts[256];
   constexpr i32 rows = opaque_rows;
-  i32 y = 0;
-  if constexpr (sizeof(T) == 4) {
+  if constexpr (sizeof(T) == 4)
     for (i32 a = 0; a < 256; ++a) parts[a] = a / 255.0;
-    const auto all_opaque = [&](i32 first) {
-      for (i32 r = 0; r < rows; ++r)
-        if (!is_opaque(row_at<T>(world, first + r), world.width)) return false;
-      return true;
-    };
-    for (; world.height - y >= rows && all_opaque(y); y += rows) sum_opaque_rows(world, y, above, table);
+  carried += block.first_row * carried_numbers;
+  i32 y = block.first_row;
+  for (; block.end_row - y >= rows; y += rows, carried += rows * carried_numbers) {
+    if constexpr (sizeof(T) == 4) {
+      // Found with the first columns, for all of them. Sums stay whole numbers up to the first row that is not opaque.
+      f64& opaque = carried[carried_numbers - 1];
+      if (block.first_column == 0) {
+        opaque = y == 0 ? 1 : (&opaque)[-rows * carried_numbers];
+        for (i32 r = 0; r < rows && opaque != 0; ++r) opaque = is_opaque(row_at<T>(world, y + r), world.width);
+      }
+      if (opaque != 0) {
+        sum_opaque_rows(world, block, y, above, carried, table);
+        continue;
+      }
+    }
+    sum_rows<rows, T>(world, block, y, parts, above, carried, table);
   }
-  for (; world.height - y >= rows; y += rows) sum_rows<rows, T>(world, y, parts, above, table);
-  for (; y < world.height; ++y) sum_rows<1, T>(world, y, parts, above, table);
-  hwy::FlushStream();
+  for (; y < block.end_row; ++y, carried += carried_numbers)
+    sum_rows<1, T>(world, block, y, parts, above, carried, table);
 }
 #endif
 
 template <class T, class Entry>
-SumWorldFunc<Entry>* world_sums() {
+SumBlockFunc<Entry>* block_sums() {
 #if ZR_SUMS_ON_LANES
-  return &sum_world<T, Entry>;
+  return &sum_block<T, Entry>;
 #else
   return nullptr;
 #endif
 }
 
 #define ZR_INSTANTIATE(T)                                               \
-  template SumWorldFunc<ZR_PixelFloat>* world_sums<T, ZR_PixelFloat>(); \
-  template SumWorldFunc<ZR_PixelDouble>* world_sums<T, ZR_PixelDouble>();
+  template SumBlockFunc<ZR_PixelFloat>* block_sums<T, ZR_PixelFloat>(); \
+  template SumBlockFunc<ZR_PixelDouble>* block_sums<T, ZR_PixelDouble>();
 ZR_INSTANTIATE(ZR_Pixel8)
 ZR_INSTANTIATE(ZR_Pixel16)
 ZR_INSTANTIATE(ZR_PixelFloat)
@@ -238,14 +255,14 @@ HWY_AFTER_NAMESPACE();
 namespace zr {
 
 template <class T, class Entry>
-SumWorldFunc<Entry>* lane_world_sums() {
-  ZR_RETURN_BEST(world_sums<T, Entry>());
+SumBlockFunc<Entry>* lane_block_sums() {
+  ZR_RETURN_BEST(block_sums<T, Entry>());
   return nullptr;
 }
 
 #define ZR_INSTANTIATE(T)                                                    \
-  template SumWorldFunc<ZR_PixelFloat>* lane_world_sums<T, ZR_PixelFloat>(); \
-  template SumWorldFunc<ZR_PixelDouble>* lane_world_sums<T, ZR_PixelDouble>();
+  template SumBlockFunc<ZR_PixelFloat>* lane_block_sums<T, ZR_PixelFloat>(); \
+  template SumBlockFunc<ZR_PixelDouble>* lane_block_sums<T, ZR_PixelDouble>();
 ZR_INSTANTIATE(ZR_Pixel8)
 ZR_INSTANTIATE(ZR_Pixel16)
 ZR_INSTANTIATE(ZR_PixelFloat)

@@ -42,13 +42,54 @@ inline void store(const Lanes<f64>& c, ZR_PixelFloat& out) {
          static_cast<f32>(c.high[1])};
 }
 
+// Blocks of a table, each of which waits for those above and to the left of it: those that wait for the same ones make
+// a wave, whose blocks are filled in any order.
+template <class Entry>
+struct BlockWaves {
+  static constexpr i32 block_rows = 64, block_columns = 256;
+
+  const ZR_World& world;
+  SumBlockFunc<Entry>* const fill;
+  f64 *const above, *const carried;
+  Entry* const table;
+  const i32 across = (world.width - 1) / block_columns + 1, down = (world.height - 1) / block_rows + 1;
+  i32 wave = 0;
+
+  // The rows of blocks that the wave meets begin here.
+  i32 first_down() const { return std::max(wave - across + 1, 0); }
+  i32 run() {
+    i32 threads = 1;
+    HB_GetNumThreads(&threads, 1);
+    if (threads < 2 || across < 2 || down < 2) {
+      fill(world, {0, world.height, 0, world.width}, above, carried, table);
+      return ZR_Err_None;
+    }
+    i32 error = ZR_Err_None;
+    for (; wave < across + down - 1 && error == ZR_Err_None; ++wave)
+      error = ZR_IterateGeneric(std::min(wave, down - 1) - first_down() + 1, this, [](void* self, i32, i32 i, i32) {
+        static_cast<BlockWaves*>(self)->fill_block(i);
+        return i32{ZR_Err_None};
+      });
+    return error;
+  }
+  void fill_block(i32 i) const {
+    const i32 y = (first_down() + i) * block_rows, x = (wave - first_down() - i) * block_columns;
+    fill(world, {y, std::min(y + block_rows, world.height), x, std::min(x + block_columns, world.width)}, above,
+         carried, table);
+  }
+};
+
 // Plain sums run in two rows with a guard cell on the left; the table gets each over its count of cells.
 template <class T, class Entry>
 void build(const ZR_World& world, Entry* table) {
   const size_t cells = static_cast<size_t>(world.width) + 1;
-  if (SumWorldFunc<Entry>* const lanes = lane_world_sums<T, Entry>(); lanes != nullptr) {
-    SumRow above(cells, Lanes<f64>::all(0.0));
-    return lanes(world, reinterpret_cast<f64*>(above.data()), table);
+  if (SumBlockFunc<Entry>* const lanes = lane_block_sums<T, Entry>(); lanes != nullptr) {
+    const size_t rows = static_cast<size_t>(world.height);
+    SumRow sums(cells + (rows * carried_numbers + 3) / 4, Lanes<f64>::all(0.0));
+    f64* const above = reinterpret_cast<f64*>(sums.data());
+    if (const i32 error = BlockWaves<Entry>{world, lanes, above, above + 4 * cells, table}.run(); error != 0)
+      fail(error);
+    return;
   }
   SumRow previous(cells, Lanes<f64>::all(0.0)), current(cells, Lanes<f64>::all(0.0));
   for (i32 y = 0; y < world.height; ++y) {
@@ -136,6 +177,9 @@ ZR_SummedAreaTable::ZR_SummedAreaTable(const ZR_World* world, bool use_double)
   } catch (const std::bad_alloc&) {  // of the rows; reported
     free_tables();
     zr::fail(ZR_Err_OutOfMemory);
+  } catch (...) {
+    free_tables();
+    throw;
   }
 }
 

@@ -1,0 +1,74 @@
+// Summed-area tables that threads fill in waves of blocks, beside those that single numbers fill row by row.
+#include <ZR/hostkit.h>
+#include <ZR/slots.h>
+#include <ZR/summed_area.h>
+
+#include <random>
+#include <vector>
+
+#include "support/born_library.h"
+#include "support/edge_rows.h"
+#include "support/worlds.h"
+
+namespace {
+
+class WavesOfBlocks : public testing::TestWithParam<int> {
+ protected:
+  zr::Hostkit host{{.threads = GetParam()}};
+};
+INSTANTIATE_TEST_SUITE_P(Threads, WavesOfBlocks, testing::Values(1, 2, 3, 7));
+
+std::vector<f64> numbers_of(const ZR_SummedAreaTable& table, i32 entries) {
+  std::vector<f64> numbers;
+  const auto take = [&](const auto* entry) {
+    for (i32 i = 0; i < entries; ++i)
+      numbers.insert(numbers.end(), {entry[i].alpha, entry[i].red, entry[i].green, entry[i].blue});
+  };
+  table.UsesDouble() ? take(table.DoubleTable()) : take(table.FloatTable());
+  return numbers;
+}
+
+template <class T>
+void expect_same(std::mt19937& random) {
+  const i32 width = 1 + static_cast<i32>(random() % 900), height = 1 + static_cast<i32>(random() % 300);
+  TestWorld<T> world(width, height);
+  world.randomise(static_cast<u32>(random()));
+  for (i32 y = 0; y < height; ++y)  // some groups of rows opaque
+    for (i32 x = 0; x < width && y / 8 % 3 != 0; ++x)
+      world.at(x, y).alpha = static_cast<zr::Channel<T>>(zr::Depth<T>::white);
+  const ZR_WorldX<T> source(world.layer(), true);
+  const bool use_double = random() % 2 == 0;
+  std::vector<f64> expected;
+  for (int level = 0; level < 4 && Instructions::has(level); ++level) {
+    const Instructions instructions(level);
+    const std::vector<f64> got = numbers_of(ZR_SummedAreaTable(&source, use_double), width * height);
+    if (level == 0) expected = got;
+    ASSERT_EQ(std::memcmp(got.data(), expected.data(), got.size() * sizeof(f64)), 0)
+        << Instructions::names[level] << ", " << width << "x" << height << ", " << zr::Depth<T>::bits << " bits";
+  }
+}
+
+TEST_P(WavesOfBlocks, FillTheTableOfOneThread) {
+  std::mt19937 random(41);
+  for (int round = 0; round < 6; ++round) {
+    expect_same<ZR_Pixel8>(random);
+    expect_same<ZR_Pixel16>(random);
+    expect_same<ZR_PixelFloat>(random);
+  }
+  const SlotOverride order(ZR_Slot_iterate_generic, reinterpret_cast<void*>(&iterate_backwards));
+  expect_same<ZR_Pixel8>(random);
+}
+
+// A body that fails leaves no table and no frame behind.
+TEST_P(WavesOfBlocks, FailLikeTheIterator) {
+  const SlotOverride fails(ZR_Slot_iterate_generic,
+                           reinterpret_cast<void*>(+[](i32, void*, ZR_GenericFunc) -> i32 { return 4711; }));
+  TestWorld<ZR_Pixel16> world(700, 200);
+  const ZR_WorldX<ZR_Pixel16> source(world.layer(), true);
+  if (GetParam() > 1)
+    EXPECT_THROW(ZR_SummedAreaTable(&source, false), i32);
+  else
+    EXPECT_NO_THROW(ZR_SummedAreaTable(&source, false));
+}
+
+}  // namespace
