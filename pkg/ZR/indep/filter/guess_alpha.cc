@@ -84,13 +84,13 @@ class AlphaScan {
   }
   void pixel(const ZR_Pixel8& p) {
     if (p.alpha == 0) {
-      if (clear_ == 0) first_clear_ = last_clear_ = p;
-      if (!clear_colours_vary_ && are_apart(p, last_clear_)) clear_colours_vary_ = true;
+      if (!clear_colours_vary_ && clear_ > 0 && are_apart(p, last_clear_)) clear_colours_vary_ = true;
+      if (clear_ == 0) first_clear_ = p;
       count_clear(p, 1);
       last_clear_ = p;
     } else {
-      if (covered_ == 0) first_covered_ = last_covered_ = p;
-      if (!covered_colours_vary_ && differ(p, last_covered_)) covered_colours_vary_ = true;
+      if (!covered_colours_vary_ && covered_ > 0 && differ(p, last_covered_)) covered_colours_vary_ = true;
+      if (covered_ == 0) first_covered_ = p;
       if (covered_ == 0 || p.alpha < faintest_.alpha) faintest_ = p;
       if (!colour_exceeds_alpha_ && (p.alpha < p.red || p.alpha < p.green || p.alpha < p.blue))
         colour_exceeds_alpha_ = true;
@@ -147,7 +147,9 @@ struct BandedScan {
                                                std::clamp(of.height, 1, most_bands)))) {}
   void scan(i32 band) {
     const auto row_of = [&](i32 i) { return static_cast<i32>(i64{world.height} * i / bands); };
-    for (i32 y = row_of(band); y < row_of(band + 1); ++y) scans[band].row(world.Row(y), world.width, runs);
+    AlphaScan scan;  // of this thread alone
+    for (i32 y = row_of(band); y < row_of(band + 1); ++y) scan.row(world.Row(y), world.width, runs);
+    scans[band] = scan;
   }
 
   const ZR_WorldX<ZR_Pixel8>& world;

@@ -204,24 +204,26 @@ void sum_block(const ZR_World& world, const SumBlock& block, f64* above, f64* ca
   constexpr i32 rows = opaque_rows;
   if constexpr (sizeof(T) == 4)
     for (i32 a = 0; a < 256; ++a) parts[a] = a / 255.0;
+  if (sizeof(T) != 4 && block.end_column == 0) return;
   carried += block.first_row * carried_numbers;
   i32 y = block.first_row;
   for (; block.end_row - y >= rows; y += rows, carried += rows * carried_numbers) {
     if constexpr (sizeof(T) == 4) {
-      // Found with the first columns, for all of them. Sums stay whole numbers up to the first row that is not opaque.
-      f64& opaque = carried[carried_numbers - 1];
-      if (block.first_column == 0) {
-        opaque = y == 0 ? 1 : (&opaque)[-rows * carried_numbers];
-        for (i32 r = 0; r < rows && opaque != 0; ++r) opaque = is_opaque(row_at<T>(world, y + r), world.width);
-      }
-      if (opaque != 0) {
+      f64& opaque = carried[carried_numbers - 1];  // 1, -1 or not known
+      for (i32 r = 0; r < rows && opaque == 0; ++r)
+        if (!is_opaque(row_at<T>(world, y + r), world.width)) opaque = -1;
+      if (opaque == 0) opaque = 1;
+      if (block.end_column == 0) continue;
+      // Sums stay whole numbers up to the first row that is not opaque.
+      if (y > 0 && (&opaque)[-rows * carried_numbers] < 0) opaque = -1;
+      if (opaque > 0) {
         sum_opaque_rows(world, block, y, above, carried, table);
         continue;
       }
     }
     sum_rows<rows, T>(world, block, y, parts, above, carried, table);
   }
-  for (; y < block.end_row; ++y, carried += carried_numbers)
+  for (; block.end_column > 0 && y < block.end_row; ++y, carried += carried_numbers)
     sum_rows<1, T>(world, block, y, parts, above, carried, table);
 }
 #endif

@@ -64,7 +64,10 @@ struct BlockWaves {
       fill(world, {0, world.height, 0, world.width}, above, carried, table);
       return ZR_Err_None;
     }
-    i32 error = ZR_Err_None;
+    i32 error = ZR_IterateGeneric(down, this, [](void* self, i32, i32 i, i32) {
+      static_cast<BlockWaves*>(self)->look_at(i);
+      return i32{ZR_Err_None};
+    });
     for (; wave < across + down - 1 && error == ZR_Err_None; ++wave)
       error = ZR_IterateGeneric(std::min(wave, down - 1) - first_down() + 1, this, [](void* self, i32, i32 i, i32) {
         static_cast<BlockWaves*>(self)->fill_block(i);
@@ -72,10 +75,11 @@ struct BlockWaves {
       });
     return error;
   }
+  i32 end_row(i32 y) const { return std::min(y + block_rows, world.height); }
+  void look_at(i32 i) const { fill(world, {i * block_rows, end_row(i * block_rows), 0, 0}, above, carried, table); }
   void fill_block(i32 i) const {
     const i32 y = (first_down() + i) * block_rows, x = (wave - first_down() - i) * block_columns;
-    fill(world, {y, std::min(y + block_rows, world.height), x, std::min(x + block_columns, world.width)}, above,
-         carried, table);
+    fill(world, {y, end_row(y), x, std::min(x + block_columns, world.width)}, above, carried, table);
   }
 };
 
