@@ -214,8 +214,9 @@ void sum_block(const ZR_World& world, const SumBlock& block, f64* above, f64* ca
         if (!is_opaque(row_at<T>(world, y + r), world.width)) opaque = -1;
       if (opaque == 0) opaque = 1;
       if (block.end_column == 0) continue;
-      // Sums stay whole numbers up to the first row that is not opaque.
-      if (y > 0 && (&opaque)[-rows * carried_numbers] < 0) opaque = -1;
+      // Sums stay whole numbers up to the first row that is not opaque. The first block of a row finds that: others,
+      // and those below, read it at once.
+      if (opaque > 0 && y > 0 && (&opaque)[-rows * carried_numbers] < 0) opaque = -1;
       if (opaque > 0) {
         sum_opaque_rows(world, block, y, above, carried, table);
         continue;
