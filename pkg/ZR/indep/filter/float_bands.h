@@ -2,7 +2,8 @@
 //
 // A band is walked in strips of columns, from source row to source row. The products of a row are rounded to single
 // precision, as everywhere, and kept as doubles for the sums of all destination rows that the source row meets. Each
-// sum takes its taps in the order of the kernel, as single numbers do, for it meets source rows in that order.
+// sum takes its taps in the order of the kernel, as single numbers do, for it meets source rows in that order. Strips
+// whose sums need no rounding are made in single precision instead (Exact).
 #pragma once
 
 #include "filter/convolve_rows.h"
