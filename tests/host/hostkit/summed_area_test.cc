@@ -1,4 +1,4 @@
-// Summed-area tables that threads fill in waves of blocks, beside those that single numbers fill row by row.
+// Summed-area tables that threads fill in bands of blocks, beside those that single numbers fill row by row.
 #include <ZR/hostkit.h>
 #include <ZR/slots.h>
 #include <ZR/summed_area.h>
@@ -12,11 +12,11 @@
 
 namespace {
 
-class WavesOfBlocks : public testing::TestWithParam<int> {
+class BandsOfBlocks : public testing::TestWithParam<int> {
  protected:
   zr::Hostkit host{{.threads = GetParam()}};
 };
-INSTANTIATE_TEST_SUITE_P(Threads, WavesOfBlocks, testing::Values(1, 2, 3, 7));
+INSTANTIATE_TEST_SUITE_P(Threads, BandsOfBlocks, testing::Values(1, 2, 3, 7));
 
 std::vector<f64> numbers_of(const ZR_SummedAreaTable& table, i32 entries) {
   std::vector<f64> numbers;
@@ -48,7 +48,7 @@ void expect_same(std::mt19937& random) {
   }
 }
 
-TEST_P(WavesOfBlocks, FillTheTableOfOneThread) {
+TEST_P(BandsOfBlocks, FillTheTableOfOneThread) {
   std::mt19937 random(41);
   for (int round = 0; round < 6; ++round) {
     expect_same<ZR_Pixel8>(random);
@@ -60,7 +60,7 @@ TEST_P(WavesOfBlocks, FillTheTableOfOneThread) {
 }
 
 // A body that fails leaves no table and no frame behind.
-TEST_P(WavesOfBlocks, FailLikeTheIterator) {
+TEST_P(BandsOfBlocks, FailLikeTheIterator) {
   const SlotOverride fails(ZR_Slot_iterate_generic,
                            reinterpret_cast<void*>(+[](i32, void*, ZR_GenericFunc) -> i32 { return 4711; }));
   TestWorld<ZR_Pixel16> world(700, 200);

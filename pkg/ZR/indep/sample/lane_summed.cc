@@ -31,18 +31,20 @@ constexpr i32 opaque_rows = 4;
 HWY_INLINE QuadV weighted(QuadV channels, QuadV factor) {
   return hn::Mul(channels, hn::IfThenElse(hn::FirstN(Quad(), 1), hn::Set(Quad(), 1.0), factor));
 }
-HWY_INLINE QuadV premultiplied(const ZR_Pixel8* p, const f64* parts) {
+// Of each alpha 1 and three times alpha / 255.
+using Parts = f64[256][4];
+HWY_INLINE QuadV premultiplied(const ZR_Pixel8* p, const Parts& parts) {
   const hn::FixedTag<u8, 4> d;
   const auto whole = hn::PromoteTo(hn::FixedTag<i32, 4>(), hn::LoadU(d, reinterpret_cast<const u8*>(p)));
-  return weighted(hn::PromoteTo(Quad(), whole), hn::Set(Quad(), parts[p->alpha]));
+  return hn::Mul(hn::PromoteTo(Quad(), whole), hn::Load(Quad(), parts[p->alpha]));
 }
-HWY_INLINE QuadV premultiplied(const ZR_Pixel16* p, const f64*) {
+HWY_INLINE QuadV premultiplied(const ZR_Pixel16* p, const Parts&) {
   const hn::FixedTag<u16, 4> d;
   const auto whole = hn::PromoteTo(hn::FixedTag<i32, 4>(), hn::LoadU(d, reinterpret_cast<const u16*>(p)));
   const QuadV channels = hn::PromoteTo(Quad(), whole);
   return weighted(channels, hn::Set(Quad(), hn::GetLane(channels) * 0x1p-15));
 }
-HWY_INLINE QuadV premultiplied(const ZR_PixelFloat* p, const f64*) {
+HWY_INLINE QuadV premultiplied(const ZR_PixelFloat* p, const Parts&) {
   const hn::FixedTag<f32, 4> d;
   const QuadV channels = hn::PromoteTo(Quad(), hn::LoadU(d, reinterpret_cast<const f32*>(p)));
   const QuadV alpha = hn::Set(Quad(), hn::GetLane(channels));
@@ -118,7 +120,7 @@ HWY_INLINE const T* row_at(const ZR_World& world, i32 y) {
 
 // `rows` rows at once: the sums of one wait for those of the row above, which the processor works on meanwhile.
 template <i32 rows, class T, class Entry>
-HWY_INLINE void sum_rows(const ZR_World& world, const SumBlock& block, i32 y, const f64* parts, f64* above,
+HWY_INLINE void sum_rows(const ZR_World& world, const SumBlock& block, i32 y, const Parts& parts, f64* above,
                          f64* carried, Entry* table) {
   const Quad d;
   const T* src[rows];
@@ -200,23 +202,22 @@ HWY_INLINE bool is_opaque(const ZR_Pixel8* row, i32 n) {
 
 template <class T, class Entry>
 void sum_block(const ZR_World& world, const SumBlock& block, f64* above, f64* carried, Entry* table) {
-  f64 parts[256];
+  alignas(32) Parts parts;
   constexpr i32 rows = opaque_rows;
   if constexpr (sizeof(T) == 4)
-    for (i32 a = 0; a < 256; ++a) parts[a] = a / 255.0;
-  if (sizeof(T) != 4 && block.end_column == 0) return;
+    for (i32 a = 0; a < 256; ++a)
+      hn::Store(weighted(hn::Set(Quad(), 1.0), hn::Set(Quad(), a / 255.0)), Quad(), parts[a]);
   carried += block.first_row * carried_numbers;
   i32 y = block.first_row;
   for (; block.end_row - y >= rows; y += rows, carried += rows * carried_numbers) {
     if constexpr (sizeof(T) == 4) {
       f64& opaque = carried[carried_numbers - 1];  // 1, -1 or not known
-      for (i32 r = 0; r < rows && opaque == 0; ++r)
-        if (!is_opaque(row_at<T>(world, y + r), world.width)) opaque = -1;
-      if (opaque == 0) opaque = 1;
-      if (block.end_column == 0) continue;
-      // Sums stay whole numbers up to the first row that is not opaque. The first block of a row finds that: others,
-      // and those below, read it at once.
-      if (opaque > 0 && y > 0 && (&opaque)[-rows * carried_numbers] < 0) opaque = -1;
+      if (opaque == 0) {
+        // Sums stay whole numbers up to the first row that is not opaque. The first block of a row finds that.
+        opaque = y > 0 && (&opaque)[-rows * carried_numbers] < 0 ? -1 : 1;
+        for (i32 r = 0; r < rows && opaque > 0; ++r)
+          if (!is_opaque(row_at<T>(world, y + r), world.width)) opaque = -1;
+      }
       if (opaque > 0) {
         sum_opaque_rows(world, block, y, above, carried, table);
         continue;
@@ -224,7 +225,7 @@ void sum_block(const ZR_World& world, const SumBlock& block, f64* above, f64* ca
     }
     sum_rows<rows, T>(world, block, y, parts, above, carried, table);
   }
-  for (; block.end_column > 0 && y < block.end_row; ++y, carried += carried_numbers)
+  for (; y < block.end_row; ++y, carried += carried_numbers)
     sum_rows<1, T>(world, block, y, parts, above, carried, table);
 }
 #endif

@@ -13,7 +13,6 @@ struct SumBlock {
 inline constexpr i64 carried_numbers = 9;
 
 // Fills a block of a table of the world's size, aligned to 64 bytes, when those above and to the left of it are filled.
-// Of a block without columns, rows are only looked at: any block may have been before.
 // `above` are four zeros for each column, `carried` carried_numbers for each row, and are written.
 template <class Entry>
 using SumBlockFunc = void(const ZR_World& world, const SumBlock& block, f64* above, f64* carried, Entry* table);

@@ -5,9 +5,11 @@
 #include <RS/rs.h>
 
 #include <algorithm>
+#include <atomic>
 #include <cmath>
 #include <cstdio>
 #include <new>
+#include <thread>
 #include <vector>
 
 #include "sample/lane_summed.h"
@@ -42,45 +44,77 @@ inline void store(const Lanes<f64>& c, ZR_PixelFloat& out) {
          static_cast<f32>(c.high[1])};
 }
 
-// Blocks of a table, each of which waits for those above and to the left of it: those that wait for the same ones make
-// a wave, whose blocks are filled in any order.
+// Blocks of a table, filled by any number of threads. Each waits for those above and to the left of it: a thread takes
+// a band of blocks and goes on in it as far as the band above has come. It only ever waits for blocks that are being
+// filled, so that one thread alone, in any order of calls, fills them all.
 template <class Entry>
-struct BlockWaves {
-  static constexpr i32 block_rows = 64, block_columns = 256;
+class SumBands {
+ public:
+  SumBands(const ZR_World& world, SumBlockFunc<Entry>* fill, f64* above, f64* carried, Entry* table)
+      : world_(world), fill_(fill), above_(above), carried_(carried), table_(table) {
+    HB_GetNumThreads(&threads_, 1);
+    const i32 rows = (world.height - 1) / (std::max(threads_, 1) * bands_a_thread) + 1;
+    rows_ = std::max(least_rows, (rows + 3) / 4 * 4);
+    down_ = (world.height - 1) / rows_ + 1;
+    bands_ = Bands(static_cast<size_t>(down_));
+  }
 
-  const ZR_World& world;
-  SumBlockFunc<Entry>* const fill;
-  f64 *const above, *const carried;
-  Entry* const table;
-  const i32 across = (world.width - 1) / block_columns + 1, down = (world.height - 1) / block_rows + 1;
-  i32 wave = 0;
-
-  // The rows of blocks that the wave meets begin here.
-  i32 first_down() const { return std::max(wave - across + 1, 0); }
   i32 run() {
-    i32 threads = 1;
-    HB_GetNumThreads(&threads, 1);
-    if (threads < 2 || across < 2 || down < 2) {
-      fill(world, {0, world.height, 0, world.width}, above, carried, table);
-      return ZR_Err_None;
-    }
-    i32 error = ZR_IterateGeneric(down, this, [](void* self, i32, i32 i, i32) {
-      static_cast<BlockWaves*>(self)->look_at(i);
-      return i32{ZR_Err_None};
-    });
-    for (; wave < across + down - 1 && error == ZR_Err_None; ++wave)
-      error = ZR_IterateGeneric(std::min(wave, down - 1) - first_down() + 1, this, [](void* self, i32, i32 i, i32) {
-        static_cast<BlockWaves*>(self)->fill_block(i);
+    const i32 together = std::min({threads_, across_, down_});
+    if (together > 1)
+      return ZR_IterateGeneric(together, this, [](void* self, i32, i32, i32) {
+        static_cast<SumBands*>(self)->work();
         return i32{ZR_Err_None};
       });
-    return error;
+    fill_(world_, {0, world_.height, 0, world_.width}, above_, carried_, table_);
+    return ZR_Err_None;
   }
-  i32 end_row(i32 y) const { return std::min(y + block_rows, world.height); }
-  void look_at(i32 i) const { fill(world, {i * block_rows, end_row(i * block_rows), 0, 0}, above, carried, table); }
-  void fill_block(i32 i) const {
-    const i32 y = (first_down() + i) * block_rows, x = (wave - first_down() - i) * block_columns;
-    fill(world, {y, end_row(y), x, std::min(x + block_columns, world.width)}, above, carried, table);
+
+ private:
+  // Few bands, as each is handed from one thread's cache to another's at its lower edge, but many enough for a thread
+  // that gets less of its processor to do fewer of them.
+  static constexpr i32 bands_a_thread = 4, least_rows = 32, block_columns = 256;
+  struct Band {
+    std::atomic<i32> filled{0};  // blocks, from the left
+    std::atomic<bool> taken{false};
+  };
+  using Bands = std::vector<Band, HB_Allocator<Band, RowLabel>>;
+
+  i32 filled(i32 band) const { return bands_[static_cast<size_t>(band)].filled.load(std::memory_order_acquire); }
+  bool is_ready(i32 band) const { return filled(band) < (band == 0 ? across_ : filled(band - 1)); }
+
+  void work() {
+    for (i32 first = 0; first < down_;) {
+      if (filled(first) == across_)
+        ++first;
+      else if (!fill_some(first))
+        std::this_thread::yield();
+    }
   }
+  // Blocks of the first band from there on that can go on.
+  bool fill_some(i32 band) {
+    while (band < down_ && !(is_ready(band) && !bands_[static_cast<size_t>(band)].taken.exchange(true)))
+      if (filled(band++) == 0) return false;  // nor can those below
+    if (band == down_) return false;
+    while (is_ready(band)) fill_next(band);
+    bands_[static_cast<size_t>(band)].taken.store(false);
+    return true;
+  }
+  void fill_next(i32 band) {
+    const i32 y = band * rows_, x = filled(band) * block_columns;
+    fill_(world_, {y, std::min(y + rows_, world_.height), x, std::min(x + block_columns, world_.width)}, above_,
+          carried_, table_);
+    bands_[static_cast<size_t>(band)].filled.fetch_add(1, std::memory_order_release);
+  }
+
+  const ZR_World& world_;
+  SumBlockFunc<Entry>* const fill_;
+  f64 *const above_, *const carried_;
+  Entry* const table_;
+  i32 threads_ = 1, rows_ = 0;
+  const i32 across_ = (world_.width - 1) / block_columns + 1;
+  i32 down_ = 0;
+  Bands bands_;
 };
 
 // Plain sums run in two rows with a guard cell on the left; the table gets each over its count of cells.
@@ -91,8 +125,7 @@ void build(const ZR_World& world, Entry* table) {
     const size_t rows = static_cast<size_t>(world.height);
     SumRow sums(cells + (rows * carried_numbers + 3) / 4, Lanes<f64>::all(0.0));
     f64* const above = reinterpret_cast<f64*>(sums.data());
-    if (const i32 error = BlockWaves<Entry>{world, lanes, above, above + 4 * cells, table}.run(); error != 0)
-      fail(error);
+    if (const i32 error = SumBands<Entry>(world, lanes, above, above + 4 * cells, table).run(); error != 0) fail(error);
     return;
   }
   SumRow previous(cells, Lanes<f64>::all(0.0)), current(cells, Lanes<f64>::all(0.0));
