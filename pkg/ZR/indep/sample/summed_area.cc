@@ -1,19 +1,16 @@
 // Summed-area tables: how they are built, and box means from them.
 #include <ZR/summed_area.h>
 
-#include <HB/allocator.h>
 #include <RS/rs.h>
 
 #include <algorithm>
-#include <atomic>
 #include <cmath>
 #include <cstdio>
 #include <new>
-#include <thread>
 #include <vector>
 
-#include "sample/lane_summed.h"
 #include "sample/lanes.h"
+#include "sample/sum_bands.h"
 #include "world/guard.h"
 
 namespace zr {
@@ -21,10 +18,7 @@ namespace {
 
 // ------------------------------------------------------------------------------------- building
 
-struct RowLabel {
-  static constexpr char text[] = "rows of a summed-area table";
-};
-using SumRow = std::vector<Lanes<f64>, HB_Allocator<Lanes<f64>, RowLabel>>;
+using SumRow = std::vector<Lanes<f64>, HB_Allocator<Lanes<f64>, SumRowLabel>>;
 
 template <class T>
 Lanes<f64> premultiplied(const T& p) {
@@ -43,79 +37,6 @@ inline void store(const Lanes<f64>& c, ZR_PixelFloat& out) {
   out = {static_cast<f32>(c.low[0]), static_cast<f32>(c.low[1]), static_cast<f32>(c.high[0]),
          static_cast<f32>(c.high[1])};
 }
-
-// Blocks of a table, filled by any number of threads. Each waits for those above and to the left of it: a thread takes
-// a band of blocks and goes on in it as far as the band above has come. It only ever waits for blocks that are being
-// filled, so that one thread alone, in any order of calls, fills them all.
-template <class Entry>
-class SumBands {
- public:
-  SumBands(const ZR_World& world, SumBlockFunc<Entry>* fill, f64* above, f64* carried, Entry* table)
-      : world_(world), fill_(fill), above_(above), carried_(carried), table_(table) {
-    HB_GetNumThreads(&threads_, 1);
-    const i32 rows = (world.height - 1) / (std::max(threads_, 1) * bands_a_thread) + 1;
-    rows_ = std::max(least_rows, (rows + 3) / 4 * 4);
-    down_ = (world.height - 1) / rows_ + 1;
-    bands_ = Bands(static_cast<size_t>(down_));
-  }
-
-  i32 run() {
-    const i32 together = std::min({threads_, across_, down_});
-    if (together > 1)
-      return ZR_IterateGeneric(together, this, [](void* self, i32, i32, i32) {
-        static_cast<SumBands*>(self)->work();
-        return i32{ZR_Err_None};
-      });
-    fill_(world_, {0, world_.height, 0, world_.width}, above_, carried_, table_);
-    return ZR_Err_None;
-  }
-
- private:
-  // Few bands, as each is handed from one thread's cache to another's at its lower edge, but many enough for a thread
-  // that gets less of its processor to do fewer of them.
-  static constexpr i32 bands_a_thread = 4, least_rows = 32, block_columns = 256;
-  struct Band {
-    std::atomic<i32> filled{0};  // blocks, from the left
-    std::atomic<bool> taken{false};
-  };
-  using Bands = std::vector<Band, HB_Allocator<Band, RowLabel>>;
-
-  i32 filled(i32 band) const { return bands_[static_cast<size_t>(band)].filled.load(std::memory_order_acquire); }
-  bool is_ready(i32 band) const { return filled(band) < (band == 0 ? across_ : filled(band - 1)); }
-
-  void work() {
-    for (i32 first = 0; first < down_;) {
-      if (filled(first) == across_)
-        ++first;
-      else if (!fill_some(first))
-        std::this_thread::yield();
-    }
-  }
-  // Blocks of the first band from there on that can go on.
-  bool fill_some(i32 band) {
-    while (band < down_ && !(is_ready(band) && !bands_[static_cast<size_t>(band)].taken.exchange(true)))
-      if (filled(band++) == 0) return false;  // nor can those below
-    if (band == down_) return false;
-    while (is_ready(band)) fill_next(band);
-    bands_[static_cast<size_t>(band)].taken.store(false);
-    return true;
-  }
-  void fill_next(i32 band) {
-    const i32 y = band * rows_, x = filled(band) * block_columns;
-    fill_(world_, {y, std::min(y + rows_, world_.height), x, std::min(x + block_columns, world_.width)}, above_,
-          carried_, table_);
-    bands_[static_cast<size_t>(band)].filled.fetch_add(1, std::memory_order_release);
-  }
-
-  const ZR_World& world_;
-  SumBlockFunc<Entry>* const fill_;
-  f64 *const above_, *const carried_;
-  Entry* const table_;
-  i32 threads_ = 1, rows_ = 0;
-  const i32 across_ = (world_.width - 1) / block_columns + 1;
-  i32 down_ = 0;
-  Bands bands_;
-};
 
 // Plain sums run in two rows with a guard cell on the left; the table gets each over its count of cells.
 template <class T, class Entry>

@@ -1,0 +1,93 @@
+// How threads share the building of a summed-area table.
+#pragma once
+
+#include <HB/allocator.h>
+#include <ZR/zr.h>
+
+#include <algorithm>
+#include <atomic>
+#include <thread>
+#include <vector>
+
+#include "sample/lane_summed.h"
+
+namespace zr {
+
+struct SumRowLabel {
+  static constexpr char text[] = "rows of a summed-area table";
+};
+
+// Blocks of a table, filled by any number of threads. Each waits for those above and to the left of it: a thread takes
+// a band of blocks and goes on in it as far as the band above has come. It only ever waits for blocks that are being
+// filled, so that one thread alone, in any order of calls, fills them all.
+template <class Entry>
+class SumBands {
+ public:
+  SumBands(const ZR_World& world, SumBlockFunc<Entry>* fill, f64* above, f64* carried, Entry* table)
+      : world_(world), fill_(fill), above_(above), carried_(carried), table_(table) {
+    HB_GetNumThreads(&threads_, 1);
+    const i32 rows = (world.height - 1) / (std::max(threads_, 1) * bands_a_thread) + 1;
+    rows_ = std::max(least_rows, (rows + 3) / 4 * 4);
+    down_ = (world.height - 1) / rows_ + 1;
+    bands_ = Bands(static_cast<size_t>(down_));
+  }
+
+  i32 run() {
+    const i32 together = std::min({threads_, across_, down_});
+    if (together > 1)
+      return ZR_IterateGeneric(together, this, [](void* self, i32, i32, i32) {
+        static_cast<SumBands*>(self)->work();
+        return i32{ZR_Err_None};
+      });
+    fill_(world_, {0, world_.height, 0, world_.width}, above_, carried_, table_);
+    return ZR_Err_None;
+  }
+
+ private:
+  // Few bands, as each is handed from one thread's cache to another's at its lower edge, but many enough for a thread
+  // that gets less of its processor to do fewer of them.
+  static constexpr i32 bands_a_thread = 4, least_rows = 32, block_columns = 256;
+  struct Band {
+    std::atomic<i32> filled{0};  // blocks, from the left
+    std::atomic<bool> taken{false};
+  };
+  using Bands = std::vector<Band, HB_Allocator<Band, SumRowLabel>>;
+
+  i32 filled(i32 band) const { return bands_[static_cast<size_t>(band)].filled.load(std::memory_order_acquire); }
+  bool is_ready(i32 band) const { return filled(band) < (band == 0 ? across_ : filled(band - 1)); }
+
+  void work() {
+    for (i32 first = 0; first < down_;) {
+      if (filled(first) == across_)
+        ++first;
+      else if (!fill_some(first))
+        std::this_thread::yield();
+    }
+  }
+  // Blocks of the first band from there on that can go on.
+  bool fill_some(i32 band) {
+    while (band < down_ && !(is_ready(band) && !bands_[static_cast<size_t>(band)].taken.exchange(true)))
+      if (filled(band++) == 0) return false;  // nor can those below
+    if (band == down_) return false;
+    while (is_ready(band)) fill_next(band);
+    bands_[static_cast<size_t>(band)].taken.store(false);
+    return true;
+  }
+  void fill_next(i32 band) {
+    const i32 y = band * rows_, x = filled(band) * block_columns;
+    fill_(world_, {y, std::min(y + rows_, world_.height), x, std::min(x + block_columns, world_.width)}, above_,
+          carried_, table_);
+    bands_[static_cast<size_t>(band)].filled.fetch_add(1, std::memory_order_release);
+  }
+
+  const ZR_World& world_;
+  SumBlockFunc<Entry>* const fill_;
+  f64 *const above_, *const carried_;
+  Entry* const table_;
+  i32 threads_ = 1, rows_ = 0;
+  const i32 across_ = (world_.width - 1) / block_columns + 1;
+  i32 down_ = 0;
+  Bands bands_;
+};
+
+}  // namespace zr
