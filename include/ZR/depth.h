@@ -131,9 +131,15 @@ static_assert(Depth<ZR_Pixel16>::mul(16384, 1) == 0, "exactly one half goes down
 
 // ------------------------------------------------------------------------------ between depths
 
-constexpr u16 widen_8_to_16(u8 v) { return static_cast<u16>((v * 0x808080u + 33200u) >> 16); }
-// Undoes widen_8_to_16 for every byte.
-constexpr u8 narrow_16_to_8(u16 v) { return static_cast<u8>((v * 255u + 16384u) >> 15); }
+// (v * 0x808080 + 33200) >> 16, in steps that fit 16 bits, so that vectors hold twice as many channels.
+constexpr u16 widen_8_to_16(u8 v) { return static_cast<u16>((v << 7) + ((v + 1 + ((v + 2) >> 8)) >> 1)); }
+// Undoes widen_8_to_16 for every byte. It is (v * 255 + 16384) >> 15, likewise.
+constexpr u8 narrow_16_to_8(u16 v) { return static_cast<u8>((((v * 1020u) >> 16) + 1) >> 1); }
+static_assert([] {
+  for (u32 v = 0; v < 256; ++v)
+    if (widen_8_to_16(static_cast<u8>(v)) != (v * 0x808080u + 33200u) >> 16) return false;
+  return true;
+}());
 // `word` is the next word of the dither table; its low 15 bits replace the rounding term.
 constexpr u8 narrow_16_to_8_dither(u16 v, u32 word) { return static_cast<u8>((v * 255u + (word & 0x7fffu)) >> 15); }
 // Of worlds copied to worlds.

@@ -28,6 +28,11 @@ TEST(DepthRules, EveryByteWidensAndComesBack) {
   EXPECT_EQ(zr::widen_8_to_16(254), 32640) << "not the nearest, which is 32639";
 }
 
+TEST(DepthRules, SixteenBitsNarrowToTheNearestByte) {
+  for (u32 v = 0; v <= 65535; ++v)  // illegal ones wrap
+    ASSERT_EQ(zr::narrow_16_to_8(static_cast<u16>(v)), (v * 255 + 16384) / 32768 % 256) << v;
+}
+
 TEST(DepthRules, DitherReplacesTheRoundingTermByFifteenBitsOfTheWord) {
   for (i32 v = 0; v <= 32768; v += 7) {
     EXPECT_EQ(zr::narrow_16_to_8_dither(static_cast<u16>(v), 0xffff8000u), v * 255 / 32768);
