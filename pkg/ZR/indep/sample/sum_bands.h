@@ -46,7 +46,7 @@ class SumBands {
  private:
   // Few bands, as each is handed from one thread's cache to another's at its lower edge, but many enough for a thread
   // that gets less of its processor to do fewer of them.
-  static constexpr i32 bands_a_thread = 4, least_rows = 32, block_columns = 256;
+  static constexpr i32 bands_a_thread = 4, least_rows = 32, block_columns = 256, most_yields = 1000;
   struct Band {
     std::atomic<i32> filled{0};  // blocks, from the left
     std::atomic<bool> taken{false};
@@ -58,11 +58,21 @@ class SumBands {
 
   void work() {
     for (i32 first = 0; first < down_;) {
+      const i32 before = all_filled_.load(std::memory_order_acquire);
       if (filled(first) == across_)
         ++first;
       else if (!fill_some(first))
-        std::this_thread::yield();
+        wait_for_another(before);
     }
+  }
+  // For as long as a block may take the thread stays awake, as being woken takes long; but it may stand in the way of
+  // the very thread that it waits for.
+  void wait_for_another(i32 before) const {
+    for (i32 i = 0; i < most_yields; ++i) {
+      if (all_filled_.load(std::memory_order_acquire) != before) return;
+      std::this_thread::yield();
+    }
+    all_filled_.wait(before, std::memory_order_acquire);
   }
   // Blocks of the first band from there on that can go on.
   bool fill_some(i32 band) {
@@ -78,6 +88,8 @@ class SumBands {
     fill_(world_, {y, std::min(y + rows_, world_.height), x, std::min(x + block_columns, world_.width)}, above_,
           carried_, table_);
     bands_[static_cast<size_t>(band)].filled.fetch_add(1, std::memory_order_release);
+    all_filled_.fetch_add(1, std::memory_order_release);
+    all_filled_.notify_all();
   }
 
   const ZR_World& world_;
@@ -88,6 +100,7 @@ class SumBands {
   const i32 across_ = (world_.width - 1) / block_columns + 1;
   i32 down_ = 0;
   Bands bands_;
+  std::atomic<i32> all_filled_{0};  // blocks of any band: who finds none to go on with waits for the next of them
 };
 
 }  // namespace zr
