@@ -74,8 +74,13 @@ class ExactLanes {
         : per_quantum(hn::Set(Tag<f32>(), 1 / quantum)), most(hn::Zero(Tag<f32>())), rests(hn::Zero(Tag<f32>())) {}
     HWY_INLINE void look(Numbers v) {
       const auto quanta = hn::Mul(v, per_quantum);
+#if HWY_TARGET == HWY_AVX3  // in one instruction each; what is infinite leaves 0, but is the most
+      most = Numbers{_mm512_range_ps(most.raw, v.raw, 0b1011)};
+      rests = hn::Or(rests, Numbers{_mm512_reduce_ps(quanta.raw, 0)});
+#else
       most = hn::Max(most, hn::Abs(v));
       rests = hn::Or(rests, hn::Sub(quanta, hn::Round(quanta)));  // 0, or NaN for what is not finite
+#endif
     }
     HWY_INLINE f32 greatest() const { return hn::GetLane(hn::MaxOfLanes(Tag<f32>(), most)); }
     HWY_INLINE bool within(f32 bound) const {
