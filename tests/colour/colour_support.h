@@ -16,6 +16,7 @@
 #include <vector>
 
 #include "support/messages.h"
+#include "support/thrown.h"
 
 // What the engine keeps for itself is made before memory is counted, and must be gone after death.
 class ColourLibrary : public testing::Test {
@@ -49,17 +50,6 @@ inline std::vector<u8> profile_bytes(const std::string& name) {
 inline TON_PRISMA_Profile profile(const std::string& name) { return TON_PRISMA_Profile(profile_path(name).c_str()); }
 inline boost::shared_ptr<TON_PRISMA_Profile> shared_profile(const std::string& name) {
   return boost::make_shared<TON_PRISMA_Profile>(profile(name));
-}
-
-// The code that a call throws; 0 when it throws none.
-template <class Body>
-i32 thrown_by(Body&& body) {
-  try {
-    body();
-  } catch (const i32 code) {
-    return code;
-  }
-  return 0;
 }
 
 // lcms by itself at float precision, in its own packing.

@@ -10,6 +10,7 @@
 #include "support/born_library.h"
 #include "support/edge_rows.h"
 #include "support/gamma_tables.h"
+#include "support/thrown.h"
 #include "world/slot_table.h"
 
 namespace {
@@ -183,12 +184,8 @@ TYPED_TEST(RowsAt, UnknownModesAreReportedAndDrawNothing) {
 TEST_F(Rows, AnEmptySlotEndsThePlan) {
   for (const ZR_SlotIndex slot : {ZR_Slot_inner_blend8, ZR_Slot_union_alpha_row8, ZR_Slot_unmul_row8}) {
     const SlotOverride empty(slot, nullptr);
-    try {
-      const ZR_BlendModeDescriptor<ZR_Pixel8> plan(record<ZR_Pixel8>(XferAdd, 255), false, nullptr);
-      ADD_FAILURE() << "a plan with slot " << slot << " empty";
-    } catch (const i32 code) {
-      EXPECT_EQ(code, ZR_Err_Internal);
-    }
+    const auto plan = [] { ZR_BlendModeDescriptor<ZR_Pixel8>(record<ZR_Pixel8>(XferAdd, 255), false, nullptr); };
+    EXPECT_EQ(thrown_by(plan), ZR_Err_Internal) << slot;
     EXPECT_EQ(caught.take_verification(), "Something went wrong attempting get the blending function.");
   }
 }

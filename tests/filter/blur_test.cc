@@ -8,23 +8,21 @@
 #include "filter/blur_model.h"
 #include "support/born_library.h"
 #include "support/edge_rows.h"
+#include "support/thrown.h"
 
 namespace {
 
 // The thrown code, or 0.
 template <class T>
 i32 blur(const ZR_ProgressInfo* progress, ZR_World& src, const BlurCase& c, ZR_WorldX<T>& dst) {
-  try {
+  return thrown_by([&] {
     if (c.iterations == 0)
       ZR_GaussianBlur1D(progress, &src, c.radius, c.flags, c.src_vertical, c.src_premultiplied, c.dst_vertical,
                         c.dst_premultiplied, c.copy, &dst);
     else
       ZR_BoxBlur1D(progress, &src, c.radius, c.iterations, c.flags, c.src_vertical, c.src_premultiplied, c.dst_vertical,
                    c.dst_premultiplied, c.copy, &dst);
-  } catch (const i32 code) {
-    return code;
-  }
-  return 0;
+  });
 }
 
 std::string told(const BlurCase& c) {

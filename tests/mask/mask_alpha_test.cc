@@ -3,6 +3,7 @@
 #include <ZR/world.h>
 
 #include "mask/masks.h"
+#include "support/thrown.h"
 #include "support/worlds.h"
 
 namespace {
@@ -81,12 +82,7 @@ TEST_F(MaskAlpha, ThrowsWhatStopsIt) {
   const Mask<f32> real(50, 50, 1);
   const ZR_ProgressInfo stop = {nullptr, [](void*) -> i32 { return 31; }, nullptr};
   const auto thrown = [&](const ZR_ProgressInfo* progress, const ZR_UnoBuffer* of, ZR_World* into) {
-    try {
-      ZR_MergeMaskAlpha(progress, 0, 0, nullptr, of, nullptr, into);
-    } catch (const i32 error) {
-      return error;
-    }
-    return 0;
+    return thrown_by([&] { ZR_MergeMaskAlpha(progress, 0, 0, nullptr, of, nullptr, into); });
   };
   EXPECT_EQ(thrown(&stop, &mask, &typed), 31);
   EXPECT_EQ(thrown(nullptr, &real, &typed), 3);

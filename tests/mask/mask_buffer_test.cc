@@ -6,6 +6,7 @@
 #include <functional>
 
 #include "mask/masks.h"
+#include "support/thrown.h"
 
 namespace {
 
@@ -165,14 +166,7 @@ TEST_F(Masks, RefuseDamagedBuffers) {
         [&] { return ZR_TransferUnoBuffers(nullptr, &good, &good, 0, &rect, &point, bad); },
         [&] { return ZR_ConvertDeepUnoBuffer(nullptr, bad, &rect, 4, &good); },
         [&] { return ZR_ConvertDeepUnoBuffer(nullptr, &good, &rect, 4, bad); },
-        [&]() -> i32 {
-          try {
-            ZR_MergeMaskAlpha(nullptr, 0, 0, nullptr, bad, nullptr, nullptr);
-          } catch (const i32 error) {
-            return error;
-          }
-          return 0;
-        },
+        [&] { return thrown_by([&] { ZR_MergeMaskAlpha(nullptr, 0, 0, nullptr, bad, nullptr, nullptr); }); },
     };
     for (const auto& call : calls) {
       EXPECT_EQ(call(), 3) << &call - calls;

@@ -8,22 +8,12 @@
 
 #include "support/born_library.h"
 #include "support/odd_world.h"
+#include "support/thrown.h"
 #include "support/worlds.h"
 
 namespace {
 
 using std::unique_ptr;
-
-// The code that `body` throws, 0 for none.
-template <class Body>
-i32 thrown(Body&& body) {
-  try {
-    body();
-  } catch (const i32 code) {
-    return code;
-  }
-  return 0;
-}
 
 bool same(const GX_LRect& a, const GX_LRect& b) {
   return a.left == b.left && a.top == b.top && a.right == b.right && a.bottom == b.bottom;
@@ -42,14 +32,14 @@ TEST_F(WorldFailures, SizesOutsideTheLimitsAreReportedWithBothNumbers) {
                            {7, 30001, "invalid image buffer size (7x30001)."}}) {
     for (const i16 depth : {i16{8}, i16{16}, i16{32}})
       for (const i32 flags : {0, 4}) {
-        EXPECT_EQ(thrown([&] { ZR_World::New(size.width, size.height, depth, flags); }), ZR_Err_BadParam);
+        EXPECT_EQ(thrown_by([&] { ZR_World::New(size.width, size.height, depth, flags); }), ZR_Err_BadParam);
         ASSERT_EQ(caught.messages().size(), 1u);
         EXPECT_EQ(caught.messages().back().code, 0x250066u);
         EXPECT_EQ(caught.take_message(), size.text);
       }
   }
-  EXPECT_EQ(thrown([] { ZR_World::New(5, 5, 24, 0); }), ZR_Err_Internal);
-  EXPECT_EQ(thrown([] {
+  EXPECT_EQ(thrown_by([] { ZR_World::New(5, 5, 24, 0); }), ZR_Err_Internal);
+  EXPECT_EQ(thrown_by([] {
               ZR_World::New({std::numeric_limits<i32>::min(), 0, std::numeric_limits<i32>::max(), 9}, 8, 0);
             }),
             ZR_Err_BadParam);
@@ -70,22 +60,22 @@ TEST_F(WorldFailures, UnknownFormatsAndOwnersOfUnknownDepth) {
   EXPECT_EQ(caught.take_verification(), "Unknown pixel format");
   EXPECT_EQ(ZRp_WorldDepth(&owned), 24);
   EXPECT_TRUE(caught.quiet());
-  EXPECT_EQ(thrown([&] { ZR_World::NewReference(&owned); }), ZR_Err_Internal);
+  EXPECT_EQ(thrown_by([&] { ZR_World::NewReference(&owned); }), ZR_Err_Internal);
   EXPECT_EQ(caught.take_verification(), "Unexpected bitdepth in ZR_World::NewReference(ZR_EffectWorld)");
-  EXPECT_EQ(thrown([&] { odd.FillOutEffectWorld(&plain); }), ZR_Err_Internal);
+  EXPECT_EQ(thrown_by([&] { odd.FillOutEffectWorld(&plain); }), ZR_Err_Internal);
   EXPECT_EQ(caught.take_verification(), "Unknown pixel format");
   ZR_WorldX<ZR_Pixel8> world(4, 4, 0);
-  EXPECT_EQ(thrown([&] { world.CopyRect(&odd, {0, 0, 4, 4}, 0, 0); }), ZR_Err_Internal);
+  EXPECT_EQ(thrown_by([&] { world.CopyRect(&odd, {0, 0, 4, 4}, 0, 0); }), ZR_Err_Internal);
   EXPECT_EQ(caught.take_verification(), "Src and dest bitdepths are different in ZR_World::CopyRect");
   const char* const between = "Unknown bit depth in ZR_World::CopyRectPossiblyDifferentBitdepths";
-  EXPECT_EQ(thrown([&] { world.CopyRectPossiblyDifferentBitdepth(&odd, {0, 0, 0, 0}, false, 0, 0, nullptr); }), 3);
+  EXPECT_EQ(thrown_by([&] { world.CopyRectPossiblyDifferentBitdepth(&odd, {0, 0, 0, 0}, false, 0, 0, nullptr); }), 3);
   EXPECT_EQ(caught.verifications().back().code, 0x25006eu);
   EXPECT_EQ(caught.take_verification(), between);
-  EXPECT_EQ(thrown([&] { world.CopyRectPossiblyDifferentBitdepthWithField(&odd, {0, 0, 4, 4}, 1); }), 3);
+  EXPECT_EQ(thrown_by([&] { world.CopyRectPossiblyDifferentBitdepthWithField(&odd, {0, 0, 4, 4}, 1); }), 3);
   EXPECT_EQ(caught.take_verification(), between);
-  EXPECT_EQ(thrown([&] { world.GetRSWorld(); }), ZR_Err_NoRasterWorld);
+  EXPECT_EQ(thrown_by([&] { world.GetRSWorld(); }), ZR_Err_NoRasterWorld);
   char pixels[64];
-  EXPECT_EQ(thrown([&] { ZR_World::NewReference(pixels, 2, 2, 12, 16); }), ZR_Err_Internal);
+  EXPECT_EQ(thrown_by([&] { ZR_World::NewReference(pixels, 2, 2, 12, 16); }), ZR_Err_Internal);
 }
 
 template <class T>
@@ -143,7 +133,7 @@ TYPED_TEST(Worlds, RasterFramesBelongToTheWorldAndAreSeenByViews) {
   EXPECT_EQ(world->row_bytes, (*raster)->row_bytes);
   EXPECT_FALSE(world->IsReference());
   EXPECT_FALSE(world->SubWorldSafetyGutterHasBeenOverWritten());
-  EXPECT_EQ(thrown([&] { world->ShrinkToSubRect({0, 0, 2, 2}); }), ZR_Err_Internal);
+  EXPECT_EQ(thrown_by([&] { world->ShrinkToSubRect({0, 0, 2, 2}); }), ZR_Err_Internal);
   EXPECT_EQ(this->caught.take_verification(), "Can't Shrink a ZR_World which is backed by a RS_World");
 
   const unique_ptr<ZR_World> whole(ZR_World::NewReference(raster));
@@ -199,7 +189,7 @@ TYPED_TEST(Worlds, ShrinkingAndReReferencingCheckTheirRectangle) {
   ZR_WorldX<T> world(10, 8, 0), other(10, 8, 0);
   const GX_LRect outside[] = {{-1, 0, 5, 5}, {0, 0, 11, 5}, {0, -1, 5, 5}, {0, 0, 5, 9}};
   for (const GX_LRect& rect : outside) {
-    EXPECT_EQ(thrown([&] { world.ShrinkToSubRect(rect); }), ZR_Err_Internal);
+    EXPECT_EQ(thrown_by([&] { world.ShrinkToSubRect(rect); }), ZR_Err_Internal);
     EXPECT_EQ(this->caught.take_verification(), "bad sub rect in ShrinkToSubRect");
   }
   T* const at = world.At(3, 2);
@@ -213,13 +203,13 @@ TYPED_TEST(Worlds, ShrinkingAndReReferencingCheckTheirRectangle) {
 
   unique_ptr<ZR_World> reference(ZR_World::NewReference(&other, GX_LRect{0, 0, 10, 8}));
   for (const GX_LRect& rect : outside) {
-    EXPECT_EQ(thrown([&] { reference->ReReference(&other, rect); }), ZR_Err_Internal);
+    EXPECT_EQ(thrown_by([&] { reference->ReReference(&other, rect); }), ZR_Err_Internal);
     EXPECT_EQ(this->caught.take_verification(), "bad sub rect in ReReference");
   }
-  EXPECT_EQ(thrown([&] { reference->ReReference(reference.get(), {0, 0, 1, 1}); }), ZR_Err_Internal);
+  EXPECT_EQ(thrown_by([&] { reference->ReReference(reference.get(), {0, 0, 1, 1}); }), ZR_Err_Internal);
   EXPECT_EQ(this->caught.take_verification(), "can't ReReference self");
   OddWorld odd;
-  EXPECT_EQ(thrown([&] { reference->ReReference(&odd, {-1, 0, 1, 1}); }), ZR_Err_Internal);
+  EXPECT_EQ(thrown_by([&] { reference->ReReference(&odd, {-1, 0, 1, 1}); }), ZR_Err_Internal);
   EXPECT_EQ(this->caught.take_verification(), "can't change bit depth in ReReference") << "told first";
   reference->host_word = 5;
   reference->ReReference(&world, {1, 1, 3, 4});

@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "support/born_library.h"
+#include "support/thrown.h"
 #include "support/worlds.h"
 #include "world/depth_rows.h"
 
@@ -187,12 +188,9 @@ TYPED_TEST(Copies, PollsBehindEverySixtyFourthRowAndStopsThere) {
         TestWorld<To> dst(3, rows + 2);
         dst.randomise(6);
         TestWorld<To> expected(dst);
-        i32 code = 0;
-        try {
+        const i32 code = thrown_by([&] {
           reference(dst)->CopyRectPossiblyDifferentBitdepth(reference(src).get(), {0, 0, 3, rows}, false, 0, 1, &info);
-        } catch (const i32 thrown) {
-          code = thrown;
-        }
+        });
         const bool stops = stop_at >= 0 && stop_at < rows / 64;
         EXPECT_EQ(code, !stops ? 0 : progress_too ? 99 : 98);
         EXPECT_EQ(polls.asked, stops ? stop_at + 1 : rows / 64);
