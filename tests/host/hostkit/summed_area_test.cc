@@ -3,6 +3,7 @@
 #include <ZR/slots.h>
 #include <ZR/summed_area.h>
 
+#include <algorithm>
 #include <random>
 #include <vector>
 
@@ -33,9 +34,12 @@ void expect_same(std::mt19937& random) {
   const i32 width = 1 + static_cast<i32>(random() % 900), height = 1 + static_cast<i32>(random() % 300);
   TestWorld<T> world(width, height);
   world.randomise(static_cast<u32>(random()));
-  for (i32 y = 0; y < height; ++y)  // some groups of rows opaque
-    for (i32 x = 0; x < width && y / 8 % 3 != 0; ++x)
-      world.at(x, y).alpha = static_cast<zr::Channel<T>>(zr::Depth<T>::white);
+  // Opaque above and on the left, but for a few pixels, and in groups of rows below.
+  const i32 opaque_columns = random() % 2 == 0 ? width : static_cast<i32>(random() % 900);
+  for (i32 y = 0; y < height; ++y)
+    for (i32 x = 0; x < std::min(width, opaque_columns); ++x)
+      if ((y < height / 2 ? random() % 20000 : y / 8 % 3) != 0)
+        world.at(x, y).alpha = static_cast<zr::Channel<T>>(zr::Depth<T>::white);
   const ZR_WorldX<T> source(world.layer(), true);
   const bool use_double = random() % 2 == 0;
   std::vector<f64> expected;

@@ -8,6 +8,7 @@
 
 #include <hwy/cache_control.h>
 
+#include <algorithm>
 #include <cstdint>
 
 #include "simd/lanes-inl.h"
@@ -33,6 +34,16 @@ HWY_INLINE QuadV weighted(QuadV channels, QuadV factor) {
 }
 // Of each alpha 1 and three times alpha / 255.
 using Parts = f64[256][4];
+struct PartsOfAlphas {
+  alignas(32) Parts parts;
+  PartsOfAlphas() {
+    for (i32 a = 0; a < 256; ++a) {
+      const f64 part = a / 255.0;
+      const f64 of[4] = {1.0, part, part, part};
+      std::copy_n(of, 4, parts[a]);
+    }
+  }
+};
 HWY_INLINE QuadV premultiplied(const ZR_Pixel8* p, const Parts& parts) {
   const hn::FixedTag<u8, 4> d;
   const auto whole = hn::PromoteTo(hn::FixedTag<i32, 4>(), hn::LoadU(d, reinterpret_cast<const u8*>(p)));
@@ -154,6 +165,18 @@ HWY_INLINE void write_ahead(const void* at) {
   hwy::Prefetch(reinterpret_cast<const char*>(reinterpret_cast<std::uintptr_t>(at) + 2048));
 }
 
+// Whole numbers below 2^52, to bits of their own and back.
+using Whole = hn::Vec<hn::FixedTag<u64, 4>>;
+HWY_INLINE Whole whole_of(QuadV v) {
+  const hn::FixedTag<u64, 4> d;
+  const QuadV base = hn::Set(Quad(), whole_base);
+  return hn::Sub(hn::BitCast(d, hn::Add(v, base)), hn::BitCast(d, base));
+}
+HWY_INLINE QuadV double_of(Whole v) {
+  const QuadV base = hn::Set(Quad(), whole_base);
+  return hn::Sub(hn::BitCast(Quad(), hn::Add(v, hn::BitCast(hn::FixedTag<u64, 4>(), base))), base);
+}
+
 template <class Entry>
 HWY_INLINE void sum_opaque_rows(const ZR_World& world, const SumBlock& block, i32 y, f64* above, f64* carried,
                                 Entry* table) {
@@ -163,11 +186,12 @@ HWY_INLINE void sum_opaque_rows(const ZR_World& world, const SumBlock& block, i3
   const QuadV base = hn::Set(d, whole_base);
   const ZR_Pixel8* src[rows];
   Entry* out[rows];
-  hn::Vec<decltype(whole)> row[rows];
+  Whole row[rows];
   for (i32 r = 0; r < rows; ++r) {
     src[r] = row_at<ZR_Pixel8>(world, y + r);
     out[r] = table + static_cast<std::ptrdiff_t>(y + r) * world.width;
-    row[r] = hn::BitCast(whole, hn::LoadU(d, carried + r * carried_numbers));
+    const f64* const of = carried + r * carried_numbers;
+    row[r] = whole_of(hn::Sub(hn::LoadU(d, of), hn::LoadU(d, of + 4)));
   }
   each_column(block, y, [&](i32 x, const f64* inverses, bool begins_line) HWY_ATTR {
     f64* const cell = above + static_cast<std::size_t>(x) * 4;
@@ -175,7 +199,7 @@ HWY_INLINE void sum_opaque_rows(const ZR_World& world, const SumBlock& block, i3
     for (i32 r = 0; r < rows; ++r) {
       i32 word;
       std::memcpy(&word, src[r] + x, sizeof word);
-      row[r] = hn::Add(row[r], hn::Vec<decltype(whole)>{_mm256_cvtepu8_epi64(_mm_cvtsi32_si128(word))});
+      row[r] = hn::Add(row[r], Whole{_mm256_cvtepu8_epi64(_mm_cvtsi32_si128(word))});
       sum = hn::Add(sum, row[r]);
       put(hn::MulSub(hn::BitCast(d, sum), hn::Set(d, inverses[r]), hn::Set(d, inverses[r + Inverses::bases])),
           out[r] + x);
@@ -183,7 +207,13 @@ HWY_INLINE void sum_opaque_rows(const ZR_World& world, const SumBlock& block, i3
     }
     hn::StoreU(hn::Sub(hn::BitCast(d, sum), base), d, cell);
   });
-  for (i32 r = 0; r < rows; ++r) hn::StoreU(hn::BitCast(d, row[r]), d, carried + r * carried_numbers);
+  QuadV left = hn::LoadU(d, above + static_cast<std::size_t>(block.end_column - 1) * 4);
+  for (i32 r = rows; r-- > 0;) {
+    f64* const of = carried + r * carried_numbers;
+    hn::StoreU(left, d, of);
+    left = hn::Sub(left, double_of(row[r]));
+    hn::StoreU(left, d, of + 4);
+  }
 }
 
 HWY_INLINE bool is_opaque(const ZR_Pixel8* row, i32 n) {
@@ -202,26 +232,24 @@ HWY_INLINE bool is_opaque(const ZR_Pixel8* row, i32 n) {
 
 template <class T, class Entry>
 void sum_block(const ZR_World& world, const SumBlock& block, f64* above, f64* carried, Entry* table) {
-  alignas(32) Parts parts;
   constexpr i32 rows = opaque_rows;
-  if constexpr (sizeof(T) == 4)
-    for (i32 a = 0; a < 256; ++a)
-      hn::Store(weighted(hn::Set(Quad(), 1.0), hn::Set(Quad(), a / 255.0)), Quad(), parts[a]);
+  static const PartsOfAlphas of_alphas;
+  const Parts& parts = of_alphas.parts;
   carried += block.first_row * carried_numbers;
   i32 y = block.first_row;
   for (; block.end_row - y >= rows; y += rows, carried += rows * carried_numbers) {
     if constexpr (sizeof(T) == 4) {
-      f64& opaque = carried[carried_numbers - 1];  // 1, -1 or not known
-      if (opaque == 0) {
-        // Sums stay whole numbers up to the first row that is not opaque. The first block of a row finds that.
-        opaque = y > 0 && (&opaque)[-rows * carried_numbers] < 0 ? -1 : 1;
-        for (i32 r = 0; r < rows && opaque > 0; ++r)
-          if (!is_opaque(row_at<T>(world, y + r), world.width)) opaque = -1;
-      }
-      if (opaque > 0) {
+      // Sums are whole numbers as far as all above and to the left are opaque.
+      f64& left_has_fractions = carried[carried_numbers - 1];
+      bool is_whole = !*block.has_fractions && left_has_fractions == 0;
+      for (i32 r = 0; r < rows && is_whole; ++r)
+        is_whole = is_opaque(row_at<T>(world, y + r) + block.first_column, block.end_column - block.first_column);
+      if (is_whole) {
         sum_opaque_rows(world, block, y, above, carried, table);
         continue;
       }
+      *block.has_fractions = true;
+      left_has_fractions = 1;
     }
     sum_rows<rows, T>(world, block, y, parts, above, carried, table);
   }

@@ -8,6 +8,7 @@ namespace zr {
 // Cells of a table. Columns begin at a multiple of 16; rows at a multiple of 4, and end at one or with the table.
 struct SumBlock {
   i32 first_row, end_row, first_column, end_column;
+  bool* has_fractions;  // of these columns, false at first: whether sums of the rows above may be no whole numbers
 };
 // What a row hands from block to block.
 inline constexpr i64 carried_numbers = 9;

@@ -30,6 +30,7 @@ class SumBands {
     rows_ = std::max(least_rows, (rows + 3) / 4 * 4);
     down_ = (world.height - 1) / rows_ + 1;
     bands_ = Bands(static_cast<size_t>(down_));
+    columns_ = Columns(static_cast<size_t>(across_));
   }
 
   i32 run() {
@@ -39,19 +40,23 @@ class SumBands {
         static_cast<SumBands*>(self)->work();
         return i32{ZR_Err_None};
       });
-    fill_(world_, {0, world_.height, 0, world_.width}, above_, carried_, table_);
+    fill_(world_, {0, world_.height, 0, world_.width, &columns_[0].has_fractions}, above_, carried_, table_);
     return ZR_Err_None;
   }
 
  private:
   // Few bands, as each is handed from one thread's cache to another's at its lower edge, but many enough for a thread
   // that gets less of its processor to do fewer of them.
-  static constexpr i32 bands_a_thread = 4, least_rows = 32, block_columns = 256, most_yields = 1000;
+  static constexpr i32 bands_a_thread = 8, least_rows = 32, block_columns = 256, most_yields = 1000;
   struct Band {
     std::atomic<i32> filled{0};  // blocks, from the left
     std::atomic<bool> taken{false};
   };
   using Bands = std::vector<Band, HB_Allocator<Band, SumRowLabel>>;
+  struct Column {
+    bool has_fractions = false;
+  };
+  using Columns = std::vector<Column, HB_Allocator<Column, SumRowLabel>>;
 
   i32 filled(i32 band) const { return bands_[static_cast<size_t>(band)].filled.load(std::memory_order_acquire); }
   bool is_ready(i32 band) const { return filled(band) < (band == 0 ? across_ : filled(band - 1)); }
@@ -84,9 +89,11 @@ class SumBands {
     return true;
   }
   void fill_next(i32 band) {
-    const i32 y = band * rows_, x = filled(band) * block_columns;
-    fill_(world_, {y, std::min(y + rows_, world_.height), x, std::min(x + block_columns, world_.width)}, above_,
-          carried_, table_);
+    const i32 y = band * rows_, column = filled(band), x = column * block_columns;
+    fill_(world_,
+          {y, std::min(y + rows_, world_.height), x, std::min(x + block_columns, world_.width),
+           &columns_[static_cast<size_t>(column)].has_fractions},
+          above_, carried_, table_);
     bands_[static_cast<size_t>(band)].filled.fetch_add(1, std::memory_order_release);
     all_filled_.fetch_add(1, std::memory_order_release);
     all_filled_.notify_all();
@@ -100,6 +107,7 @@ class SumBands {
   const i32 across_ = (world_.width - 1) / block_columns + 1;
   i32 down_ = 0;
   Bands bands_;
+  Columns columns_;                 // of blocks
   std::atomic<i32> all_filled_{0};  // blocks of any band: who finds none to go on with waits for the next of them
 };
 
