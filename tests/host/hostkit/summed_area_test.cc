@@ -38,7 +38,7 @@ void expect_same(std::mt19937& random) {
   const i32 opaque_columns = random() % 2 == 0 ? width : static_cast<i32>(random() % 900);
   for (i32 y = 0; y < height; ++y)
     for (i32 x = 0; x < std::min(width, opaque_columns); ++x)
-      if ((y < height / 2 ? random() % 20000 : y / 8 % 3) != 0)
+      if (y < height / 2 ? random() % 20000 != 0 : y / 8 % 3 != 0)
         world.at(x, y).alpha = static_cast<zr::Channel<T>>(zr::Depth<T>::white);
   const ZR_WorldX<T> source(world.layer(), true);
   const bool use_double = random() % 2 == 0;
