@@ -34,16 +34,20 @@ HWY_INLINE QuadV weighted(QuadV channels, QuadV factor) {
 }
 // Of each alpha 1 and three times alpha / 255.
 using Parts = f64[256][4];
-struct PartsOfAlphas {
-  alignas(32) Parts parts;
-  PartsOfAlphas() {
+const Parts& parts_of_alphas() {
+  struct Table {
+    alignas(32) Parts parts;
+  };
+  static const Table table = [] {
+    Table made;
     for (i32 a = 0; a < 256; ++a) {
-      const f64 part = a / 255.0;
-      const f64 of[4] = {1.0, part, part, part};
-      std::copy_n(of, 4, parts[a]);
+      made.parts[a][0] = 1.0;
+      std::fill_n(made.parts[a] + 1, 3, a / 255.0);
     }
-  }
-};
+    return made;
+  }();
+  return table.parts;
+}
 HWY_INLINE QuadV premultiplied(const ZR_Pixel8* p, const Parts& parts) {
   const hn::FixedTag<u8, 4> d;
   const auto whole = hn::PromoteTo(hn::FixedTag<i32, 4>(), hn::LoadU(d, reinterpret_cast<const u8*>(p)));
@@ -233,8 +237,7 @@ HWY_INLINE bool is_opaque(const ZR_Pixel8* row, i32 n) {
 template <class T, class Entry>
 void sum_block(const ZR_World& world, const SumBlock& block, f64* above, f64* carried, Entry* table) {
   constexpr i32 rows = opaque_rows;
-  static const PartsOfAlphas of_alphas;
-  const Parts& parts = of_alphas.parts;
+  const Parts& parts = parts_of_alphas();
   carried += block.first_row * carried_numbers;
   i32 y = block.first_row;
   for (; block.end_row - y >= rows; y += rows, carried += rows * carried_numbers) {

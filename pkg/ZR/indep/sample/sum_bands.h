@@ -53,7 +53,7 @@ class SumBands {
     std::atomic<bool> taken{false};
   };
   using Bands = std::vector<Band, HB_Allocator<Band, SumRowLabel>>;
-  struct Column {
+  struct Column {  // a byte of its own, as threads write neighbours
     bool has_fractions = false;
   };
   using Columns = std::vector<Column, HB_Allocator<Column, SumRowLabel>>;
