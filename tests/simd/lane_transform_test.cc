@@ -11,6 +11,7 @@
 
 #include "support/born_library.h"
 #include "support/edge_rows.h"
+#include "support/table_numbers.h"
 
 namespace {
 
@@ -205,18 +206,11 @@ TYPED_TEST(LaneWorlds, SummedAreas) {
       reinterpret_cast<T*>(row)[i % layer.width].alpha = this->part_of_white(1.0f);
     }
     const ZR_WorldX<T> world(&layer, true);
-    const std::size_t entries = static_cast<std::size_t>(layer.width * layer.height);
     for (const bool use_double : {false, true}) {
       std::vector<f64> expected;
       for (int level = 0; level < 4 && Instructions::has(level); ++level) {
         const Instructions instructions(level);
-        const ZR_SummedAreaTable table(&world, use_double);
-        std::vector<f64> got;
-        const auto take = [&](const auto* entry) {
-          for (std::size_t i = 0; i < entries; ++i)
-            got.insert(got.end(), {entry[i].alpha, entry[i].red, entry[i].green, entry[i].blue});
-        };
-        table.UsesDouble() ? take(table.DoubleTable()) : take(table.FloatTable());
+        const std::vector<f64> got = numbers_of(ZR_SummedAreaTable(&world, use_double), layer.width * layer.height);
         if (level == 0) expected = got;
         for (std::size_t i = 0; i < got.size(); ++i)
           ASSERT_TRUE(std::memcmp(&got[i], &expected[i], sizeof(f64)) == 0 ||

@@ -9,6 +9,7 @@
 
 #include "support/born_library.h"
 #include "support/edge_rows.h"
+#include "support/table_numbers.h"
 #include "support/worlds.h"
 
 namespace {
@@ -18,16 +19,6 @@ class BandsOfBlocks : public testing::TestWithParam<int> {
   zr::Hostkit host{{.threads = GetParam()}};
 };
 INSTANTIATE_TEST_SUITE_P(Threads, BandsOfBlocks, testing::Values(1, 2, 3, 7));
-
-std::vector<f64> numbers_of(const ZR_SummedAreaTable& table, i32 entries) {
-  std::vector<f64> numbers;
-  const auto take = [&](const auto* entry) {
-    for (i32 i = 0; i < entries; ++i)
-      numbers.insert(numbers.end(), {entry[i].alpha, entry[i].red, entry[i].green, entry[i].blue});
-  };
-  table.UsesDouble() ? take(table.DoubleTable()) : take(table.FloatTable());
-  return numbers;
-}
 
 template <class T>
 void expect_same(std::mt19937& random) {
